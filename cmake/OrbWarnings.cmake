@@ -1,0 +1,14 @@
+# SPDX-License-Identifier: MIT
+# Warnings and sanitizers of our own targets, never of those who use the library.
+add_library(orb_warnings INTERFACE)
+target_compile_options(orb_warnings INTERFACE
+  -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Wsign-conversion -Wnon-virtual-dtor
+  -Woverloaded-virtual -Wcast-align -Wnull-dereference -Wformat=2)
+if(ORB_WERROR)
+  target_compile_options(orb_warnings INTERFACE -Werror)
+endif()
+if(ORB_SANITIZE)
+  target_compile_options(orb_warnings INTERFACE -fsanitize=${ORB_SANITIZE} -fno-omit-frame-pointer
+    -fno-sanitize-recover=all)
+  target_link_options(orb_warnings INTERFACE -fsanitize=${ORB_SANITIZE})
+endif()

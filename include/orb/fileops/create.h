@@ -1,0 +1,29 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <orb/export.h>
+#include <orb/path/file_path.h>
+#include <orb/result.h>
+#include <orb/strings/string_data.h>
+
+/// Makes a folder, and the folders above it that are missing. `result` may be null; it receives the
+/// path on success alone. kOrbErrFileExists, kOrbErrAccessDenied, kOrbErrInvalidName,
+/// kOrbErrNameTooLong, kOrbErrDiskFull, kOrbErrNotFound, kOrbErrUnknown; folders made above it
+/// stay.
+ORB_EXPORT OrbResult OrbCreateFolder(const COrbFilePath& folder,
+                                     const COrbStringData& name,
+                                     COrbFilePath* result);
+
+/// Makes an empty file, in the place of a file that is there already; a link is replaced, not
+/// followed. `result`, which must not be null, receives the path on success alone. The codes of
+/// OrbCreateFolder; an existing item that cannot be replaced gives kOrbErrFileExists.
+ORB_EXPORT OrbResult OrbCreateFile(const COrbFilePath& folder,
+                                   const COrbStringData& name,
+                                   COrbFilePath* result);
+
+/// Makes an empty file under a name that nothing has: photo.jpg, else photo_1.jpg, photo_2.jpg and
+/// so on. Testing and making are one step, so two callers never get the same file. `result`, which
+/// must not be null, receives the path on success alone. The codes of OrbCreateFile.
+ORB_EXPORT OrbResult OrbCreateUniqueFile(const COrbFilePath& folder,
+                                         const COrbStringData& name,
+                                         COrbFilePath* result);

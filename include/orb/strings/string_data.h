@@ -1,0 +1,156 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <orb/export.h>
+#include <orb/platform/core_foundation.h>
+#include <orb/result.h>
+#include <orb/strings/char_types.h>
+#include <orb/thread/critical_section.h>
+
+#include <atomic>
+#include <cstdint>
+
+namespace orb {
+struct StringAccess;
+}
+
+/// One text in up to three encodings at once: the system encoding (Mac OS Roman), UTF-8 and UTF-16.
+/// The encoding in which it was set is the master; the other two are made on the first request and
+/// kept. Lengths and positions in characters are UTF-16 units.
+///
+/// A string has no value (as it is made), a value without text (after an initialiser was given a
+/// null pointer), or a value with a text, possibly the empty text. IsEmpty() is true for the first
+/// two and for the empty text.
+///
+/// Copies share one immutable value and copy no text; setting a text always makes a new value, so
+/// other copies keep the old one. Distinct strings may be used on different threads even when they
+/// share a value. One string must not be used by two threads at once while one of them changes it;
+/// the first pointer accessor on a string without value does change it.
+class ORB_EXPORT COrbStringData {
+ public:
+  class COrbStringValue;
+
+  /// No value.
+  COrbStringData() = default;
+  /// Shares the other string's value.
+  COrbStringData(const COrbStringData& other);
+  /// Takes the other string's place; it is left without value.
+  COrbStringData(COrbStringData&& other) noexcept;
+  COrbStringData(const OrbCharSystem& text);
+  COrbStringData(const OrbCharUtf8& text);
+  COrbStringData(const OrbCharUnicode& text);
+  COrbStringData(const OrbCharPlatform& text);
+  COrbStringData& operator=(const COrbStringData& other);
+  COrbStringData& operator=(COrbStringData&& other) noexcept;
+  virtual ~COrbStringData();
+
+  /// Lets go of the value. Afterwards the string has none.
+  void Clear();
+
+  /// The initialisers copy the text up to its terminating zero into a new value; they do not check
+  /// that it is valid in its encoding. The text may be one that this string handed out.
+  /// A null pointer gives kOrbErrUnknown and a value without text. std::bad_alloc when there is no
+  /// memory for a value.
+  OrbResult InitWithSystemEncoding(const char* text);
+  OrbResult InitWithUtf8(const char* text);
+  OrbResult InitWithUnicode(const unsigned short* text);
+  OrbResult InitWithChar(const OrbCharSystem& text);
+  OrbResult InitWithChar(const OrbCharUtf8& text);
+  OrbResult InitWithChar(const OrbCharUnicode& text);
+  OrbResult InitWithChar(const OrbCharPlatform& text);
+  /// Takes the text as UTF-8. A null string gives kOrbErrUnknown and leaves no value.
+  OrbResult InitWithCFString(const __CFString* text);
+
+  /// The text in one encoding, zero-terminated. It stays valid until the last of the strings that
+  /// share the value lets go of it. A string without value gets one without text first and yields
+  /// "". A text that cannot be read in its own encoding yields "" in the others. Null only when
+  /// there is no memory for the copy.
+  const char* GetPtrSystemEncoding() const;
+  const char* GetPtrUtf8() const;
+  const unsigned short* GetPtrUnicode() const;
+  /// The UTF-8 text.
+  const char* GetPtrPlatform() const;
+  OrbCharPlatform GetCharPlatform() const;
+  OrbCharUnicode GetCharUnicode() const;
+
+  /// Lengths without the terminating zero; 0 for a string without value, which stays without.
+  unsigned long GetLengthByteSystemEncoding() const;
+  unsigned long GetLengthByteUtf8() const;
+  unsigned long GetLengthByteUnicode() const;
+  unsigned long GetLengthBytePlatform() const;
+  /// The length in UTF-16 units; 0 for a text that cannot be read in its encoding.
+  unsigned long GetLengthChar() const;
+
+  /// Whether the copy in that encoding is there already. They make nothing.
+  bool HasValueSystemEncoding() const;
+  bool HasValueUtf8() const;
+  bool HasValueUnicode() const;
+
+  /// True without value, without text and for the empty text, and for a system text that cannot be
+  /// read. A UTF-8 text that is not valid is not empty.
+  bool IsEmpty() const;
+
+  /// A new CFString that the caller releases; empty for a text that is not UTF-8. Never null.
+  CFStringRef CreateCopyCFString() const;
+
+  /// The `count` characters from `start`, fewer where the text ends. No value when `start` is not
+  /// below the length; a count of 0 gives the empty text.
+  COrbStringData Mid(unsigned long start, unsigned long count) const;
+  /// This text followed by the other's. Always has a value.
+  COrbStringData operator+(const COrbStringData& other) const;
+  COrbStringData& operator+=(const COrbStringData& other);
+
+ private:
+  friend struct orb::StringAccess;
+
+  void Share(const COrbStringData& other);
+  void TakePlaceOf(COrbStringData& other) noexcept;
+  COrbStringValue* EnsureValue() const;
+
+  // Every owner of one value stands in a chain, changed under the value's lock alone.
+  mutable COrbStringData* prev = nullptr;
+  mutable COrbStringData* next = nullptr;
+  mutable COrbStringValue* value = nullptr;
+};
+
+/// The text that copies of a string share. A copy once stored never changes until Clear(), so its
+/// pointer is published with release and read without the lock.
+class ORB_EXPORT COrbStringData::COrbStringValue {
+ public:
+  COrbStringValue() = default;
+  COrbStringValue(const COrbStringValue&) = delete;
+  COrbStringValue& operator=(const COrbStringValue&) = delete;
+  virtual ~COrbStringValue();
+
+  /// Drops all copies; the next initialiser counts again. No other thread may use the value.
+  void Clear();
+
+  /// The first one to be given a text wins; later calls are ignored and give 0. A null pointer
+  /// gives kOrbErrUnknown.
+  OrbResult InitWithSystemEncoding(const char* text);
+  OrbResult InitWithUtf8(const char* text);
+  OrbResult InitWithUnicode(const unsigned short* text);
+
+  const char* GetPtrSystemEncoding();
+  const char* GetPtrUtf8();
+  const unsigned short* GetPtrUnicode();
+  unsigned long GetLengthByteSystemEncoding();
+  unsigned long GetLengthByteUtf8();
+  unsigned long GetLengthByteUnicode();
+  unsigned long GetLengthChar();
+  bool HasValueSystemEncoding() const;
+  bool HasValueUtf8() const;
+  bool HasValueUnicode() const;
+  bool IsEmpty();
+
+ private:
+  friend class COrbStringData;
+  friend struct orb::StringAccess;
+
+  COrbCriticalSection lock;
+  std::atomic<std::uint32_t> master{0};
+  std::atomic<char*> systemText{nullptr};
+  std::atomic<char*> utf8Text{nullptr};
+  std::atomic<unsigned short*> unicodeText{nullptr};
+  std::atomic<std::uint64_t> scan{0};  // What a scan of the UTF-8 text found, packed; 0 before it.
+};

@@ -1,0 +1,22 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <orb/export.h>
+#include <pthread.h>
+
+/// A recursive lock. The thread that holds it may enter again and must leave as often as it
+/// entered. Unlocked when made; must be unlocked when destroyed.
+class ORB_EXPORT COrbCriticalSection {
+ public:
+  COrbCriticalSection();
+  COrbCriticalSection(const COrbCriticalSection&) = delete;
+  COrbCriticalSection& operator=(const COrbCriticalSection&) = delete;
+  virtual ~COrbCriticalSection();
+
+  /// Both are const so that const operations of an owner can lock.
+  void Enter() const { pthread_mutex_lock(&mutex_); }
+  void Leave() const { pthread_mutex_unlock(&mutex_); }
+
+ private:
+  mutable pthread_mutex_t mutex_;
+};

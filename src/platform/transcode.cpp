@@ -1,0 +1,171 @@
+// SPDX-License-Identifier: MIT
+#include "platform/transcode.h"
+
+#include <unicode/unorm2.h>
+
+#include <array>
+#include <cstdint>
+
+namespace orb::platform {
+namespace {
+
+/// What the bytes 0x80 to 0xFF of Mac OS Roman stand for.
+constexpr std::array<char16_t, 128> kMacRomanUpperHalf = {
+    0x00C4, 0x00C5, 0x00C7, 0x00C9, 0x00D1, 0x00D6, 0x00DC, 0x00E1, 0x00E0, 0x00E2, 0x00E4, 0x00E3,
+    0x00E5, 0x00E7, 0x00E9, 0x00E8, 0x00EA, 0x00EB, 0x00ED, 0x00EC, 0x00EE, 0x00EF, 0x00F1, 0x00F3,
+    0x00F2, 0x00F4, 0x00F6, 0x00F5, 0x00FA, 0x00F9, 0x00FB, 0x00FC, 0x2020, 0x00B0, 0x00A2, 0x00A3,
+    0x00A7, 0x2022, 0x00B6, 0x00DF, 0x00AE, 0x00A9, 0x2122, 0x00B4, 0x00A8, 0x2260, 0x00C6, 0x00D8,
+    0x221E, 0x00B1, 0x2264, 0x2265, 0x00A5, 0x00B5, 0x2202, 0x2211, 0x220F, 0x03C0, 0x222B, 0x00AA,
+    0x00BA, 0x03A9, 0x00E6, 0x00F8, 0x00BF, 0x00A1, 0x00AC, 0x221A, 0x0192, 0x2248, 0x2206, 0x00AB,
+    0x00BB, 0x2026, 0x00A0, 0x00C0, 0x00C3, 0x00D5, 0x0152, 0x0153, 0x2013, 0x2014, 0x201C, 0x201D,
+    0x2018, 0x2019, 0x00F7, 0x25CA, 0x00FF, 0x0178, 0x2044, 0x20AC, 0x2039, 0x203A, 0xFB01, 0xFB02,
+    0x2021, 0x00B7, 0x201A, 0x201E, 0x2030, 0x00C2, 0x00CA, 0x00C1, 0x00CB, 0x00C8, 0x00CD, 0x00CE,
+    0x00CF, 0x00CC, 0x00D3, 0x00D4, 0xF8FF, 0x00D2, 0x00DA, 0x00DB, 0x00D9, 0x0131, 0x02C6, 0x02DC,
+    0x00AF, 0x02D8, 0x02D9, 0x02DA, 0x00B8, 0x02DD, 0x02DB, 0x02C7,
+};
+
+constexpr char32_t kReplacement = 0xFFFD;
+constexpr char32_t kInvalid = 0xFFFFFFFF;
+
+/// Reads one character of UTF-8 at `at` and moves behind it; kInvalid where there is none.
+char32_t ReadUtf8(std::string_view text, std::size_t& at) {
+  const auto byte = [&](std::size_t i) -> unsigned {
+    return i < text.size() ? static_cast<unsigned char>(text[i]) : 0U;
+  };
+  const unsigned lead = byte(at);
+  if (lead < 0x80) {
+    ++at;
+    return lead;
+  }
+  const std::size_t count = lead >= 0xF0 ? 3 : lead >= 0xE0 ? 2 : 1;
+  if (lead < 0xC2 || lead > 0xF4) return kInvalid;
+  char32_t value = lead & (0x3FU >> count);
+  for (std::size_t i = 1; i <= count; ++i) {
+    if ((byte(at + i) & 0xC0) != 0x80) return kInvalid;
+    value = value << 6 | (byte(at + i) & 0x3F);
+  }
+  constexpr std::array<char32_t, 4> kLeast = {0, 0x80, 0x800, 0x10000};
+  if (value < kLeast[count] || value > 0x10FFFF || (value >= 0xD800 && value < 0xE000)) {
+    return kInvalid;
+  }
+  at += count + 1;
+  return value;
+}
+
+void AppendUtf8(std::string& out, char32_t c) {
+  const auto put = [&](char32_t byte) { out.push_back(static_cast<char>(byte)); };
+  if (c < 0x80) {
+    put(c);
+  } else if (c < 0x800) {
+    put(0xC0 | c >> 6);
+    put(0x80 | (c & 0x3F));
+  } else if (c < 0x10000) {
+    put(0xE0 | c >> 12);
+    put(0x80 | (c >> 6 & 0x3F));
+    put(0x80 | (c & 0x3F));
+  } else {
+    put(0xF0 | c >> 18);
+    put(0x80 | (c >> 12 & 0x3F));
+    put(0x80 | (c >> 6 & 0x3F));
+    put(0x80 | (c & 0x3F));
+  }
+}
+
+/// Reads one character of UTF-16 at `at` and moves behind it; U+FFFD for an unpaired surrogate.
+char32_t ReadUtf16(std::u16string_view text, std::size_t& at) {
+  const char32_t unit = text[at++];
+  if (unit < 0xD800 || unit >= 0xE000) return unit;
+  if (unit >= 0xDC00 || at == text.size()) return kReplacement;
+  const char32_t low = text[at];
+  if (low < 0xDC00 || low >= 0xE000) return kReplacement;
+  ++at;
+  return 0x10000 + ((unit - 0xD800) << 10) + (low - 0xDC00);
+}
+
+std::u16string Composed(std::u16string_view text) {
+  UErrorCode status = U_ZERO_ERROR;
+  const UNormalizer2* nfc = unorm2_getNFCInstance(&status);
+  std::u16string out(text.size() + 16, u'\0');
+  const auto normalize = [&] {
+    return unorm2_normalize(nfc,
+                            text.data(),
+                            static_cast<std::int32_t>(text.size()),
+                            out.data(),
+                            static_cast<std::int32_t>(out.size()),
+                            &status);
+  };
+  std::int32_t length = normalize();
+  if (status == U_BUFFER_OVERFLOW_ERROR) {
+    status = U_ZERO_ERROR;
+    out.resize(static_cast<std::size_t>(length));
+    length = normalize();
+  }
+  if (U_FAILURE(status)) return std::u16string(text);
+  out.resize(static_cast<std::size_t>(length));
+  return out;
+}
+
+char MacRomanFromCharacter(char32_t c) {
+  if (c < 0x80) return static_cast<char>(c);
+  for (std::size_t i = 0; i < kMacRomanUpperHalf.size(); ++i) {
+    if (kMacRomanUpperHalf[i] == c) return static_cast<char>(0x80 + i);
+  }
+  return '?';
+}
+
+}  // namespace
+
+std::optional<std::u16string> Utf16FromUtf8(std::string_view text) {
+  std::u16string out;
+  out.reserve(text.size());
+  for (std::size_t at = 0; at < text.size();) {
+    const char32_t c = ReadUtf8(text, at);
+    if (c == kInvalid) return std::nullopt;
+    if (c < 0x10000) {
+      out.push_back(static_cast<char16_t>(c));
+    } else {
+      out.push_back(static_cast<char16_t>(0xD7C0 + (c >> 10)));
+      out.push_back(static_cast<char16_t>(0xDC00 + (c & 0x3FF)));
+    }
+  }
+  return out;
+}
+
+std::string Utf8FromUtf16(std::u16string_view text) {
+  std::string out;
+  out.reserve(text.size());
+  for (std::size_t at = 0; at < text.size();) AppendUtf8(out, ReadUtf16(text, at));
+  return out;
+}
+
+std::optional<std::size_t> Utf16LengthOfUtf8(std::string_view text) {
+  std::size_t length = 0;
+  for (std::size_t at = 0; at < text.size();) {
+    const char32_t c = ReadUtf8(text, at);
+    if (c == kInvalid) return std::nullopt;
+    length += c < 0x10000 ? 1 : 2;
+  }
+  return length;
+}
+
+std::string Utf8FromMacRoman(std::string_view text) {
+  std::string out;
+  out.reserve(text.size());
+  for (const char byte : text) {
+    const auto value = static_cast<unsigned char>(byte);
+    AppendUtf8(out, value < 0x80 ? value : kMacRomanUpperHalf[value - 0x80U]);
+  }
+  return out;
+}
+
+std::string MacRomanFromUtf16(std::u16string_view text) {
+  const std::u16string composed = Composed(text);
+  std::string out;
+  out.reserve(composed.size());
+  for (std::size_t at = 0; at < composed.size();) {
+    out.push_back(MacRomanFromCharacter(ReadUtf16(composed, at)));
+  }
+  return out;
+}
+
+}  // namespace orb::platform

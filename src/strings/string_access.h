@@ -1,0 +1,32 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <orb/strings/string_data.h>
+
+#include <string_view>
+
+#include "strings/text_scan.h"
+
+namespace orb {
+
+/// The UTF-8 text of a string and what is known of it. Valid while the string's value lives.
+struct Utf8Text {
+  std::string_view bytes;
+  TextScan scan;
+
+  /// What the operations work on: an invalid text counts as the empty text.
+  std::string_view Readable() const {
+    return scan.kind == TextKind::kInvalid ? std::string_view() : bytes;
+  }
+};
+
+/// What the library's own sources may do with a string beyond the interface.
+struct StringAccess {
+  /// Reads as a pointer accessor does: a string without value gets one without text. The scan is
+  /// made once for each value and kept.
+  static Utf8Text Read(const COrbStringData& s);
+  /// A new value from bytes that need no terminating zero. They must not hold a zero byte.
+  static COrbStringData FromUtf8(std::string_view text);
+};
+
+}  // namespace orb
