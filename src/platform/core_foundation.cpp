@@ -87,7 +87,7 @@ Boolean CFStringGetCString(CFStringRef text,
   if (text == nullptr || buffer == nullptr || size <= 0) return 0;
   if (encoding != kCFStringEncodingUTF8 && encoding != kCFStringEncodingMacRoman) return 0;
   const std::string bytes =
-      encoding == kCFStringEncodingUTF8 ? Utf8FromUtf16(text->text) : MacRomanFromUtf16(text->text);
+      encoding == kCFStringEncodingUTF8 ? Utf8FromUtf16(text->text) : MacRomanFromUtf16(text->text).bytes;
   if (bytes.size() >= static_cast<std::size_t>(size)) return 0;
   std::memcpy(buffer, bytes.c_str(), bytes.size() + 1);
   return 1;

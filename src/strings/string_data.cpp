@@ -131,7 +131,7 @@ const char* COrbStringData::COrbStringValue::GetPtrSystemEncoding() {
     const char* utf8 = GetPtrUtf8();
     if (utf8 == nullptr) return nullptr;
     const std::optional<std::u16string> text = Utf16FromUtf8(utf8);
-    made = Duplicate(text ? MacRomanFromUtf16(*text) : std::string());
+    made = Duplicate(text ? MacRomanFromUtf16(*text).bytes : std::string());
   }
   systemText.store(made, std::memory_order_release);
   return made;
