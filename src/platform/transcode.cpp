@@ -5,10 +5,15 @@
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <cstdint>
 #include <cstring>
 
 #include "platform/transcode_sse.h"
+
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
 
 namespace orb::platform {
 namespace {
@@ -212,6 +217,35 @@ std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
 std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
   return sse::IsSupported() ? sse::Utf8FromUtf16(text, out) : portable::Utf8FromUtf16(text, out);
 }
+
+#if defined(__SSE2__)
+
+// Aligned blocks of 16 bytes lie within one page, so the one that holds the terminator may be read
+// whole, with what lies before the text and behind it.
+__attribute__((no_sanitize("address", "thread"))) std::size_t Utf16Length(
+    const unsigned short* text) {
+  const auto address = reinterpret_cast<std::uintptr_t>(text);
+  const auto* block = reinterpret_cast<const __m128i*>(address & ~std::uintptr_t{15});
+  const auto zeros = [](const __m128i* units) {
+    const __m128i equal = _mm_cmpeq_epi16(*units, _mm_setzero_si128());
+    return static_cast<unsigned>(_mm_movemask_epi8(equal));
+  };
+  unsigned found = zeros(block) >> (address & 15) << (address & 15);
+  while (found == 0) found = zeros(++block);
+  const auto end =
+      reinterpret_cast<std::uintptr_t>(block) + static_cast<unsigned>(std::countr_zero(found));
+  return (end - address) / sizeof *text;
+}
+
+#else
+
+std::size_t Utf16Length(const unsigned short* text) {
+  std::size_t length = 0;
+  while (text[length] != 0) ++length;
+  return length;
+}
+
+#endif
 
 std::optional<std::u16string> Utf16FromUtf8(std::string_view text) {
   std::u16string out(text.size() + kSlack, u'\0');

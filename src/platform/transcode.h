@@ -21,6 +21,9 @@ std::size_t Utf16FromUtf8(std::string_view text, char16_t* out);
 /// number. `out` needs room for 3 * text.size() + kSlack bytes.
 std::size_t Utf8FromUtf16(std::u16string_view text, char* out);
 
+/// The number of units before the terminating zero.
+std::size_t Utf16Length(const unsigned short* text);
+
 /// Nothing for a text that is not valid UTF-8.
 std::optional<std::u16string> Utf16FromUtf8(std::string_view text);
 std::string Utf8FromUtf16(std::u16string_view text);

@@ -90,10 +90,6 @@ ORB_SSE_INLINE __m128i Bits16(__m128i value, int mask) {
   return _mm_and_si128(value, _mm_set1_epi16(static_cast<short>(mask)));
 }
 
-ORB_SSE_INLINE __m128i Bits32(__m128i value, int mask) {
-  return _mm_and_si128(value, _mm_set1_epi32(mask));
-}
-
 /// One bit for each byte.
 ORB_SSE_INLINE unsigned Mask(__m128i value) {
   return static_cast<unsigned>(_mm_movemask_epi8(value));
@@ -176,6 +172,21 @@ ORB_SSE_INLINE char16_t* StoreAscii(char16_t* out, __m128i bytes) {
   return out + 16;
 }
 
+/// As far as the text is ASCII, in steps of 64.
+ORB_SSE_INLINE std::size_t WidenAscii(const char* from, std::size_t left, char16_t* out) {
+  std::size_t at = 0;
+  for (; left - at >= 4 * kBlock; at += 4 * kBlock) {
+    const __m128i a = Load(from + at);
+    const __m128i b = Load(from + at + kBlock);
+    const __m128i c = Load(from + at + 2 * kBlock);
+    const __m128i d = Load(from + at + 3 * kBlock);
+    if (Mask(_mm_or_si128(_mm_or_si128(a, b), _mm_or_si128(c, d))) != 0) break;
+    char16_t* to = out + at;
+    for (const __m128i bytes : {a, b, c, d}) to = StoreAscii(to, bytes);
+  }
+  return at;
+}
+
 /// Five characters of three bytes each, the shape of most East Asian text. Null when a value is not
 /// allowed.
 ORB_SSE_INLINE char16_t* StoreFiveTriples(char16_t* out, __m128i bytes) {
@@ -239,8 +250,15 @@ ORB_SSE_INLINE bool ConvertBlock(Place* place, __m128i bytes, unsigned nonAscii,
   const Lanes high = {highPair, _mm_unpackhi_epi8(third, zero)};
   __m128i badLow = zero;
   __m128i badHigh = zero;
-  __m128i lowUnits = UpToThreeBytes(low, &badLow);
-  __m128i highUnits = UpToThreeBytes(high, &badHigh);
+  __m128i lowUnits;
+  __m128i highUnits;
+  if (leads.two == leads.four) {
+    lowUnits = _mm_srli_epi16(lowPair, 8);
+    highUnits = _mm_srli_epi16(highPair, 8);
+  } else {
+    lowUnits = UpToThreeBytes(low, &badLow);
+    highUnits = UpToThreeBytes(high, &badHigh);
+  }
   unsigned keep = ~continuation;
   if (leads.four != 0) {
     if (AtLeast(bytes, 0xF5) != 0) return false;
@@ -295,8 +313,10 @@ ORB_SSE std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
     const __m128i bytes = Load(place.at);
     const unsigned nonAscii = Mask(bytes);
     if (nonAscii == 0) {
-      place.out = StoreAscii(place.out, bytes);
-      place.at += kBlock;
+      const std::size_t ascii = WidenAscii(place.at, left(), place.out);
+      if (ascii == 0) StoreAscii(place.out, bytes);
+      place.at += ascii == 0 ? kBlock : ascii;
+      place.out += ascii == 0 ? kBlock : ascii;
       continue;
     }
     if (left() < kBlock + kReadAhead) break;
@@ -310,73 +330,133 @@ namespace {
 
 constexpr std::size_t kUnits = 8;
 
-/// Eight units below U+0800.
-ORB_SSE_INLINE char* StoreUpToTwoBytes(char* out, __m128i units) {
-  const __m128i two =
-      _mm_or_si128(_mm_or_si128(_mm_srli_epi16(units, 6), _mm_slli_epi16(Bits16(units, 0x3F), 8)),
-                   _mm_set1_epi16(static_cast<short>(0x80C0)));
-  const __m128i wide = _mm_cmpgt_epi16(units, _mm_set1_epi16(0x7F));
-  const unsigned set = LaneMask(wide);
-  Store(out, Shuffled(_mm_blendv_epi8(units, two, wide), kOneOrTwoBytes[set]));
+ORB_SSE_INLINE __m128i TwoBytes(__m128i units) {
+  return _mm_or_si128(
+      _mm_or_si128(_mm_srli_epi16(units, 6), _mm_slli_epi16(Bits16(units, 0x3F), 8)),
+      _mm_set1_epi16(static_cast<short>(0x80C0)));
+}
+
+/// Writes ASCII units as one byte and the others as the two of `bytes`.
+ORB_SSE_INLINE char* StoreUpToTwoBytes(char* out, __m128i units, __m128i bytes) {
+  const __m128i one = _mm_cmpeq_epi16(Bits16(units, 0xFF80), _mm_setzero_si128());
+  const unsigned set = LaneMask(one) ^ 0xFF;
+  Store(out, Shuffled(_mm_blendv_epi8(bytes, units, one), kOneOrTwoBytes[set]));
   return out + kUnits + std::popcount(set);
 }
 
-/// Four units, zero-extended. `high` and `low` mark surrogates, which are all paired; `before`
-/// holds the unit before each.
-ORB_SSE_INLINE char* StoreUpToThreeBytes(
-    char* out, __m128i units, __m128i high, __m128i low, __m128i before) {
-  const __m128i ge80 = _mm_cmpgt_epi32(units, _mm_set1_epi32(0x7F));
-  const __m128i surrogate = _mm_or_si128(high, low);
-  const __m128i ge800 = _mm_andnot_si128(surrogate, _mm_cmpgt_epi32(units, _mm_set1_epi32(0x7FF)));
+/// Which of eight units are surrogates.
+struct Surrogates {
+  __m128i high;
+  __m128i low;
+};
 
-  const __m128i last = _mm_slli_epi32(_mm_or_si128(Bits32(units, 0x3F), _mm_set1_epi32(0x80)), 16);
-  const __m128i first = _mm_or_si128(_mm_srli_epi32(units, 12), _mm_set1_epi32(0xE0));
-  const __m128i middle = Bits32(_mm_srli_epi32(units, 6), 0x3F);
-  // The middle byte leads where there are two.
-  const __m128i mark = _mm_blendv_epi8(_mm_set1_epi32(0xC0), _mm_set1_epi32(0x80), ge800);
-  __m128i bytes =
-      _mm_or_si128(first, _mm_or_si128(_mm_slli_epi32(_mm_or_si128(middle, mark), 8), last));
-  bytes = _mm_blendv_epi8(_mm_slli_epi32(units, 16), bytes, ge80);
-
-  // Of a pair each unit gives two of the four bytes.
-  const __m128i top = _mm_add_epi32(Bits32(units, 0x3FF), _mm_set1_epi32(0x40));
+/// Of the four bytes of a pair each unit gives two.
+ORB_SSE_INLINE __m128i BytesOfPairs(__m128i units, const Surrogates& surrogates) {
+  const __m128i top = _mm_add_epi16(Bits16(units, 0x3FF), _mm_set1_epi16(0x40));
   const __m128i ofHigh =
-      _mm_or_si128(_mm_or_si128(Bits32(top, 0x700), _mm_slli_epi32(Bits32(top, 0xFC), 14)),
-                   _mm_set1_epi32(0x80F000));
+      _mm_or_si128(_mm_or_si128(_mm_srli_epi16(top, 8), Bits16(_mm_slli_epi16(top, 6), 0x3F00)),
+                   _mm_set1_epi16(static_cast<short>(0x80F0)));
+  const __m128i before = _mm_slli_si128(units, 2);
   const __m128i ofLow = _mm_or_si128(
-      _mm_or_si128(_mm_slli_epi32(Bits32(before, 3), 12), _mm_slli_epi32(Bits32(units, 0x3C0), 2)),
-      _mm_or_si128(last, _mm_set1_epi32(0x8000)));
-  bytes = _mm_blendv_epi8(_mm_blendv_epi8(bytes, ofHigh, high), ofLow, low);
+      _mm_or_si128(_mm_slli_epi16(Bits16(before, 3), 4), Bits16(_mm_srli_epi16(units, 6), 0x0F)),
+      _mm_or_si128(_mm_slli_epi16(Bits16(units, 0x3F), 8),
+                   _mm_set1_epi16(static_cast<short>(0x8080))));
+  return _mm_blendv_epi8(ofHigh, ofLow, surrogates.low);
+}
 
-  const auto set = static_cast<unsigned>(_mm_movemask_ps(_mm_castsi128_ps(ge80)) |
-                                         _mm_movemask_ps(_mm_castsi128_ps(ge800)) << 4);
-  Store(out, Shuffled(bytes, kOneToThreeBytes[set]));
-  return out + 4 + std::popcount(set);
+/// What the bytes of eight units are: each unit gives the last one, two or three of a head of two
+/// bytes and a tail of one.
+struct Triples {
+  __m128i head;
+  __m128i tail;
+  unsigned two;    // One bit for each unit that gives two bytes or more.
+  unsigned three;  // That gives three.
+};
+
+ORB_SSE_INLINE char* StoreTriples(char* out, const Triples& bytes) {
+  const unsigned low = (bytes.two & 0xF) | (bytes.three & 0xF) << 4;
+  const unsigned high = bytes.two >> 4 | (bytes.three & 0xF0);
+  Store(out, Shuffled(_mm_unpacklo_epi16(bytes.head, bytes.tail), kOneToThreeBytes[low]));
+  out += 4 + std::popcount(low);
+  Store(out, Shuffled(_mm_unpackhi_epi16(bytes.head, bytes.tail), kOneToThreeBytes[high]));
+  return out + 4 + std::popcount(high);
+}
+
+ORB_SSE_INLINE __m128i TailOf(__m128i units) {
+  return _mm_or_si128(Bits16(units, 0x3F), _mm_set1_epi16(0x80));
+}
+
+ORB_SSE_INLINE __m128i HeadOfThree(__m128i units) {
+  return _mm_or_si128(
+      _mm_or_si128(_mm_srli_epi16(units, 12), Bits16(_mm_slli_epi16(units, 2), 0x3F00)),
+      _mm_set1_epi16(static_cast<short>(0x80E0)));
+}
+
+/// Eight units that all take three bytes.
+ORB_SSE_INLINE char* StoreThreeBytes(char* out, __m128i units) {
+  const __m128i head = HeadOfThree(units);
+  const __m128i tail = TailOf(units);
+  const __m128i pack = _mm_setr_epi8(0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, -1, -1, -1, -1);
+  Store(out, _mm_shuffle_epi8(_mm_unpacklo_epi16(head, tail), pack));
+  Store(out + 12, _mm_shuffle_epi8(_mm_unpackhi_epi16(head, tail), pack));
+  return out + 24;
+}
+
+/// Any eight units without surrogates.
+ORB_SSE_INLINE Triples UpToThreeBytes(__m128i units) {
+  const __m128i zero = _mm_setzero_si128();
+  const __m128i one = _mm_cmpeq_epi16(Bits16(units, 0xFF80), zero);
+  const __m128i upToTwo = _mm_cmpeq_epi16(Bits16(units, 0xF800), zero);
+  // The second byte of the head leads where there are two.
+  const __m128i headOfTwo = _mm_or_si128(Bits16(_mm_slli_epi16(units, 2), 0x1F00),
+                                         _mm_set1_epi16(static_cast<short>(0xC000)));
+  return {_mm_blendv_epi8(HeadOfThree(units), headOfTwo, upToTwo),
+          _mm_blendv_epi8(TailOf(units), units, one),
+          LaneMask(one) ^ 0xFF,
+          LaneMask(upToTwo) ^ 0xFF};
 }
 
 /// Any eight units, the first of which is no half of a pair begun before. Null where a surrogate
 /// stands alone; a pair cut by the end is left for the next call.
 ORB_SSE_INLINE char* StoreUnits(char* out, __m128i units, unsigned* taken) {
   const __m128i kind = Bits16(units, 0xFC00);
-  const __m128i high = _mm_cmpeq_epi16(kind, _mm_set1_epi16(static_cast<short>(0xD800)));
-  const __m128i low = _mm_cmpeq_epi16(kind, _mm_set1_epi16(static_cast<short>(0xDC00)));
-  const unsigned highSet = LaneMask(high);
-  if (LaneMask(low) != (highSet << 1 & 0xFF)) return nullptr;
-  const __m128i zero = _mm_setzero_si128();
-  const __m128i before = _mm_slli_si128(units, 2);
-  out = StoreUpToThreeBytes(out,
-                            _mm_unpacklo_epi16(units, zero),
-                            _mm_unpacklo_epi16(high, high),
-                            _mm_unpacklo_epi16(low, low),
-                            _mm_unpacklo_epi16(before, zero));
-  out = StoreUpToThreeBytes(out,
-                            _mm_unpackhi_epi16(units, zero),
-                            _mm_unpackhi_epi16(high, high),
-                            _mm_unpackhi_epi16(low, low),
-                            _mm_unpackhi_epi16(before, zero));
-  const unsigned cut = highSet >> 7;
+  const Surrogates surrogates = {_mm_cmpeq_epi16(kind, _mm_set1_epi16(static_cast<short>(0xD800))),
+                                 _mm_cmpeq_epi16(kind, _mm_set1_epi16(static_cast<short>(0xDC00)))};
+  const unsigned high = LaneMask(surrogates.high);
+  const unsigned low = LaneMask(surrogates.low);
+  Triples bytes = UpToThreeBytes(units);
+  if ((high | low) == 0) {
+    return bytes.three == 0xFF ? StoreThreeBytes(out, units) : StoreTriples(out, bytes);
+  }
+  if (low != (high << 1 & 0xFF)) return nullptr;
+  const unsigned cut = high >> 7;
   *taken = kUnits - cut;
-  return out - 2 * cut;
+  const __m128i any = _mm_or_si128(surrogates.high, surrogates.low);
+  const __m128i pairs = BytesOfPairs(units, surrogates);
+  bytes.three &= ~(high | low);
+  if (bytes.three == 0) {
+    return StoreUpToTwoBytes(out, units, _mm_blendv_epi8(TwoBytes(units), pairs, any)) - 2 * cut;
+  }
+  bytes.head = _mm_blendv_epi8(bytes.head, _mm_slli_epi16(pairs, 8), any);
+  bytes.tail = _mm_blendv_epi8(bytes.tail, _mm_srli_epi16(pairs, 8), any);
+  return StoreTriples(out, bytes) - 2 * cut;
+}
+
+/// As far as the text is ASCII, in steps of 32.
+ORB_SSE_INLINE std::size_t CopyAscii(std::u16string_view text, char* out) {
+  std::size_t at = 0;
+  for (; text.size() - at >= 32; at += 32) {
+    const char16_t* from = text.data() + at;
+    const __m128i a = Load(from);
+    const __m128i b = Load(from + 8);
+    const __m128i c = Load(from + 16);
+    const __m128i d = Load(from + 24);
+    const __m128i any = _mm_or_si128(_mm_or_si128(a, b), _mm_or_si128(c, d));
+    if (!_mm_testz_si128(any, _mm_set1_epi16(-0x80))) break;
+    Store(out + at, _mm_packus_epi16(a, b));
+    Store(out + at + 16, _mm_packus_epi16(c, d));
+  }
+  return at;
 }
 
 }  // namespace
@@ -387,10 +467,14 @@ ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
     const __m128i units = Load(text.data());
     unsigned taken = kUnits;
     if (_mm_testz_si128(units, _mm_set1_epi16(-0x80))) {
+      const std::size_t ascii = CopyAscii(text, out);
+      out += ascii;
+      text.remove_prefix(ascii);
+      if (ascii != 0) continue;
       _mm_storel_epi64(reinterpret_cast<__m128i*>(out), _mm_packus_epi16(units, units));
       out += kUnits;
     } else if (_mm_testz_si128(units, _mm_set1_epi16(-0x800))) {
-      out = StoreUpToTwoBytes(out, units);
+      out = StoreUpToTwoBytes(out, units, TwoBytes(units));
     } else if (char* stored = StoreUnits(out, units, &taken)) {
       out = stored;
     } else {

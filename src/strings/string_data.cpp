@@ -19,6 +19,7 @@ using orb::platform::kNotUtf8;
 using orb::platform::kSlack;
 using orb::platform::MacRomanFromUtf16;
 using orb::platform::Utf16FromUtf8;
+using orb::platform::Utf16Length;
 using orb::platform::Utf8FromMacRoman;
 using orb::platform::Utf8FromUtf16;
 
@@ -44,12 +45,6 @@ class Held {
  private:
   const COrbCriticalSection& lock_;
 };
-
-std::size_t Length(const unsigned short* text) {
-  std::size_t length = 0;
-  while (text[length] != 0) ++length;
-  return length;
-}
 
 /// A text on its way to being stored; `text` is null when there was no memory.
 template <typename Unit>
@@ -219,7 +214,7 @@ OrbResult COrbStringData::COrbStringValue::InitWithUnicode(const unsigned short*
   if (master != kNone) return kOrbNoErr;
   const Held held(lock);
   if (master != kNone) return kOrbNoErr;
-  const Copy<unsigned short> copy = Duplicate(text, Length(text));
+  const Copy<unsigned short> copy = Duplicate(text, Utf16Length(text));
   StoreUnicode(copy.text, copy.length);
   master = kUnicode;
   return kOrbNoErr;
@@ -433,7 +428,7 @@ OrbResult COrbStringData::InitWithUtf8(const char* text) {
 
 OrbResult COrbStringData::InitWithUnicode(const unsigned short* text) {
   const bool isText = text != nullptr;
-  Replace(isText ? COrbStringValue::Make(kUnicode, text, Length(text)) : new COrbStringValue);
+  Replace(isText ? COrbStringValue::Make(kUnicode, text, Utf16Length(text)) : new COrbStringValue);
   return isText ? kOrbNoErr : kOrbErrUnknown;
 }
 
