@@ -68,11 +68,19 @@ Copy<unsigned short> Duplicate(const unsigned short* text, std::size_t length) {
   return {copy, length};
 }
 
-/// Gives back what a buffer has too much.
+/// Gives back what a buffer has too much. A large one is copied: an allocator that maps such sizes
+/// learns to keep them only when they are freed as large as they were asked for, and would map the
+/// next one anew.
 template <typename Unit>
-Unit* Shrunk(Unit* buffer, std::size_t size) {
-  void* shrunk = std::realloc(buffer, size);
-  return shrunk == nullptr ? buffer : static_cast<Unit*>(shrunk);
+Unit* Shrunk(Unit* buffer, std::size_t used, std::size_t before, std::size_t size) {
+  constexpr std::size_t kLarge = 64 * 1024;
+  void* exact = before < kLarge ? std::realloc(buffer, size) : std::malloc(size);
+  if (exact == nullptr) return buffer;
+  if (before >= kLarge) {
+    std::memcpy(exact, buffer, used);
+    std::free(buffer);
+  }
+  return static_cast<Unit*>(exact);
 }
 
 /// `most` bounds what `write` writes, without its slack; it returns the length.
@@ -86,7 +94,7 @@ Copy<char> Written(std::size_t most, Write write) {
   if (made == nullptr) return {nullptr, 0};
   const std::size_t length = write(made);
   made[length] = '\0';
-  return {Shrunk(made, length + 1), length};
+  return {Shrunk(made, length + 1, most + kSlack, length + 1), length};
 }
 
 /// The UTF-16 copy has room for twice its units, all zero behind the text.
@@ -115,7 +123,9 @@ Copy<unsigned short> UnicodeFrom(std::string_view utf8) {
   if (made == nullptr) return {nullptr, 0};
   std::size_t length = Utf16FromUtf8(utf8, reinterpret_cast<char16_t*>(made));
   if (length == kNotUtf8) length = 0;
-  if (length != utf8.size()) made = Shrunk(made, UnicodeSize(length));
+  if (length != utf8.size()) {
+    made = Shrunk(made, length * sizeof *made, most, UnicodeSize(length));
+  }
   return Terminated(made, length);
 }
 
