@@ -208,7 +208,21 @@ std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
   return static_cast<std::size_t>(out - begin);
 }
 
+std::size_t Utf16LengthOfValid(std::string_view text) {
+  std::size_t length = 0;
+  for (const char byte : text) {
+    const auto value = static_cast<unsigned char>(byte);
+    length += (value & 0xC0) != 0x80 ? 1 : 0;
+    length += value >= 0xF0 ? 1 : 0;
+  }
+  return length;
+}
+
 }  // namespace portable
+
+std::size_t Utf16LengthOfValid(std::string_view text) {
+  return sse::IsSupported() ? sse::Utf16LengthOfValid(text) : portable::Utf16LengthOfValid(text);
+}
 
 std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
   return sse::IsSupported() ? sse::Utf16FromUtf8(text, out) : portable::Utf16FromUtf8(text, out);

@@ -3,7 +3,7 @@
 
 #include "platform/transcode.h"
 
-#if defined(__x86_64__) || defined(__i386__)
+#if defined(__x86_64__)
 
 #include <immintrin.h>
 
@@ -513,7 +513,10 @@ ORB_SSE_INLINE void StoreAscii(char* out, __m128i units) {
 }
 
 bool IsPair(std::u16string_view text) {
-  return text.size() >= 2 && (text[0] & 0xFC00) == 0xD800 && (text[1] & 0xFC00) == 0xDC00;
+  if (text.size() < 2) return false;
+  std::uint32_t both = 0;
+  std::memcpy(&both, text.data(), sizeof both);
+  return (both & 0xFC00FC00) == 0xDC00D800;
 }
 
 std::uint32_t BytesOfPair(std::u16string_view text) {
@@ -524,12 +527,11 @@ std::uint32_t BytesOfPair(std::u16string_view text) {
 }
 
 /// Among ASCII, pairs stand in small groups: takes a block's ASCII up to such a group, and the
-/// group, so that the next block begins in step with the text. Takes nothing where the first unit
-/// beyond ASCII begins no pair.
-ORB_SSE_INLINE char* StoreGroup(char* out, __m128i units, std::u16string_view* text) {
-  const __m128i one = _mm_cmpeq_epi16(Bits16(units, 0xFF80), _mm_setzero_si128());
-  const auto ascii = static_cast<std::size_t>(std::countr_one(LaneMask(one)));
-  if (!IsPair(text->substr(ascii))) return out;
+/// group, so that the next block begins in step with the text.
+ORB_SSE_INLINE char* StoreGroup(char* out,
+                                __m128i units,
+                                std::size_t ascii,
+                                std::u16string_view* text) {
   StoreAscii(out, units);
   out += ascii;
   text->remove_prefix(ascii);
@@ -565,16 +567,60 @@ ORB_SSE_INLINE std::size_t CopyAscii(std::u16string_view text, char* out) {
   return at;
 }
 
+/// How long the text begins with ASCII, in whole steps of 64.
+ORB_SSE_INLINE std::size_t AsciiLength(std::string_view text) {
+  std::size_t at = 0;
+  for (; text.size() - at >= 4 * kBlock; at += 4 * kBlock) {
+    const char* from = text.data() + at;
+    const __m128i a = _mm_or_si128(Load(from), Load(from + kBlock));
+    const __m128i b = _mm_or_si128(Load(from + 2 * kBlock), Load(from + 3 * kBlock));
+    if (Mask(_mm_or_si128(a, b)) != 0) break;
+  }
+  return at;
+}
+
 }  // namespace
+
+ORB_SSE std::size_t Utf16LengthOfValid(std::string_view text) {
+  constexpr std::size_t kRound = 127;  // So many blocks add up to no more than a byte holds.
+  const __m128i zero = _mm_setzero_si128();
+  const std::size_t ascii = AsciiLength(text);
+  text.remove_prefix(ascii);
+  __m128i sum = zero;
+  std::size_t blocks = text.size() / kBlock;
+  const char* at = text.data();
+  while (blocks != 0) {
+    __m128i counts = zero;
+    const std::size_t round = blocks < kRound ? blocks : kRound;
+    for (std::size_t i = 0; i < round; ++i, at += kBlock) {
+      const __m128i bytes = Load(at);
+      const __m128i first = _mm_cmpgt_epi8(bytes, _mm_set1_epi8(-65));
+      const __m128i four =
+          _mm_cmpeq_epi8(_mm_max_epu8(bytes, _mm_set1_epi8(static_cast<char>(0xF0))), bytes);
+      counts = _mm_sub_epi8(_mm_sub_epi8(counts, first), four);
+    }
+    sum = _mm_add_epi64(sum, _mm_sad_epu8(counts, zero));
+    blocks -= round;
+  }
+  const auto counted = static_cast<std::size_t>(_mm_cvtsi128_si64(sum)) +
+                       static_cast<std::size_t>(_mm_extract_epi64(sum, 1));
+  return ascii + counted + portable::Utf16LengthOfValid(text.substr(text.size() / kBlock * kBlock));
+}
 
 ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
   const char* const begin = out;
   while (text.size() >= kUnits) {
     const __m128i units = Load(text.data());
-    if (_mm_testz_si128(units, _mm_set1_epi16(-0x80))) {
+    const unsigned one = Mask(_mm_cmpeq_epi16(Bits16(units, 0xFF80), _mm_setzero_si128()));
+    if (one == 0xFFFF) {
       const std::size_t ascii = CopyAscii(text, out);
       out += ascii;
       text.remove_prefix(ascii);
+      continue;
+    }
+    const auto ascii = static_cast<std::size_t>(std::countr_one(one)) / 2;
+    if (IsPair(text.substr(ascii))) {
+      out = StoreGroup(out, units, ascii, &text);
       continue;
     }
     if (_mm_testz_si128(units, _mm_set1_epi16(-0x800))) {
@@ -583,11 +629,6 @@ ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
       continue;
     }
     const Pairs pairs = PairsIn(units);
-    if (pairs.high != 0) {
-      const std::size_t before = text.size();
-      out = StoreGroup(out, units, &text);
-      if (text.size() != before) continue;
-    }
     const unsigned cut = CutPair(text);
     if (pairs.AreWhole()) {
       out = StoreUnits(out, units, pairs) - 2 * cut;
@@ -607,6 +648,7 @@ ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
 namespace orb::platform::sse {
 
 bool IsSupported() { return false; }
+std::size_t Utf16LengthOfValid(std::string_view text) { return portable::Utf16LengthOfValid(text); }
 std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
   return portable::Utf16FromUtf8(text, out);
 }
