@@ -140,7 +140,8 @@ COrbStringData OrbStringDataReplace(const COrbStringData& s,
   if (orb::FindEquivalent(text, wanted) == orb::kNotFound) {
     return StringAccess::FromUtf8(text.bytes);
   }
-  return StringAccess::FromUtf8(orb::Replaced(text, wanted, StringAccess::Read(with).bytes));
+  const orb::Replaced replaced(text, wanted, StringAccess::Read(with).bytes);
+  return StringAccess::FromUtf8(replaced.View());
 }
 
 void OrbStringDataSplit(const COrbStringData& s,

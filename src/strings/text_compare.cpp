@@ -51,21 +51,31 @@ int OrderOfBytes(unsigned a, unsigned b) {
   return swapped ? Order(b, a) : Order(a, b);
 }
 
-/// Skips what both texts have in common in ASCII, letter case apart.
-std::size_t CommonFoldedAscii(std::string_view a, std::string_view b) {
+/// Eight bytes with the ASCII capitals among them made small.
+std::uint64_t FoldedWord(std::uint64_t word) {
+  constexpr std::uint64_t kEach = 0x0101010101010101;
+  const std::uint64_t low = word & 0x7F * kEach;
+  const std::uint64_t fromA = low + (0x80 - 'A') * kEach;
+  const std::uint64_t beyondZ = low + (0x7F - 'Z') * kEach;
+  return word | (fromA & ~beyondZ & ~word & 0x80 * kEach) >> 2;
+}
+
+unsigned FoldedByte(std::string_view text, std::size_t at) {
+  return FormReader::FoldAscii(ByteAt(text, at));
+}
+
+/// Where two texts begin to differ, the case of ASCII letters apart, or the shorter one ends.
+std::size_t CommonFoldedBytes(std::string_view a, std::string_view b) {
   const std::size_t size = std::min(a.size(), b.size());
   std::size_t at = 0;
-  constexpr std::uint64_t kHighBits = 0x8080808080808080;
-  while (size - at >= sizeof(std::uint64_t)) {
-    const std::uint64_t word = Word(a.data() + at);
-    if (word != Word(b.data() + at) || (word & kHighBits) != 0) break;
-    at += sizeof(std::uint64_t);
+  for (; size - at >= sizeof(std::uint64_t); at += sizeof(std::uint64_t)) {
+    const std::uint64_t different =
+        FoldedWord(Word(a.data() + at)) ^ FoldedWord(Word(b.data() + at));
+    if (different == 0) continue;
+    if constexpr (std::endian::native != std::endian::little) break;
+    return at + static_cast<std::size_t>(std::countr_zero(different)) / 8;
   }
-  for (; at < size; ++at) {
-    const unsigned x = ByteAt(a, at);
-    const unsigned y = ByteAt(b, at);
-    if ((x | y) >= 0x80 || FormReader::FoldAscii(x) != FormReader::FoldAscii(y)) break;
-  }
+  while (at < size && FoldedByte(a, at) == FoldedByte(b, at)) ++at;
   return at;
 }
 
@@ -82,13 +92,30 @@ int CompareForms(FormReader a, FormReader b) {
   }
 }
 
+/// The first unit of a text that is not empty; 0 when more than its first character decides that.
+char16_t FirstUnit(std::string_view text, Form form) {
+  const unsigned lead = ByteAt(text, 0);
+  if (lead < 0x80) return static_cast<char16_t>(FormReader::FoldAscii(lead));
+  const platform::CharForm first = platform::FormOf(form, CharAt(text, 0));
+  return first.leadsWithStarter && first.length != 0 ? first.units[0] : u'\0';
+}
+
 int CompareInForm(const TextPrefix& a, const TextPrefix& b, Form form) {
-  // No mark can move across an ASCII character, so the rest can be compared by itself.
-  const std::size_t common = CommonFoldedAscii(a.bytes, b.bytes);
-  const std::string_view x = a.bytes.substr(common);
-  const std::string_view y = b.bytes.substr(common);
-  if (!x.empty() && !y.empty() && (ByteAt(x, 0) | ByteAt(y, 0)) < 0x80) {
-    return Order(FormReader::FoldAscii(ByteAt(x, 0)), FormReader::FoldAscii(ByteAt(y, 0)));
+  const std::size_t common = CommonFoldedBytes(a.bytes, b.bytes);
+  const bool ends = common == a.bytes.size() || common == b.bytes.size();
+  if (!ends && (ByteAt(a.bytes, common) | ByteAt(b.bytes, common)) < 0x80) {
+    return Order(FoldedByte(a.bytes, common), FoldedByte(b.bytes, common));
+  }
+  // No mark can move across an ASCII character, so what follows the last one stands by itself.
+  std::size_t from = common;
+  while (from != 0 && ByteAt(a.bytes, from - 1) >= 0x80) --from;
+  const std::string_view x = a.bytes.substr(from);
+  const std::string_view y = b.bytes.substr(from);
+  if (ends && from == common && a.lone == 0 && b.lone == 0) return Order(x.size(), y.size());
+  if (!x.empty() && !y.empty()) {
+    const char16_t unitOfX = FirstUnit(x, form);
+    const char16_t unitOfY = FirstUnit(y, form);
+    if (unitOfX != unitOfY && unitOfX != 0 && unitOfY != 0) return Order(unitOfX, unitOfY);
   }
   return CompareForms(FormReader(x, form, a.lone), FormReader(y, form, b.lone));
 }

@@ -2,9 +2,9 @@
 #include "strings/text_edit.h"
 
 #include <algorithm>
+#include <array>
 #include <bitset>
 #include <cstring>
-#include <memory>
 #include <utility>
 
 #include "strings/text_search.h"
@@ -69,60 +69,42 @@ class Cutter {
   std::optional<EquivalenceSearch> equivalent_;
 };
 
-std::string ReplacedInSteps(const Utf8Text& text, const Utf8Text& find, std::string_view with) {
-  std::string out;
-  std::string repaired;
-  Cutter cutter(text, find, repaired);
-  while (const auto piece = cutter.Next()) {
-    out += *piece;
-    out += with;
-  }
-  out += cutter.Rest();
-  return out;
-}
-
-/// Writes short stretches in steps of 16 bytes, beyond their end where there is room.
+/// Writes many short stretches one behind the other. It copies 32 bytes where fewer are wanted, so
+/// it needs that many bytes of room behind the last.
 class Writer {
  public:
-  Writer(char* to, const char* end) : to_(to), end_(end) {}
+  static constexpr std::size_t kStretch = 32;
 
-  void Put(std::string_view text, const char* readableEnd) {
-    const char* from = text.data();
-    char* const done = to_ + text.size();
-    const auto room = static_cast<std::size_t>(end_ - to_);
-    const auto readable = static_cast<std::size_t>(readableEnd - from);
-    if (text.size() > kShort || room < kShort || readable < kShort) {
-      if (!text.empty()) std::memcpy(to_, from, text.size());
+  explicit Writer(char* to) : to_(to) {}
+
+  /// `readable` bytes can be read from where `text` begins.
+  void Put(std::string_view text, std::size_t readable) {
+    if (text.size() > kStretch || readable < kStretch) {
+      text.copy(to_, text.size());
     } else {
-      std::memcpy(to_, from, kShort / 2);
-      std::memcpy(to_ + kShort / 2, from + kShort / 2, kShort / 2);
+      std::memcpy(to_, text.data(), kStretch / 2);
+      std::memcpy(to_ + kStretch / 2, text.data() + kStretch / 2, kStretch / 2);
     }
-    to_ = done;
+    to_ += text.size();
   }
+  const char* End() const { return to_; }
 
  private:
-  static constexpr std::size_t kShort = 32;
-
   char* to_;
-  const char* end_;
 };
 
-std::string ReplacedLiterally(std::string_view text, std::string_view find, std::string_view with) {
-  const LiteralSearch search(find);
-  std::size_t matches = 0;
-  search.ForEach(text, [&](std::size_t) { return ++matches != 0; });
-  std::string out(text.size() - matches * find.size() + matches * with.size(), '\0');
-  Writer writer(out.data(), out.data() + out.size());
-  const char* const textEnd = text.data() + text.size();
-  std::size_t done = 0;
-  search.ForEach(text, [&](std::size_t place) {
-    writer.Put(text.substr(done, place - done), textEnd);
-    writer.Put(with, with.data() + with.size());
-    done = place + find.size();
-    return true;
-  });
-  writer.Put(text.substr(done), textEnd);
-  return out;
+std::size_t CountMatches(const LiteralSearch& search, std::string_view text) {
+  std::size_t count = 0;
+  search.ForEach(text, [&](std::size_t) { return ++count != 0; });
+  return count;
+}
+
+/// No fewer than there are. Counts only where a guess would take much more room than the text.
+std::size_t MostMatches(const LiteralSearch& search,
+                        std::string_view text,
+                        std::size_t find,
+                        std::size_t with) {
+  return with <= 2 * find ? text.size() / find : CountMatches(search, text);
 }
 
 /// A set of plain characters. As it is one of UTF-16 units, U+FFFD is in it for halves of pairs.
@@ -199,7 +181,8 @@ std::vector<std::string> UnitsOf(std::string_view text) {
 /// The text with every character of the set made its first one.
 std::string Unified(std::string text, const std::vector<std::string>& set) {
   for (std::size_t i = 1; i < set.size(); ++i) {
-    text = Replaced(Scanned(text), Scanned(set[i]), set.front());
+    const Replaced step(Scanned(text), Scanned(set[i]), set.front());
+    text = std::string(step.View());
   }
   return text;
 }
@@ -215,7 +198,7 @@ Trimmed TrimInSteps(const Utf8Text& text, std::string_view set, bool left, bool 
   const Utf8Text separator = Scanned(units.empty() ? std::string_view() : units.front());
   const Pieces split(Scanned(unified), separator);
   if (split.Views().empty()) {
-    const bool nothing = Replaced(Scanned(unified), separator, {}).empty();
+    const bool nothing = Replaced(Scanned(unified), separator, {}).View().empty();
     return {nothing ? Trimming::kEverything : Trimming::kNothing, {}};
   }
   const std::string_view first = split.Views().front();
@@ -263,10 +246,46 @@ std::string Middle(std::string_view text, std::size_t start, std::size_t count) 
   return out;
 }
 
-std::string Replaced(const Utf8Text& text, const Utf8Text& find, std::string_view with) {
-  if (text.Readable().empty() || find.Readable().empty()) return std::string(text.bytes);
-  if (IsPlain(text) && IsPlain(find)) return ReplacedLiterally(text.bytes, find.bytes, with);
-  return ReplacedInSteps(text, find, with);
+Replaced::Replaced(const Utf8Text& text, const Utf8Text& find, std::string_view with)
+    : view_(text.bytes) {
+  if (text.Readable().empty() || find.Readable().empty()) return;
+  if (IsPlain(text) && IsPlain(find)) {
+    ReplaceLiterally(text.bytes, find.bytes, with);
+  } else {
+    ReplaceInSteps(text, find, with);
+  }
+}
+
+void Replaced::ReplaceInSteps(const Utf8Text& text, const Utf8Text& find, std::string_view with) {
+  std::string repaired;
+  Cutter cutter(text, find, repaired);
+  while (const auto piece = cutter.Next()) {
+    inSteps_ += *piece;
+    inSteps_ += with;
+  }
+  inSteps_ += cutter.Rest();
+  view_ = inSteps_;
+}
+
+void Replaced::ReplaceLiterally(std::string_view text,
+                                std::string_view find,
+                                std::string_view with) {
+  const LiteralSearch search(find);
+  const std::size_t most = MostMatches(search, text, find.size(), with.size());
+  const std::size_t grown = with.size() > find.size() ? (with.size() - find.size()) * most : 0;
+  literally_ = std::make_unique_for_overwrite<char[]>(text.size() + grown + Writer::kStretch);
+  std::array<char, Writer::kStretch> padded{};  // A short `with`, so that 32 bytes can be read.
+  if (with.size() < padded.size()) with = {padded.data(), with.copy(padded.data(), with.size())};
+  Writer writer(literally_.get());
+  std::size_t done = 0;
+  search.ForEach(text, [&](std::size_t place) {
+    writer.Put(text.substr(done, place - done), text.size() - done);
+    writer.Put(with, Writer::kStretch);
+    done = place + find.size();
+    return true;
+  });
+  writer.Put(text.substr(done), 0);
+  view_ = {literally_.get(), static_cast<std::size_t>(writer.End() - literally_.get())};
 }
 
 Pieces::Pieces(const Utf8Text& text, const Utf8Text& separator) {

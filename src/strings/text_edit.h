@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstddef>
+#include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -28,7 +29,20 @@ std::string Middle(std::string_view text, std::size_t start, std::size_t count);
 
 /// From each match as many units are replaced as `find` has, whatever the match's own length; what
 /// follows them is searched like a text of its own.
-std::string Replaced(const Utf8Text& text, const Utf8Text& find, std::string_view with);
+class Replaced {
+ public:
+  Replaced(const Utf8Text& text, const Utf8Text& find, std::string_view with);
+
+  std::string_view View() const { return view_; }
+
+ private:
+  void ReplaceInSteps(const Utf8Text& text, const Utf8Text& find, std::string_view with);
+  void ReplaceLiterally(std::string_view text, std::string_view find, std::string_view with);
+
+  std::string_view view_;  // Of one of these, or of the text itself where nothing is replaced.
+  std::string inSteps_;
+  std::unique_ptr<char[]> literally_;
+};
 
 /// The pieces of a text between separators, without the empty ones; none when there is no
 /// separator. They lie in the text or in this object.

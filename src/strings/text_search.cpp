@@ -13,20 +13,14 @@ LiteralSearch::LiteralSearch(std::string_view needle, Case rule) : needle_(needl
   const std::size_t beforeLast = needle.size() < 2 ? 0 : needle.size() - 2;
   last_ = needle.size() - 1;
   first_ = std::min(CharSize(ByteAt(needle, 0)) - 1, beforeLast);
-  for (std::size_t i = 0; i < std::min(needle.size(), kBlock); ++i) {
-    head_[i] = Folded(needle[i]);
-    headCase_[i] = CaseBit(i);
-  }
+  const std::size_t size = std::min(needle.size(), sizeof(head_));
+  std::memcpy(&head_, needle.data(), size);
+  std::memset(&headMask_, 0xFF, size);
 }
 
-bool LiteralSearch::EqualFrom(std::size_t i, const char* text) const {
-  if (rule_ == Case::kExact) return std::memcmp(text + i, &needle_[i], needle_.size() - i) == 0;
-  while (i < needle_.size() && Folded(text[i]) == Folded(needle_[i])) ++i;
-  return i == needle_.size();
-}
-
-bool LiteralSearch::MatchesAt(std::string_view text, std::size_t at) const {
-  return EqualFrom(0, text.data() + at);
+bool LiteralSearch::MatchesFolded(const char* text) const {
+  return std::equal(
+      needle_.begin(), needle_.end(), text, [&](char a, char b) { return Folded(a) == Folded(b); });
 }
 
 std::size_t LiteralSearch::Find(std::string_view text) const {

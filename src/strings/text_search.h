@@ -74,20 +74,29 @@ class LiteralSearch {
   std::size_t Find(std::string_view text) const;
 
  private:
-  static constexpr std::size_t kBlock = 16;
+  static constexpr std::size_t kStep = 32;  // Places tested at once.
+  class PairTest;
 
   unsigned char Folded(char c) const {
     const bool capital = rule_ == Case::kAscii && c >= 'A' && c <= 'Z';
     return static_cast<unsigned char>(capital ? c | 0x20 : c);
   }
-  /// The bit that has to be set in a text's byte for both cases of the needle's letter to look
-  /// alike.
+  bool MatchesAt(std::string_view text, std::size_t at) const {
+    const char* here = text.data() + at;
+    if (rule_ == Case::kAscii) return MatchesFolded(here);
+    if (needle_.size() > sizeof(head_) || text.size() - at < sizeof(head_)) {
+      return std::memcmp(here, needle_.data(), needle_.size()) == 0;
+    }
+    std::uint64_t head;
+    std::memcpy(&head, here, sizeof head);
+    return (head & headMask_) == head_;
+  }
+  bool MatchesFolded(const char* text) const;
+  /// The bit that both cases of the needle's letter at `i` have, once it is set.
   unsigned char CaseBit(std::size_t i) const {
-    const char lower = static_cast<char>(Folded(needle_[i]));
+    const unsigned char lower = Folded(needle_[i]);
     return rule_ == Case::kAscii && lower >= 'a' && lower <= 'z' ? 0x20 : 0;
   }
-  bool EqualFrom(std::size_t i, const char* text) const;
-  bool MatchesAt(std::string_view text, std::size_t at) const;
   template <typename OnMatch>
   void ForEachSlowly(std::string_view text, std::size_t from, OnMatch&& onMatch) const;
 
@@ -95,9 +104,47 @@ class LiteralSearch {
   Case rule_;
   std::size_t first_;  // The two places in the needle that are tested at once.
   std::size_t last_;
-  alignas(kBlock) std::array<unsigned char, kBlock> head_{};
-  alignas(kBlock) std::array<unsigned char, kBlock> headCase_{};
+  std::uint64_t head_ = 0;  // A needle of up to eight bytes as a number, and its bits.
+  std::uint64_t headMask_ = 0;
 };
+
+#ifdef __SSE2__
+/// Looks for two bytes of the needle at 32 places at once.
+class LiteralSearch::PairTest {
+ public:
+  explicit PairTest(const LiteralSearch& search)
+      : isExact(search.needle_.size() <= 2),
+        firstAt_(search.first_),
+        lastAt_(search.last_),
+        first_(Spread(search.Folded(search.needle_[firstAt_]))),
+        last_(Spread(search.Folded(search.needle_[lastAt_]))),
+        firstCase_(Spread(search.CaseBit(firstAt_))),
+        lastCase_(Spread(search.CaseBit(lastAt_))) {}
+
+  unsigned Hits(const char* at) const { return Hits16(at) | Hits16(at + 16) << 16; }
+
+  const bool isExact;  ///< A hit is a match.
+
+ private:
+  static __m128i Spread(unsigned char byte) { return _mm_set1_epi8(static_cast<char>(byte)); }
+  static __m128i Load(const char* at) {
+    return _mm_loadu_si128(reinterpret_cast<const __m128i*>(at));
+  }
+  unsigned Hits16(const char* at) const {
+    const __m128i first = _mm_or_si128(Load(at + firstAt_), firstCase_);
+    const __m128i last = _mm_or_si128(Load(at + lastAt_), lastCase_);
+    return static_cast<unsigned>(_mm_movemask_epi8(
+        _mm_and_si128(_mm_cmpeq_epi8(first, first_), _mm_cmpeq_epi8(last, last_))));
+  }
+
+  std::size_t firstAt_;
+  std::size_t lastAt_;
+  __m128i first_;
+  __m128i last_;
+  __m128i firstCase_;
+  __m128i lastCase_;
+};
+#endif
 
 template <typename OnMatch>
 void LiteralSearch::ForEachSlowly(std::string_view text,
@@ -117,32 +164,18 @@ template <typename OnMatch>
 void LiteralSearch::ForEach(std::string_view text, OnMatch&& onMatch) const {
   const std::size_t size = needle_.size();
   std::size_t next = 0;  // Nothing before this place is looked at any more.
+  if (text.size() < size) return;
 #ifdef __SSE2__
-  const auto load = [](const void* from) {
-    return _mm_loadu_si128(static_cast<const __m128i*>(from));
-  };
-  const auto spread = [](unsigned char byte) { return _mm_set1_epi8(static_cast<char>(byte)); };
-  const __m128i firstCase = spread(CaseBit(first_));
-  const __m128i lastCase = spread(CaseBit(last_));
-  const __m128i first = spread(Folded(needle_[first_]));
-  const __m128i last = spread(Folded(needle_[last_]));
-  const __m128i head = load(head_.data());
-  const __m128i headCase = load(headCase_.data());
-  const unsigned headMask = size >= kBlock ? 0xFFFFU : (1U << size) - 1;
-  std::size_t wasted = 0;  // Bytes of long needles compared in vain.
-  // Two blocks have to be left, so that the 16 bytes at any place of the first can be read.
-  for (std::size_t block = 0; text.size() - block >= last_ + 2 * kBlock; block += kBlock) {
-    const char* at = text.data() + block;
-    const __m128i hits =
-        _mm_and_si128(_mm_cmpeq_epi8(_mm_or_si128(load(at + first_), firstCase), first),
-                      _mm_cmpeq_epi8(_mm_or_si128(load(at + last_), lastCase), last));
-    for (auto mask = static_cast<unsigned>(_mm_movemask_epi8(hits)); mask != 0; mask &= mask - 1) {
-      const std::size_t place = block + static_cast<std::size_t>(std::countr_zero(mask));
+  const PairTest test(*this);
+  const char* const data = text.data();
+  std::size_t wasted = 0;                       // Bytes of long needles compared in vain.
+  const std::size_t end = text.size() - last_;  // Of the places where a match can begin.
+  for (std::size_t block = 0; end >= kStep && next < end; block = next) {
+    if (block + kStep > end) block = end - kStep;  // The last step looks at some places again.
+    for (unsigned hits = test.Hits(data + block); hits != 0; hits &= hits - 1) {
+      const std::size_t place = block + static_cast<std::size_t>(std::countr_zero(hits));
       if (place < next) continue;
-      const __m128i here = _mm_or_si128(load(text.data() + place), headCase);
-      const auto equal = static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(here, head)));
-      if ((equal & headMask) != headMask) continue;
-      if (size > kBlock && !EqualFrom(kBlock, text.data() + place)) {
+      if (!test.isExact && !MatchesAt(text, place)) {
         wasted += size;
         if (wasted > 16 * (place + 4096)) return ForEachSlowly(text, place + 1, onMatch);
         continue;
@@ -150,12 +183,11 @@ void LiteralSearch::ForEach(std::string_view text, OnMatch&& onMatch) const {
       if (!onMatch(place)) return;
       next = place + size;
     }
-    if (next < block + kBlock) next = block + kBlock;
+    if (next < block + kStep) next = block + kStep;
   }
 #endif
-  if (text.size() < size) return;
-  if (text.size() - next > size + 2 * kBlock) return ForEachSlowly(text, next, onMatch);
-  while (next <= text.size() - size) {
+  if (text.size() - next > size + kStep) return ForEachSlowly(text, next, onMatch);
+  while (next + size <= text.size()) {
     if (!MatchesAt(text, next)) {
       ++next;
     } else {

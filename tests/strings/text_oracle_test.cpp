@@ -50,10 +50,13 @@ std::u16string Folded(const std::u16string& text) {
 
 bool IsBoundary(const std::u16string& text, std::size_t at) {
   if (at == 0 || at == text.size()) return true;
+  if (U16_IS_TRAIL(text[at])) return false;
   UErrorCode status = U_ZERO_ERROR;
-  UChar32 c = 0;
-  U16_GET(text.data(), 0, static_cast<std::int32_t>(at), Size(text), c);
-  return !U16_IS_TRAIL(text[at]) && (U_GET_GC_MASK(c) & U_GC_M_MASK) == 0 &&
+  const UChar32 c =
+      U16_IS_LEAD(text[at])
+          ? static_cast<UChar32>(U16_GET_SUPPLEMENTARY(char32_t{text[at]}, text[at + 1]))
+          : text[at];
+  return (U_GET_GC_MASK(c) & U_GC_M_MASK) == 0 &&
          unorm2_hasBoundaryBefore(unorm2_getNFCInstance(&status), c);
 }
 
@@ -207,7 +210,7 @@ TEST(Oracle, ComparisonsAgreeWithIcu) {
 TEST(Oracle, ReplacingSplittingAndTrimmingAgreeWithTheirSteps) {
   Texts texts;
   for (int i = 0; i < 30000; ++i) {
-    const COrbStringData s = texts.Next(10);
+    const COrbStringData s = texts.Next(i % 8 == 0 ? 80 : 10);
     const COrbStringData find = texts.PartOf(s);
     const COrbStringData with = texts.Next(2);
     SCOPED_TRACE(Text(s) + " | " + Text(find) + " | " + Text(with));
