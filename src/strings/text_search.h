@@ -170,7 +170,7 @@ void LiteralSearch::ForEach(std::string_view text, OnMatch&& onMatch) const {
   const char* const data = text.data();
   std::size_t wasted = 0;                       // Bytes of long needles compared in vain.
   const std::size_t end = text.size() - last_;  // Of the places where a match can begin.
-  for (std::size_t block = 0; end >= kStep && next < end; block = next) {
+  for (std::size_t block = 0; end >= kStep && next < end; block += kStep) {
     if (block + kStep > end) block = end - kStep;  // The last step looks at some places again.
     for (unsigned hits = test.Hits(data + block); hits != 0; hits &= hits - 1) {
       const std::size_t place = block + static_cast<std::size_t>(std::countr_zero(hits));
