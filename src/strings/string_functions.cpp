@@ -37,6 +37,20 @@ std::string Joined(const COrbStringData& a, const COrbStringData& b) {
   return text;
 }
 
+/// A text to read that leaves its string without value when it has none.
+class Source {
+ public:
+  explicit Source(const COrbStringData& s)
+      : own_(s.HasValueUtf8() ? COrbStringData() : s),
+        text(StringAccess::Read(s.HasValueUtf8() ? s : own_)) {}
+
+ private:
+  const COrbStringData own_;
+
+ public:
+  const Utf8Text text;
+};
+
 /// Calls `compare(a, b)` on the two texts; 0 when either is not UTF-8.
 template <typename Compare>
 int Compared(const COrbStringData& a, const COrbStringData& b, Compare compare) {
@@ -134,8 +148,8 @@ int OrbStringDataCmpni(const COrbStringData& a, const COrbStringData& b, unsigne
 COrbStringData OrbStringDataReplace(const COrbStringData& s,
                                     const COrbStringData& find,
                                     const COrbStringData& with) {
-  const COrbStringData source = s;  // Reading it gives `s`, if it has no value, none.
-  const Utf8Text text = StringAccess::Read(source);
+  const Source source(s);
+  const Utf8Text& text = source.text;
   const Utf8Text wanted = StringAccess::Read(find);
   if (orb::FindEquivalent(text, wanted) == orb::kNotFound) {
     return StringAccess::FromUtf8(text.bytes);
@@ -148,13 +162,12 @@ void OrbStringDataSplit(const COrbStringData& s,
                         const COrbStringData& sep,
                         std::vector<COrbStringData>* out) {
   if (out == nullptr) return;
-  const COrbStringData source = s;  // Either may be in the list that is about to be emptied.
-  const Utf8Text separator = StringAccess::Read(sep);
-  const COrbStringData keptSeparator = sep;
-  const orb::Pieces pieces(StringAccess::Read(source), separator);
-  out->clear();
-  out->reserve(pieces.Views().size());
-  for (const std::string_view piece : pieces.Views()) out->emplace_back(Piece{piece});
+  const Source source(s);
+  const orb::Pieces pieces(source.text, StringAccess::Read(sep));
+  std::vector<COrbStringData> made;  // Either string may be in the list that is to be emptied.
+  made.reserve(pieces.Views().size());
+  for (const std::string_view piece : pieces.Views()) made.emplace_back(Piece{piece});
+  *out = std::move(made);
 }
 
 COrbStringData OrbString::Trim(const COrbStringData& s,
@@ -162,9 +175,8 @@ COrbStringData OrbString::Trim(const COrbStringData& s,
                                bool left,
                                bool right) {
   if (set.IsEmpty() || (!left && !right)) return s;
-  const COrbStringData source = s;  // Reading it gives `s`, if it has no value, none.
-  const orb::Trimmed trimmed =
-      orb::Trim(StringAccess::Read(source), StringAccess::Read(set), left, right);
+  const Source source(s);
+  const orb::Trimmed trimmed = orb::Trim(source.text, StringAccess::Read(set), left, right);
   if (trimmed.extent == orb::Trimming::kNothing) return s;
   return trimmed.text ? StringAccess::FromUtf8(*trimmed.text) : COrbStringData();
 }

@@ -75,15 +75,17 @@ class LiteralSearch {
 
  private:
   static constexpr std::size_t kStep = 32;  // Places tested at once.
+  template <Case kRule>
   class PairTest;
 
   unsigned char Folded(char c) const {
     const bool capital = rule_ == Case::kAscii && c >= 'A' && c <= 'Z';
     return static_cast<unsigned char>(capital ? c | 0x20 : c);
   }
+  template <Case kRule>
   bool MatchesAt(std::string_view text, std::size_t at) const {
     const char* here = text.data() + at;
-    if (rule_ == Case::kAscii) return MatchesFolded(here);
+    if constexpr (kRule == Case::kAscii) return MatchesFolded(here);
     if (needle_.size() > sizeof(head_) || text.size() - at < sizeof(head_)) {
       return std::memcmp(here, needle_.data(), needle_.size()) == 0;
     }
@@ -97,6 +99,8 @@ class LiteralSearch {
     const unsigned char lower = Folded(needle_[i]);
     return rule_ == Case::kAscii && lower >= 'a' && lower <= 'z' ? 0x20 : 0;
   }
+  template <Case kRule, typename OnMatch>
+  void ForEachByRule(std::string_view text, OnMatch&& onMatch) const;
   template <typename OnMatch>
   void ForEachSlowly(std::string_view text, std::size_t from, OnMatch&& onMatch) const;
 
@@ -110,6 +114,7 @@ class LiteralSearch {
 
 #ifdef __SSE2__
 /// Looks for two bytes of the needle at 32 places at once.
+template <LiteralSearch::Case kRule>
 class LiteralSearch::PairTest {
  public:
   explicit PairTest(const LiteralSearch& search)
@@ -131,8 +136,12 @@ class LiteralSearch::PairTest {
     return _mm_loadu_si128(reinterpret_cast<const __m128i*>(at));
   }
   unsigned Hits16(const char* at) const {
-    const __m128i first = _mm_or_si128(Load(at + firstAt_), firstCase_);
-    const __m128i last = _mm_or_si128(Load(at + lastAt_), lastCase_);
+    __m128i first = Load(at + firstAt_);
+    __m128i last = Load(at + lastAt_);
+    if constexpr (kRule == Case::kAscii) {
+      first = _mm_or_si128(first, firstCase_);
+      last = _mm_or_si128(last, lastCase_);
+    }
     return static_cast<unsigned>(_mm_movemask_epi8(
         _mm_and_si128(_mm_cmpeq_epi8(first, first_), _mm_cmpeq_epi8(last, last_))));
   }
@@ -162,11 +171,20 @@ void LiteralSearch::ForEachSlowly(std::string_view text,
 
 template <typename OnMatch>
 void LiteralSearch::ForEach(std::string_view text, OnMatch&& onMatch) const {
+  if (rule_ == Case::kExact) {
+    ForEachByRule<Case::kExact>(text, onMatch);
+  } else {
+    ForEachByRule<Case::kAscii>(text, onMatch);
+  }
+}
+
+template <LiteralSearch::Case kRule, typename OnMatch>
+void LiteralSearch::ForEachByRule(std::string_view text, OnMatch&& onMatch) const {
   const std::size_t size = needle_.size();
   std::size_t next = 0;  // Nothing before this place is looked at any more.
   if (text.size() < size) return;
 #ifdef __SSE2__
-  const PairTest test(*this);
+  const PairTest<kRule> test(*this);
   const char* const data = text.data();
   std::size_t wasted = 0;                       // Bytes of long needles compared in vain.
   const std::size_t end = text.size() - last_;  // Of the places where a match can begin.
@@ -175,7 +193,7 @@ void LiteralSearch::ForEach(std::string_view text, OnMatch&& onMatch) const {
     for (unsigned hits = test.Hits(data + block); hits != 0; hits &= hits - 1) {
       const std::size_t place = block + static_cast<std::size_t>(std::countr_zero(hits));
       if (place < next) continue;
-      if (!test.isExact && !MatchesAt(text, place)) {
+      if (!test.isExact && !MatchesAt<kRule>(text, place)) {
         wasted += size;
         if (wasted > 16 * (place + 4096)) return ForEachSlowly(text, place + 1, onMatch);
         continue;
@@ -188,7 +206,7 @@ void LiteralSearch::ForEach(std::string_view text, OnMatch&& onMatch) const {
 #endif
   if (text.size() - next > size + kStep) return ForEachSlowly(text, next, onMatch);
   while (next + size <= text.size()) {
-    if (!MatchesAt(text, next)) {
+    if (!MatchesAt<kRule>(text, next)) {
       ++next;
     } else {
       if (!onMatch(next)) return;
