@@ -19,23 +19,19 @@ bool IsAscii(const Utf8Text& text) { return text.scan.kind == TextKind::kAscii; 
 
 bool IsPlain(const Utf8Text& text) { return IsAscii(text) || text.scan.kind == TextKind::kPlain; }
 
-/// Cuts a text at the matches of another, one piece at a time.
+/// Cuts a text at the equivalents of another, one piece at a time.
 class Cutter {
  public:
   /// `repaired` takes a copy of the text if a surrogate pair is cut.
   Cutter(const Utf8Text& text, const Utf8Text& find, std::string& repaired)
-      : rest_(text.Readable()), units_(find.scan.charLength), repaired_(repaired) {
-    if (units_ == 0 || rest_.empty()) return;
-    if (IsPlain(text) && IsPlain(find)) {
-      literal_.emplace(find.bytes);
-    } else {
-      equivalent_.emplace(find.bytes, Form::kDecomposed);
-    }
-  }
+      : rest_(text.Readable()),
+        units_(find.scan.charLength),
+        repaired_(repaired),
+        search_(find.bytes, Form::kDecomposed) {}
 
   /// The text before the next match; nothing when there is none.
   std::optional<std::string_view> Next() {
-    const std::size_t found = Find();
+    const std::size_t found = search_.Find(rest_);
     if (found == kNotFound) return std::nullopt;
     const std::string_view piece = rest_.substr(0, found);
     DropTo(PlaceOfUnit(rest_, units_, found));
@@ -45,11 +41,6 @@ class Cutter {
   std::string_view Rest() const { return rest_; }
 
  private:
-  std::size_t Find() {
-    if (literal_) return literal_->Find(rest_);
-    return equivalent_ ? equivalent_->Find(rest_) : kNotFound;
-  }
-
   void DropTo(UnitPlace place) {
     if (place.insidePair) {
       // What is left of the pair becomes U+FFFD, which is one byte shorter than the pair.
@@ -65,8 +56,7 @@ class Cutter {
   std::size_t units_;
   std::string& repaired_;
   bool isRepaired_ = false;
-  std::optional<LiteralSearch> literal_;
-  std::optional<EquivalenceSearch> equivalent_;
+  EquivalenceSearch search_;
 };
 
 /// Writes many short stretches one behind the other. It copies 32 bytes where fewer are wanted, so
@@ -289,13 +279,36 @@ void Replaced::ReplaceLiterally(std::string_view text,
 }
 
 Pieces::Pieces(const Utf8Text& text, const Utf8Text& separator) {
+  if (separator.Readable().empty()) return;
+  if (IsPlain(text) && IsPlain(separator)) {
+    SplitLiterally(text.bytes, separator.bytes);
+  } else {
+    SplitInSteps(text, separator);
+  }
+}
+
+void Pieces::Add(std::string_view piece) {
+  if (!piece.empty()) views_.push_back(piece);
+}
+
+void Pieces::SplitLiterally(std::string_view text, std::string_view separator) {
+  std::size_t done = 0;
+  LiteralSearch(separator).ForEach(text, [&](std::size_t place) {
+    Add(text.substr(done, place - done));
+    done = place + separator.size();
+    return true;
+  });
+  if (done != 0) Add(text.substr(done));
+}
+
+void Pieces::SplitInSteps(const Utf8Text& text, const Utf8Text& separator) {
   Cutter cutter(text, separator, repaired_);
   bool found = false;
   while (const auto piece = cutter.Next()) {
     found = true;
-    if (!piece->empty()) views_.push_back(*piece);
+    Add(*piece);
   }
-  if (found && !cutter.Rest().empty()) views_.push_back(cutter.Rest());
+  if (found) Add(cutter.Rest());
 }
 
 Trimmed Trim(const Utf8Text& text, const Utf8Text& set, bool left, bool right) {

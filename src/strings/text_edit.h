@@ -55,6 +55,10 @@ class Pieces {
   const std::vector<std::string_view>& Views() const { return views_; }
 
  private:
+  void Add(std::string_view piece);
+  void SplitLiterally(std::string_view text, std::string_view separator);
+  void SplitInSteps(const Utf8Text& text, const Utf8Text& separator);
+
   std::vector<std::string_view> views_;
   std::string repaired_;
 };
