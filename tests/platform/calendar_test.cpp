@@ -3,7 +3,13 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
+#include <ctime>
+#include <ostream>
 #include <random>
+#include <string>
+#include <thread>
+#include <vector>
 
 #include "support/time_zone.h"
 
@@ -98,6 +104,28 @@ TEST(Calendar, NoticesAnotherZone) {
   }
   EXPECT_EQ(LocalFromInstant(0).hour, 1u);
   EXPECT_EQ(LocalFromInstant(1'000'000'000).hour, 3u);  // Not asked for before.
+}
+
+TEST(Calendar, FindsTheZoneWhereverItStands) {
+  const TimeZone paris("Europe/Paris");
+  const std::string longName =
+      "/usr/share/zoneinfo" + std::string(200, '/') + "Asia/Kathmandu";  // Too long to remember.
+  EXPECT_EQ(LocalFromInstant(0).hour, 1u);
+  ::unsetenv("TZ");
+  ::tzset();
+  ExpectAgreement(0);
+  std::vector<std::string> names;
+  for (int i = 0; i < 50; ++i) {  // Until the environment has been moved.
+    ::setenv(names.emplace_back("ORB_TEST_" + std::to_string(i)).c_str(), "x", 1);
+    ExpectAgreement(i);
+  }
+  ::setenv("TZ", longName.c_str(), 1);  // Nobody calls tzset() here.
+  EXPECT_EQ(LocalFromInstant(0), (CivilTime{1970, 1, 1, 5, 30, 0}));
+  for (const std::string& name : names) ::unsetenv(name.c_str());
+  EXPECT_EQ(LocalFromInstant(0).minute, 30u);
+  ::setenv("TZ", "Asia/Tokyo", 1);
+  EXPECT_EQ(LocalFromInstant(0).hour, 9u);
+  std::thread([] { EXPECT_EQ(LocalFromInstant(0).hour, 9u); }).join();
 }
 
 TEST(Calendar, ReachesFarYears) {

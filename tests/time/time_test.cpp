@@ -42,7 +42,7 @@ TEST(TimeValue, CountsTicksAndFraction) {
   EXPECT_EQ(time.ticks, 4'294'967'298 * kSecond);
   const UTCDateTime back = time;
   EXPECT_EQ(back.highSeconds, 1);
-  EXPECT_EQ(back.lowSeconds, 2u);
+  EXPECT_EQ(UInt32{back.lowSeconds}, 2u);
   EXPECT_EQ(back.fraction, 32768);
   EXPECT_EQ(static_cast<unsigned long long>(time), time.ticks + 5'000'000);
 
@@ -63,7 +63,7 @@ TEST(TimeValue, WrapsWhereItDoesNotFit) {
   COrbTime time = kSecond / 2;
   time.fraction = 40000;
   EXPECT_EQ(time.GetUTCTime().fraction, 32768 + 40000 - 65536);
-  EXPECT_EQ(time.GetUTCTime().lowSeconds, 0u);
+  EXPECT_EQ(UInt32{time.GetUTCTime().lowSeconds}, 0u);
   const COrbTime greatest = UTCDateTime{0xFFFF, 0xFFFFFFFF, 0xFFFF};
   EXPECT_EQ(greatest.ticks, 10'844'667'902'698'154'368u);
   EXPECT_EQ(greatest.fraction, 0xFFFF);
