@@ -13,7 +13,7 @@
 #include <QDateTime>
 #include <QString>
 #endif
-#ifdef ORB_BENCH_GIO
+#ifdef ORB_BENCH_GLIB
 #include <glib.h>
 #endif
 
@@ -151,7 +151,7 @@ void CompactText_QDateTime(benchmark::State& state) {
 BENCHMARK(CompactText_QDateTime);
 #endif
 
-#ifdef ORB_BENCH_GIO
+#ifdef ORB_BENCH_GLIB
 void FieldsFromInstant_GDateTime(benchmark::State& state) {
   OnEach(state, Instants(), [](std::time_t instant) {
     GDateTime* time = g_date_time_new_from_unix_local(instant);
