@@ -145,7 +145,6 @@ void COrbFileHandle::Free() {
   COrbFilePath::Free();
   collected = false;
   actualName.Clear();
-  displayName.Clear();
 }
 
 bool COrbFileHandle::IsEmpty() const { return COrbFilePath::IsEmpty(); }
@@ -156,7 +155,7 @@ OrbResult COrbFileHandle::Update() {
 
 OrbResult COrbFileHandle::CollectFileInformatioin() const {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(GetFullPath());
+  const std::optional<std::string> itemPath = orb::ItemPath(path);
   if (!itemPath) return kOrbErrNoSuchFile;
   const Pass pass{*itemPath, Items::Current().Read(*itemPath)};
   return Exists(*itemPath, pass.answer) ? Keep(pass) : kOrbErrNoSuchFile;
@@ -182,7 +181,6 @@ OrbResult COrbFileHandle::Keep(const Pass& pass) const {
   modificationTime = orb::UtcOf(info.modified);
   creationTime = orb::UtcOf(info.created);
   actualName = StringAccess::FromUtf8(NameOf(pass.path));
-  displayName = actualName;
   const bool hasType = !isFolder && info.kind != ItemKind::kLink;
   fileType = hasType ? GetFileType(actualName) : eOrbFileType_Unknown;
   collected = true;
@@ -197,7 +195,6 @@ void COrbFileHandle::CopyCollected(const COrbFileHandle& other) {
   collected = other.collected;
   if (!collected) return;
   actualName = other.actualName;
-  displayName = other.displayName;
   attributes = other.attributes;
   fileType = other.fileType;
   fileSize = other.fileSize;
@@ -205,7 +202,7 @@ void COrbFileHandle::CopyCollected(const COrbFileHandle& other) {
   modificationTime = other.modificationTime;
 }
 
-bool COrbFileHandle::IsExist() const { return orb::ItemExists(GetFullPath()); }
+bool COrbFileHandle::IsExist() const { return orb::ItemExists(path); }
 
 unsigned int COrbFileHandle::GetAttribute() const {
   return EnsureCollected() == kOrbNoErr ? attributes : 0;
@@ -219,11 +216,7 @@ std::uint64_t COrbFileHandle::GetFileSize() const {
   return EnsureCollected() == kOrbNoErr ? fileSize : 0;
 }
 
-OrbResult COrbFileHandle::GetDisplayName(COrbStringData& name) const {
-  if (EnsureCollected() != kOrbNoErr) return kOrbErrNotFound;
-  name = displayName;
-  return kOrbNoErr;
-}
+OrbResult COrbFileHandle::GetDisplayName(COrbStringData& name) const { return GetActualName(name); }
 
 OrbResult COrbFileHandle::GetActualName(COrbStringData& name) const {
   if (EnsureCollected() != kOrbNoErr) return kOrbErrNotFound;
@@ -233,7 +226,7 @@ OrbResult COrbFileHandle::GetActualName(COrbStringData& name) const {
 
 OrbResult COrbFileHandle::SetAttribute(unsigned int flags) {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(GetFullPath());
+  const std::optional<std::string> itemPath = orb::ItemPath(path);
   if (!itemPath) return kOrbErrNoSuchFile;
   const unsigned int locked = flags & kOrbFileAttrLocked;
   const Status status = Items::Current().SetLocked(*itemPath, locked != 0);
@@ -271,7 +264,7 @@ UTCDateTime COrbFileHandle::GetUpdateTime() const {
 
 OrbResult COrbFileHandle::GetAccessTime(COrbTime* time) const {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(GetFullPath());
+  const std::optional<std::string> itemPath = orb::ItemPath(path);
   if (!itemPath) return kOrbErrNoSuchFile;
   const Result<Timestamp> accessed = Items::Current().AccessTime(*itemPath);
   if (!accessed) return FailureCode(accessed.Reason());

@@ -47,6 +47,8 @@ class ORB_EXPORT COrbFilePath {
   OrbResult GetParent(COrbFilePath* parent) const;
 
  private:
+  friend class COrbFileHandle;
+
   COrbStringData path;
 };
 
