@@ -11,9 +11,8 @@
 #include "fileops/error_mapping.h"
 #include "path/file_types.h"
 #include "platform/items.h"
-#include "platform/transcode.h"
-#include "platform/unicode.h"
 #include "strings/string_access.h"
+#include "strings/text_compare.h"
 
 namespace {
 
@@ -100,13 +99,6 @@ bool IsFolder(const COrbStringData& path) {
 std::string_view WithoutOneSeparator(std::string_view path) {
   if (path.ends_with('/')) path.remove_suffix(1);
   return path;
-}
-
-bool IsEqualWithoutCase(std::string_view a, std::string_view b) {
-  if (a == b) return true;
-  const auto unitsA = orb::platform::Utf16FromUtf8(a);
-  const auto unitsB = orb::platform::Utf16FromUtf8(b);
-  return unitsA && unitsB && orb::platform::CompareFolded(*unitsA, *unitsB) == 0;
 }
 
 }  // namespace
@@ -236,12 +228,10 @@ OrbResult COrbFileHandle::SetAttribute(unsigned int flags) {
 }
 
 bool COrbFileHandle::IsEqual(const COrbFileHandle& other) const {
-  const COrbStringData ours = GetFullPath();
-  const COrbStringData theirs = other.GetFullPath();
-  const std::string_view a = StringAccess::Read(ours).Readable();
-  const std::string_view b = StringAccess::Read(theirs).Readable();
+  const std::string_view a = StringAccess::Read(path).Readable();
+  const std::string_view b = StringAccess::Read(other.path).Readable();
   if (a.empty() || b.empty()) return false;
-  return IsEqualWithoutCase(WithoutOneSeparator(a), WithoutOneSeparator(b));
+  return orb::CompareFolded({WithoutOneSeparator(a)}, {WithoutOneSeparator(b)}) == 0;
 }
 
 OrbResult COrbFileHandle::GetCreateTime(COrbTime* time) const {
