@@ -20,6 +20,7 @@ namespace {
 namespace fs = std::filesystem;
 using orb::platform::ItemInfo;
 using orb::platform::Items;
+using orb::platform::PathText;
 using orb::platform::Result;
 using orb::platform::Timestamp;
 using orb::test::TempFolder;
@@ -44,7 +45,7 @@ std::uint64_t Seconds(const UTCDateTime& time) {
 
 /// Answers for the real item, with a change that a test makes.
 struct AlteredItems : orb::test::ForwardingItems {
-  Result<ItemInfo> Read(const std::string& path) const override {
+  Result<ItemInfo> Read(PathText path) const override {
     if (failure) return *failure;
     Result<ItemInfo> info = ForwardingItems::Read(path);
     if (volumeFailure) info.Value().volumeReadOnly = *volumeFailure;
