@@ -104,11 +104,13 @@ class ORB_EXPORT COrbFileHandle : public COrbFilePath {
   static eOrbFileType GetFileType(const COrbStringData& name);
 
  private:
+  struct Pass;
+
   OrbResult EnsureCollected() const;
+  OrbResult Keep(const Pass& pass) const;
   void CopyCollected(const COrbFileHandle& other);
 
   mutable COrbStringData actualName;
-  mutable COrbStringData displayName;
   mutable bool collected = false;
   mutable unsigned int attributes = 0;
   mutable eOrbFileType fileType = eOrbFileType_Unknown;

@@ -49,6 +49,8 @@ class ORB_EXPORT COrbFilePath {
   OrbResult GetParent(COrbFilePath* parent) const;
 
  private:
+  friend class COrbFileHandle;
+
   COrbStringData path;
 };
 
