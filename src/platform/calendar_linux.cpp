@@ -18,6 +18,7 @@ constexpr int kBlockBits = 24;
 constexpr std::int64_t kBlockLength = std::int64_t{1} << kBlockBits;
 // Three days. No zone of the tz database has changed its offset twice within less than 3.98 days
 // since 1900, so two probes that differ have one change between them and two that agree have none.
+// (A rule in TZ itself could: a summer time of less than three days may be missed.)
 constexpr std::int64_t kProbeDistance = std::int64_t{1} << 18;
 // More than any zone is ahead of or behind GMT, and less than half of the distance above.
 constexpr std::int64_t kFarthestOffset = 26 * 3600;
@@ -108,9 +109,8 @@ class TzEntry {
   }
 
   void Find() {
+    *this = TzEntry();
     environment_ = environ;
-    entry_ = next_ = nullptr;
-    isSet_ = false;
     if (environment_ == nullptr) return;
     for (std::size_t i = 0; !isSet_ && environment_[i] != nullptr; ++i) Remember(i);
   }

@@ -34,56 +34,40 @@ Texts Pieces(const COrbStringData& path) {
   return texts;
 }
 
-TEST(PathExtension, IsTheTextAfterTheLastDot) {
+TEST(PathText, FindsExtensionAndFileName) {
   const struct {
-    const char* path;
-    const char* withDot;
-    const char* without;
-  } kCases[] = {{"/a/b.tar.gz", ".gz", "gz"},
-                {"/a/b", "", ""},
-                {"/a.d/b", ".d/b", "d/b"},
-                {"/a/b.", ".", ""},
-                {"/a/.profile", ".profile", "profile"},
-                {"", "", ""},
-                {"/a.\xCC\x81x", ".\xCC\x81x", "\xCC\x81x"},  // Literally: an accent may follow.
-                {"/\xFF.jpg", "", ""}};                       // Not UTF-8.
+    const char *path, *dotted, *extension, *name, *withoutExtension;
+  } kCases[] = {
+      {"/a/b.tar.gz", ".gz", "gz", "b.tar.gz", "b.tar"},
+      {"/a/b", "", "", "b", "b"},
+      {"/a.d/b", ".d/b", "d/b", "b", "b"},
+      {"/a/b.", ".", "", "b.", "b"},
+      {"/a/.profile", ".profile", "profile", ".profile", ""},
+      {"/a/b/", "", "", "", ""},
+      {"b.c", ".c", "c", "b.c", "b"},
+      {"", "", "", "", ""},
+      {"/a.\xCC\x81x", ".\xCC\x81x", "\xCC\x81x", "a.\xCC\x81x", "a"},  // Found literally.
+      {"/\xFF.c", "", "", "/\xFF.c", "/\xFF.c"},  // Not UTF-8: nothing is found.
+  };
   for (const auto& c : kCases) {
     SCOPED_TRACE(c.path);
-    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, c.path, true), c.withDot);
-    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, c.path, false), c.without);
-  }
-}
-
-TEST(PathFileName, IsTheTextAfterTheLastSeparator) {
-  const struct {
-    const char* path;
-    const char* name;
-    const char* without;
-  } kCases[] = {{"/a/b.c", "b.c", "b"},
-                {"/a/b/", "", ""},
-                {"b.c", "b.c", "b"},
-                {"/a/.profile", ".profile", ""},
-                {"/a.d/b", "b", "b"},
-                {"/a/b.", "b.", "b"},
-                {"/a/b.c.d", "b.c.d", "b.c"},
-                {"", "", ""},
-                {"/\xFF.c", "/\xFF.c", "/\xFF.c"}};
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.path);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, c.path, true), c.dotted);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, c.path, false), c.extension);
     EXPECT_EQ(ORB_BOTH(OrbPathFindFileName, c.path, false), c.name);
-    EXPECT_EQ(ORB_BOTH(OrbPathFindFileName, c.path, true), c.without);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindFileName, c.path, true), c.withoutExtension);
   }
 }
 
-TEST(PathResults, TellNoValueFromTheEmptyText) {
+TEST(PathText, TellsNoValueFromTheEmptyText) {
   EXPECT_TRUE(HasNoValue(OrbPathFindExtension(S("/a"), true)));
   EXPECT_TRUE(HasNoValue(OrbPathFindFileName(S("/a/"), false)));
   EXPECT_FALSE(HasNoValue(OrbPathFindFileName(S("/a/.b"), true)));
   EXPECT_FALSE(HasNoValue(OrbPathRemoveBackslash(S("/"))));
   EXPECT_TRUE(HasNoValue(OrbPathAddBackslash(COrbFilePath())));
+  EXPECT_FALSE(OrbPathIsEndofInvalidCharactor(S("/a.")));
 }
 
-TEST(SplitPath, GivesThePiecesThatAreNotEmpty) {
+TEST(PathText, SplitsIntoThePiecesThatAreNotEmpty) {
   EXPECT_EQ(Pieces(S("/a//b.c/")), (Texts{"a", "b.c"}));
   EXPECT_EQ(Pieces(S("b.c")), Texts{"b.c"});
   EXPECT_EQ(Pieces(S("//")), Texts{});
@@ -100,58 +84,39 @@ TEST(SplitPath, GivesThePiecesThatAreNotEmpty) {
   EXPECT_EQ(Text(pieces[1]), "y");
 }
 
-TEST(RenameExtension, RebuildsThePathFromItsPieces) {
+TEST(PathText, RenamesFromThePieces) {
   const struct {
-    const char* path;
-    const char* extension;
-    const char* renamed;
-  } kCases[] = {{"/a/b.jpg", ".tif", "/a/b.tif"},
-                {"/a/b.jpg", "tif", "/a/b.tif"},
-                {"/a/b.jpg", "", "/a/b"},
-                {"/a/b.jpg", ".", "/a/b"},
-                {"/a//b.jpg/", "tif", "/a/b.tif"},
-                {"b.c", "x", "/b.x"},
-                {"/a.d/b", "..x", "/a.d/b..x"},
-                {"/.b", "x", "/.x"},
-                {"//", "x", ".x"},
-                {"", "x", ".x"}};
+    const char *path, *given, *extensionRenamed, *nameRenamed;
+  } kCases[] = {
+      {"/a/b.jpg", ".tif", "/a/b.tif", "/a/.tif.jpg"},
+      {"/a/b.jpg", "c", "/a/b.c", "/a/c.jpg"},
+      {"/a/b.jpg", "", "/a/b", "/a/.jpg"},
+      {"/a/b.jpg", ".", "/a/b", "/a/..jpg"},
+      {"/a//b.jpg/", "c", "/a/b.c", "/a/c.jpg/"},
+      {"/a.d/b", "c", "/a.d/b.c", "/a.d/c.d/b"},
+      {"b.jpg", "c.x", "/b.c.x", "/c.x.jpg"},
+      {"/.b", "..x", "/..x", "/..x.b"},
+      {"//", "x", ".x", "x"},
+      {"", "x", ".x", "x"},
+  };
   for (const auto& c : kCases) {
-    SCOPED_TRACE(c.path);
-    EXPECT_EQ(ORB_BOTH(OrbPathRenameExtension, c.path, S(c.extension)), c.renamed);
+    SCOPED_TRACE(testing::Message() << c.path << " with " << c.given);
+    EXPECT_EQ(ORB_BOTH(OrbPathRenameExtension, c.path, S(c.given)), c.extensionRenamed);
+    EXPECT_EQ(ORB_BOTH(OrbPathRenameFileName, c.path, S(c.given)), c.nameRenamed);
   }
 }
 
-TEST(RenameFileName, KeepsTheExtension) {
+TEST(PathText, TakesAndAddsOneSeparator) {
   const struct {
-    const char* path;
-    const char* name;
-    const char* renamed;
-  } kCases[] = {{"/a/b.jpg", "c", "/a/c.jpg"},
-                {"/a/b", "c", "/a/c"},
-                {"/a.d/b", "c", "/a.d/c.d/b"},
-                {"/a//b.jpg/", "c", "/a/c.jpg/"},
-                {"/a/b.jpg", "c.x", "/a/c.x.jpg"},
-                {"b.jpg", "c", "/c.jpg"},
-                {"/a/b.", "c", "/a/c"},
-                {"//", "c", "c"},
-                {"/a/b.x", "", "/a/.x"}};
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.path);
-    EXPECT_EQ(ORB_BOTH(OrbPathRenameFileName, c.path, S(c.name)), c.renamed);
-  }
-}
-
-TEST(TrailingSeparator, IsTakenAndAdded) {
-  const struct {
-    const char* path;
-    const char* without;
-    const char* with;
-  } kCases[] = {{"/a/", "/a", "/a/"},
-                {"/a", "/a", "/a/"},
-                {"/", "", "/"},
-                {"", "", "/"},
-                {"/a//", "/a/", "/a//"},
-                {"\xFF/", "\xFF", "\xFF/"}};
+    const char *path, *without, *with;
+  } kCases[] = {
+      {"/a/", "/a", "/a/"},
+      {"/a", "/a", "/a/"},
+      {"/", "", "/"},
+      {"", "", "/"},
+      {"/a//", "/a/", "/a//"},
+      {"\xFF/", "\xFF", "\xFF/"},
+  };
   for (const auto& c : kCases) {
     SCOPED_TRACE(c.path);
     EXPECT_EQ(ORB_BOTH(OrbPathRemoveBackslash, c.path), c.without);
@@ -161,20 +126,20 @@ TEST(TrailingSeparator, IsTakenAndAdded) {
 
 TEST(ComparePath, OrdersByLengthFirst) {
   const struct {
-    const char* a;
-    const char* b;
-    int exact;
-    int noCase;
-  } kCases[] = {{"/a", "/a/", 0, 0},
-                {"/ab", "/a", 1, 1},
-                {"/b", "/abcd", -3, -3},
-                {"/a/B", "/a/b", -1, 0},
-                {"/A/b/", "/a/B", -1, 0},
-                {"/", "", 0, 0},
-                {"/a//", "/a", 1, 1},
-                {"/\xC3\xA9", "/ab", 1, 1},
-                {"/\xC3\xA9", "/\xC3\x89", 1, 0},
-                {"/\xFF", "/a", 0, 0}};  // Not UTF-8: it compares as 0.
+    const char *a, *b;
+    int exact, noCase;
+  } kCases[] = {
+      {"/a", "/a/", 0, 0},
+      {"/ab", "/a", 1, 1},
+      {"/b", "/abcd", -3, -3},
+      {"/a/B", "/a/b", -1, 0},
+      {"/A/b/", "/a/B", -1, 0},
+      {"/", "", 0, 0},
+      {"/a//", "/a", 1, 1},
+      {"/\xC3\xA9", "/ab", 1, 1},
+      {"/\xC3\xA9", "/\xC3\x89", 1, 0},
+      {"/\xFF", "/a", 0, 0},
+  };
   for (const auto& c : kCases) {
     SCOPED_TRACE(testing::Message() << c.a << " and " << c.b);
     EXPECT_EQ(OrbPathCompare(S(c.a), S(c.b)), c.exact);
@@ -185,28 +150,24 @@ TEST(ComparePath, OrdersByLengthFirst) {
 
 TEST(EqualOrRoot, IsThePathOrAnAncestor) {
   const struct {
-    const char* a;
-    const char* b;
-    bool plain;
-    bool withSeparator;
-  } kCases[] = {{"/a/b", "/A/B/c", true, true},
-                {"/a/b", "/a/bc", true, false},
-                {"/a/b/", "/a/b", true, true},
-                {"/a/b", "/a/b/", true, true},
-                {"/a/b/c", "/a/b", false, false},
-                {"", "/a", false, false},
-                {"/a", "", false, false},
-                {"/", "/a", true, true},
-                {"/\xC3\x89", "/\xC3\xA9/x", true, true}};
+    const char *a, *b;
+    bool plain, withSeparator;
+  } kCases[] = {
+      {"/a/b", "/A/B/c", true, true},
+      {"/a/b", "/a/bc", true, false},
+      {"/a/b/", "/a/b", true, true},
+      {"/a/b", "/a/b/", true, true},
+      {"/a/b/c", "/a/b", false, false},
+      {"", "/a", false, false},
+      {"/a", "", false, false},
+      {"/", "/a", true, true},
+      {"/\xC3\x89", "/\xC3\xA9/x", true, true},
+  };
   for (const auto& c : kCases) {
     SCOPED_TRACE(testing::Message() << c.a << " and " << c.b);
     EXPECT_EQ(OrbPathIsEqualOrRootActually(S(c.a), S(c.b), false), c.plain);
     EXPECT_EQ(OrbPathIsEqualOrRootActually(S(c.a), S(c.b), true), c.withSeparator);
   }
-}
-
-TEST(PathText, NoLastCharacterIsInvalid) {
-  for (const char* path : {"", "/a.", "/a "}) EXPECT_FALSE(OrbPathIsEndofInvalidCharactor(S(path)));
 }
 
 }  // namespace

@@ -4,8 +4,10 @@
 
 #include <array>
 #include <cstdint>
-#include <limits>
+#include <cstring>
+#include <ctime>
 #include <string>
+#include <vector>
 
 #include "support/texts.h"
 #include "support/time_zone.h"
@@ -51,9 +53,7 @@ TEST(TimeValue, CountsTicksAndFraction) {
   EXPECT_FALSE(least.IsEmpty());
   EXPECT_GT(least, COrbTime(0));
   EXPECT_EQ(least, COrbTime(152));
-  EXPECT_LE(least, COrbTime(152));
   EXPECT_LT(least, COrbTime(153));
-  EXPECT_NE(least, COrbTime(153));
   least = 0;
   EXPECT_TRUE(least.IsEmpty());
   EXPECT_EQ(COrbTime(9'999'999).GetUTCTime().fraction, 65535);
@@ -96,39 +96,27 @@ TEST(TimeFields, ComeBackAsTheyWereSet) {
 }
 
 TEST(TimeFields, OutOfRangeLeavesTheTimeAlone) {
-  for (const Fields& fields : {Fields{2023, 2, 29, 0, 0, 0, 0, 0, 0},
-                               Fields{1900, 2, 29, 0, 0, 0, 0, 0, 0},
-                               Fields{2024, 0, 1, 0, 0, 0, 0, 0, 0},
-                               Fields{2024, 13, 1, 0, 0, 0, 0, 0, 0},
-                               Fields{2024, 4, 31, 0, 0, 0, 0, 0, 0},
-                               Fields{2024, 1, 0, 0, 0, 0, 0, 0, 0},
-                               Fields{2024, 1, 1, 24, 0, 0, 0, 0, 0},
-                               Fields{2024, 1, 1, 0, 60, 0, 0, 0, 0},
-                               Fields{2024, 1, 1, 0, 0, 60, 0, 0, 0},
-                               Fields{2024, 1, 1, 0, 0, 0, 1000, 0, 0},
-                               Fields{2024, 1, 1, 0, 0, 0, 0, 1000, 0},
-                               Fields{2024, 1, 1, 0, 0, 0, 0, 0, 10}}) {
+  const Fields kFirst{0, 1, 1, 0, 0, 0, 0, 0, 0};
+  const Fields kBeyond{0, 13, 30, 24, 60, 60, 1000, 1000, 10};
+  std::vector<Fields> wrong{{2023, 2, 29}, {1900, 2, 29}};
+  for (std::size_t i = 1; i < kFirst.size(); ++i) {
+    const Fields right{2024, 2, 29, 23, 59, 59, 999, 999, 9};
+    (wrong.emplace_back(right))[i] = kBeyond[i];
+    if (kFirst[i] == 1) (wrong.emplace_back(right))[i] = 0;
+  }
+  for (const Fields& fields : wrong) {
     COrbTime time = UTCDateTime{0, 7, 7};
-    EXPECT_EQ(Set(&time, fields), kOrbErrInvalidTime);
+    EXPECT_EQ(Set(&time, fields), kOrbErrInvalidTime) << testing::PrintToString(fields);
     EXPECT_EQ(time.ticks, 7 * kSecond);
     EXPECT_EQ(time.fraction, 7);
   }
 }
 
 TEST(TimeFields, YearsBeyondTheCountAreHeldToItsEnds) {
-  const TimeZone zone("Europe/Paris");
-  const struct {
-    unsigned int year;
-    unsigned long long ticks;
-  } kCases[] = {{0, 0},
-                {1903, 0},
-                {60'360, std::numeric_limits<std::uint64_t>::max()},
-                {0xFFFFFFFF, std::numeric_limits<std::uint64_t>::max()}};
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.year);
+  for (const unsigned int year : {0u, 1903u, 60'360u, 0xFFFFFFFFu}) {
     COrbTime time = 1;
-    EXPECT_EQ(time.Initialize(c.year, 6, 1, 12, 0, 0, 5, 0, 0), kOrbNoErr);
-    EXPECT_EQ(time.ticks, c.ticks);
+    EXPECT_EQ(time.Initialize(year, 6, 1, 12, 0, 0, 5, 0, 0), kOrbNoErr);
+    EXPECT_EQ(time.ticks, year < 1904 ? 0 : UINT64_MAX) << year;
   }
 }
 
@@ -136,12 +124,9 @@ TEST(TimeFields, NullPointersAreSkippedAndFractionIsLeftOut) {
   const TimeZone zone("UTC");
   COrbTime time = k1970 + 1'234'567;
   time.fraction = 65535;
-  unsigned int millisecond = 0;
-  EXPECT_EQ(
-      time.GetTime(
-          nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, &millisecond, nullptr, nullptr),
-      kOrbNoErr);
-  EXPECT_EQ(millisecond, 123u);
+  unsigned int month = 0;
+  time.GetTime(nullptr, &month, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr);
+  EXPECT_EQ(month, 1u);
   EXPECT_EQ(FieldsOf(time), (Fields{1970, 1, 1, 0, 0, 0, 123, 456, 7}));
 }
 
@@ -149,14 +134,12 @@ TEST(TimeFields, LocalTmHasTheListedMembersAlone) {
   const TimeZone zone("Europe/Paris");
   COrbTime time = 3'803'500'800 * kSecond;  // 2024-07-11, in summer time.
   const std::tm fields = time.GetLocalTm();
-  EXPECT_EQ(fields.tm_year, 124);
-  EXPECT_EQ(fields.tm_mon, 6);
-  EXPECT_EQ(fields.tm_mday, 11);
-  EXPECT_EQ(fields.tm_hour, 2);
-  EXPECT_EQ(fields.tm_isdst, 0);
-  EXPECT_EQ(fields.tm_wday, 0);
-  EXPECT_EQ(fields.tm_yday, 0);
-  EXPECT_EQ(fields.tm_gmtoff, 0);
+  std::tm expected{};
+  expected.tm_year = 124;
+  expected.tm_mon = 6;
+  expected.tm_mday = 11;
+  expected.tm_hour = 2;
+  EXPECT_EQ(std::memcmp(&fields, &expected, sizeof(fields)), 0);
 }
 
 TEST(TimeText, IsReadByItsDigits) {
@@ -170,10 +153,7 @@ TEST(TimeText, IsReadByItsDigits) {
       {"20241116093005042", {2024, 11, 16, 9, 30, 5, 42, 0, 0}},
       {"202411160930050420073 and 99 more", {2024, 11, 16, 9, 30, 5, 42, 7, 3}},
       {"2024111", {2024, 11, 1, 0, 0, 0, 0, 0, 0}},
-      {"taken \xE2\x98\x83"
-       "2024\xD9\xA1-e\xCC\x81"
-       "11-16",
-       {2024, 11, 16, 0, 0, 0, 0, 0, 0}},
+      {"on \xE2\x98\x83 2024\xD9\xA1-e\xCC\x81 11-16", {2024, 11, 16, 0, 0, 0, 0, 0, 0}},
   };
   for (const auto& c : kCases) {
     SCOPED_TRACE(c.text);
@@ -184,20 +164,13 @@ TEST(TimeText, IsReadByItsDigits) {
 }
 
 TEST(TimeText, WithoutADateLeavesTheTimeAlone) {
-  const struct {
-    COrbStringData text;
-    OrbResult result;
-  } kCases[] = {{COrbStringData(), kOrbErrUnknown},
-                {S(""), kOrbErrUnknown},
-                {S("202411"), kOrbErrInvalidTime},
-                {S("none"), kOrbErrInvalidTime},
-                {S("2024/11/16\xFF"), kOrbErrInvalidTime},  // Not UTF-8: no digits at all.
-                {S("2024/02/30"), kOrbErrInvalidTime}};
-  for (const auto& c : kCases) {
-    COrbTime time = 7;
-    EXPECT_EQ(time.Initialize(c.text), c.result);
-    EXPECT_EQ(time.ticks, 7u);
+  COrbTime time = 7;
+  EXPECT_EQ(time.Initialize(COrbStringData()), kOrbErrUnknown);
+  EXPECT_EQ(time.Initialize(S("")), kOrbErrUnknown);
+  for (const char* text : {"202411", "none", "2024/02/30", "2024/11/16\xFF (not UTF-8)"}) {
+    EXPECT_EQ(time.Initialize(S(text)), kOrbErrInvalidTime) << text;
   }
+  EXPECT_EQ(time.ticks, 7u);
 }
 
 TEST(TimeText, IsWrittenInThreeForms) {
@@ -216,7 +189,7 @@ TEST(TimeText, IsWrittenInThreeForms) {
 TEST(TimeText, ReachesBothEnds) {
   const TimeZone zone("America/New_York");
   EXPECT_EQ(Written(COrbTime(), false, false), "1903/12/31 19:00:00");
-  const COrbTime last = std::numeric_limits<std::uint64_t>::max();
+  const COrbTime last = UINT64_MAX;
   EXPECT_EQ(Written(last, false, true), "603590528013610955");
 }
 
