@@ -70,29 +70,26 @@ Totals TotalsOf(const std::vector<ShotPlan>& plans, const std::vector<Item>& ite
 }
 
 void Importer::Run(std::vector<ShotPlan> plans) {
-  const bool promised = Promise(plans);
+  const OrbResult promised = Promise(plans);
   for (ShotPlan& plan : plans) {
     if (InterruptingSignal() != 0) return;
-    if (promised || !NeedsWork(plan)) {
-      ImportShot(plan);
-      continue;
-    }
-    for (const Step& step : plan.steps) Finish(Status::kFailed, plan, step, kOrbErrAccessDenied);
+    ImportShot(plan, promised);
   }
 }
 
 /// All in one go: the promises are then on the device for the price of one.
-bool Importer::Promise(const std::vector<ShotPlan>& plans) {
+OrbResult Importer::Promise(const std::vector<ShotPlan>& plans) {
   std::vector<orbimport::Promise> promises;
   for (const ShotPlan& plan : plans) {
     const auto more = PromisesOf(plan, work_.items);
     promises.insert(promises.end(), more.begin(), more.end());
   }
-  return promises.empty() || work_.journal.Add(promises);
+  return promises.empty() ? kOrbNoErr : work_.journal.Add(promises);
 }
 
-void Importer::ImportShot(ShotPlan& plan) {
-  const OrbResult prepared = NeedsWork(plan) ? Prepare(plan) : kOrbNoErr;
+void Importer::ImportShot(ShotPlan& plan, OrbResult promised) {
+  OrbResult prepared = promised;
+  if (promised < kOrbErrFirst && NeedsWork(plan)) prepared = Prepare(plan);
   for (const Step& step : plan.steps) {
     if (InterruptingSignal() != 0) break;
     if (step.action == Action::kLeave)
@@ -109,7 +106,8 @@ void Importer::ImportShot(ShotPlan& plan) {
 /// planned anew, so that they stay together.
 OrbResult Importer::Prepare(ShotPlan& plan) {
   for (int tries = 0; tries < kMostPlans; ++tries) {
-    OrbResult code = MakeFolder(plan.folder);
+    const std::string folder = plan.folder.empty() ? "" : "/" + plan.folder;
+    OrbResult code = MakeFolder(work_.destination + folder);
     if (code >= kOrbErrFirst) return code;
     const Reserved reserved = ReserveAll(plan, code);
     if (reserved == Reserved::kYes) return kOrbNoErr;
@@ -118,18 +116,10 @@ OrbResult Importer::Prepare(ShotPlan& plan) {
     work_.planner.Forget(plan);
     work_.view.Refresh();
     plan = work_.planner.Plan(work_.shots[plan.shot], plan.shot);
-    if (!work_.journal.Add(PromisesOf(plan, work_.items))) return kOrbErrAccessDenied;
+    code = work_.journal.Add(PromisesOf(plan, work_.items));
+    if (code >= kOrbErrFirst) return code;
   }
   return kOrbErrFileExists;
-}
-
-OrbResult Importer::MakeFolder(const std::string& folder) {
-  // Also DESTINATION itself, when there are no folders by date.
-  const std::string path = folder.empty() ? work_.destination : work_.destination + "/" + folder;
-  const std::size_t slash = path.rfind('/');
-  const OrbResult made = OrbCreateFolder(
-      OrbPath(slash == 0 ? "/" : path.substr(0, slash)), OrbText(path.substr(slash + 1)), nullptr);
-  return made == kOrbErrFileExists ? kOrbNoErr : made;
 }
 
 Importer::Reserved Importer::ReserveAll(const ShotPlan& plan, OrbResult& code) {

@@ -43,12 +43,11 @@ class Importer {
  private:
   enum class Reserved { kYes, kTaken, kFailed };
 
-  bool Promise(const std::vector<ShotPlan>& plans);
-  void ImportShot(ShotPlan& plan);
+  OrbResult Promise(const std::vector<ShotPlan>& plans);
+  void ImportShot(ShotPlan& plan, OrbResult promised);
   OrbResult Prepare(ShotPlan& plan);
   Reserved ReserveAll(const ShotPlan& plan, OrbResult& code);
   Reserved Reserve(const ShotPlan& plan, const Step& step, OrbResult& code);
-  OrbResult MakeFolder(const std::string& folder);
   void CarryOut(const ShotPlan& plan, const Step& step);
   OrbResult Fill(const ShotPlan& plan, const Step& step);
   OrbResult Copy(const ShotPlan& plan, const Step& step);

@@ -8,7 +8,6 @@
 
 #include <cerrno>
 #include <fstream>
-#include <iterator>
 #include <sstream>
 #include <string_view>
 
@@ -20,8 +19,9 @@ namespace {
 std::string PathIn(const std::string& destination) { return destination + "/.orb-import.journal"; }
 
 std::string ReadWhole(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  return {std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
+  std::ostringstream text;
+  text << std::ifstream(path, std::ios::binary).rdbuf();
+  return text.str();
 }
 
 bool WriteWhole(int descriptor, std::string_view text) {
@@ -34,49 +34,59 @@ bool WriteWhole(int descriptor, std::string_view text) {
   return true;
 }
 
-/// Another import may have removed the file between our opening and our locking it.
-bool IsRemoved(int descriptor) {
-  struct stat status;
-  return ::fstat(descriptor, &status) == 0 && status.st_nlink == 0;
+OrbResult CodeOfErrno() {
+  return errno == ENOSPC || errno == EDQUOT ? kOrbErrDiskFull : kOrbErrAccessDenied;
 }
 
 }  // namespace
 
-Journal::~Journal() {
-  if (IsOpen()) ::close(descriptor_);
-}
+Journal::~Journal() { Close(); }
 
-Journal::Opened Journal::Open(const std::string& destination) {
+bool Journal::Open(const std::string& destination) {
   path_ = PathIn(destination);
-  for (;;) {
-    const int flags = O_RDWR | O_CREAT | O_APPEND | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK;
-    const int descriptor = ::open(path_.c_str(), flags, 0644);
-    if (descriptor < 0) return Opened::kFailed;
-    // A volume without locks answers otherwise than "busy", and then the journal does without.
-    if (::flock(descriptor, LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK) {
-      ::close(descriptor);
-      return Opened::kBusy;
+  opened_ = MakeFolder(destination);
+  while (opened_ < kOrbErrFirst && (opened_ = OpenFile()) < kOrbErrFirst) {
+    const Locking locking = LockFile();
+    if (locking == Locking::kHeld) {
+      old_ = Read(destination);
+      return true;
     }
-    if (!IsRemoved(descriptor)) {
-      descriptor_ = descriptor;
-      old_ = ParsePromises(ReadWhole(path_));
-      return Opened::kYes;
-    }
-    ::close(descriptor);
+    Close();
+    if (locking == Locking::kBusy) return false;
   }
+  return true;
 }
 
-bool Journal::Add(const std::vector<Promise>& promises) {
+OrbResult Journal::OpenFile() {
+  const int flags = O_RDWR | O_CREAT | O_APPEND | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK;
+  descriptor_ = ::open(path_.c_str(), flags, 0644);
+  return descriptor_ >= 0 ? kOrbNoErr : CodeOfErrno();
+}
+
+Journal::Locking Journal::LockFile() const {
+  // A volume without locks answers otherwise than "busy"; the journal does without one then.
+  if (::flock(descriptor_, LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK) return Locking::kBusy;
+  // Another import may have removed the file between our opening and our locking it.
+  struct stat status;
+  const bool isGone = ::fstat(descriptor_, &status) == 0 && status.st_nlink == 0;
+  return isGone ? Locking::kAgain : Locking::kHeld;
+}
+
+OrbResult Journal::Add(const std::vector<Promise>& promises) {
+  if (opened_ >= kOrbErrFirst) return opened_;
   std::string text = "\n";  // Ends a line that an earlier import left half written.
   for (const Promise& promise : promises) text += FormatPromise(promise);
-  return IsOpen() && WriteWhole(descriptor_, text) && ::fsync(descriptor_) == 0;
+  return WriteWhole(descriptor_, text) && ::fsync(descriptor_) == 0 ? kOrbNoErr : CodeOfErrno();
+}
+
+void Journal::Close() {
+  if (descriptor_ >= 0) ::close(descriptor_);
+  descriptor_ = -1;
 }
 
 void Journal::Remove() {
-  if (!IsOpen()) return;
-  ::unlink(path_.c_str());
-  ::close(descriptor_);
-  descriptor_ = -1;
+  if (descriptor_ >= 0) ::unlink(path_.c_str());
+  Close();
 }
 
 std::map<std::string, Promise> Journal::Read(const std::string& destination) {

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 #pragma once
 
+#include <orb/orb.h>
+
 #include <cstdint>
 #include <map>
 #include <string>
@@ -23,22 +25,19 @@ struct Promise {
 /// a second import away from the same DESTINATION.
 class Journal {
  public:
-  enum class Opened { kYes, kBusy, kFailed };
-
   Journal() = default;
   Journal(const Journal&) = delete;
   Journal& operator=(const Journal&) = delete;
   ~Journal();
 
-  /// Makes it where it is missing. kBusy while another import has it open.
-  Opened Open(const std::string& destination);
-  bool IsOpen() const { return descriptor_ >= 0; }
+  /// Makes DESTINATION and the journal where they are missing. False while another import has the
+  /// journal open. One that cannot be opened at all is told by Add(), if anything needs it.
+  bool Open(const std::string& destination);
   /// What earlier imports promised, by path.
   const std::map<std::string, Promise>& Old() const { return old_; }
 
-  /// On return the promises are on the device. False when they could not be written; nothing may be
-  /// made then.
-  bool Add(const std::vector<Promise>& promises);
+  /// On return the promises are on the device. When it fails nothing may be made.
+  OrbResult Add(const std::vector<Promise>& promises);
 
   /// Removes the file, which only its holder may do.
   void Remove();
@@ -47,8 +46,15 @@ class Journal {
   static std::map<std::string, Promise> Read(const std::string& destination);
 
  private:
+  enum class Locking { kHeld, kBusy, kAgain };
+
+  OrbResult OpenFile();
+  Locking LockFile() const;
+  void Close();
+
   std::string path_;
   int descriptor_ = -1;
+  OrbResult opened_ = kOrbErrNotFound;
   std::map<std::string, Promise> old_;
 };
 

@@ -2,7 +2,6 @@
 #include <fcntl.h>
 #include <unistd.h>
 
-#include <cerrno>
 #include <exception>
 #include <filesystem>
 #include <iostream>
@@ -67,7 +66,7 @@ bool ResolvePaths(Options& options, std::string& why) {
 /// So that the photos are on the device, and not only in memory, when the tool says so.
 bool FlushToDevice(const std::string& folder) {
   const int descriptor = ::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-  if (descriptor < 0) return errno == ENOENT;
+  if (descriptor < 0) return false;
   const bool flushed = ::syncfs(descriptor) == 0;
   ::close(descriptor);
   return flushed;
@@ -88,6 +87,7 @@ class Run {
     if (exitCode != kDone) return exitCode;
     const int signal = InterruptingSignal();
     report_.Close(signal != 0);
+    if (!flushed_) return Complain(kSomeFailed, "the destination's device reports an error");
     if (!std::cout) return Complain(kSomeFailed, "cannot write to the standard output");
     if (signal != 0) return kSignalBase + signal;
     return report_.HasFailures() ? kSomeFailed : kDone;
@@ -119,10 +119,7 @@ class Run {
   /// kDone when it could be tried at all.
   int Import() {
     if (scan_.items.empty() || InterruptingSignal() != 0) return kDone;
-    std::error_code error;
-    fs::create_directories(options_.destination, error);
-    const Journal::Opened opened = journal_.Open(options_.destination);
-    if (opened == Journal::Opened::kBusy) {
+    if (!journal_.Open(options_.destination)) {
       return Complain(kSomeFailed,
                       "another import into " + Quote(options_.destination) + " is at work");
     }
@@ -149,7 +146,7 @@ class Run {
     const bool interrupted = InterruptingSignal() != 0;
     if (report_.Copied() > 0 && !interrupted) {
       progress_.Say("Writing to the device...");
-      if (!FlushToDevice(options_.destination)) report_.AddFailure({"", kOrbErrUnknown});
+      flushed_ = FlushToDevice(options_.destination);
     }
     progress_.Hide();
     const std::vector<std::string> unfinished = view.Unfinished();
@@ -163,6 +160,7 @@ class Run {
   ScanResult scan_;
   std::vector<Shot> shots_;
   Journal journal_;
+  bool flushed_ = true;
 };
 
 int Main(int argc, char** argv) {

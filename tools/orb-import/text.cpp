@@ -140,7 +140,7 @@ constexpr CodeRow kCodes[] = {
     ORB_CODE(kOrbErrNoSuchFile, "no such file"),
     ORB_CODE(kOrbErrAccessDenied, "access denied"),
     ORB_CODE(kOrbErrFileExists, "the name is taken"),
-    ORB_CODE(kOrbErrInvalidName, "invalid name"),
+    ORB_CODE(kOrbErrInvalidName, "invalid name, such as one that is not UTF-8"),
     ORB_CODE(kOrbErrNameTooLong, "the name is too long"),
     ORB_CODE(kOrbErrSamePath, "source and destination are the same"),
     ORB_CODE(kOrbErrInsideSource, "the destination is inside the source"),
@@ -241,6 +241,13 @@ std::string CodeName(OrbResult code) {
 std::string CodeMeaning(OrbResult code) {
   const CodeRow* const row = FindCode(code);
   return row != nullptr ? row->meaning : "failed";
+}
+
+OrbResult MakeFolder(const std::string& path) {
+  const std::size_t slash = path.rfind('/');
+  const OrbResult made = OrbCreateFolder(
+      OrbPath(slash == 0 ? "/" : path.substr(0, slash)), OrbText(path.substr(slash + 1)), nullptr);
+  return made == kOrbErrFileExists ? kOrbNoErr : made;
 }
 
 }  // namespace orbimport

@@ -49,4 +49,7 @@ inline COrbFilePath OrbPath(const std::string& path) {
   return result;
 }
 
+/// Makes a folder, given by its absolute path, and those above it, where they are missing.
+OrbResult MakeFolder(const std::string& path);
+
 }  // namespace orbimport
