@@ -9,6 +9,7 @@
 #include <chrono>
 #include <csignal>
 #include <filesystem>
+#include <fstream>
 #include <functional>
 #include <map>
 #include <sstream>
@@ -21,8 +22,13 @@ namespace orbimport {
 namespace {
 
 namespace fs = std::filesystem;
-using orb::test::ReadAll;
 using orb::test::TempFolder;
+
+std::string ReadAll(const std::string& path) {
+  std::ostringstream bytes;
+  bytes << std::ifstream(path, std::ios::binary).rdbuf();
+  return bytes.str();
+}
 
 constexpr std::time_t kMayFirst = 1714557600;  // 2024-05-01 10:00:00 UTC.
 
