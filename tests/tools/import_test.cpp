@@ -382,7 +382,7 @@ class Meanwhile : public Import {
     Importer importer(work);
     importer.Run(std::move(plans));
     journal.Remove();
-    EXPECT_FALSE(importer.LeftSomething());
+    EXPECT_TRUE(importer.Left().empty());
     return !report.HasFailures();
   }
 };

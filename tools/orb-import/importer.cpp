@@ -191,8 +191,9 @@ void Importer::ReleaseAll() {
 }
 
 void Importer::Release(const std::string& path) {
-  if (OrbDeleteFile(OrbPath(path)) >= kOrbErrFirst && COrbFileHandle(OrbPath(path)).IsExist())
-    leftSomething_ = true;
+  if (OrbDeleteFile(OrbPath(path)) < kOrbErrFirst || !COrbFileHandle(OrbPath(path)).IsExist())
+    return;
+  left_.push_back(path.substr(work_.destination.size() + 1));
 }
 
 void Importer::Finish(Status status, const ShotPlan& plan, const Step& step, OrbResult code) {

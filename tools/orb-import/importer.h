@@ -37,8 +37,8 @@ class Importer {
   /// Stops between two pieces of a file once a signal asked for it.
   void Run(std::vector<ShotPlan> plans);
 
-  /// Whether something half done could not be taken away again.
-  bool LeftSomething() const { return leftSomething_; }
+  /// What is half done and could not be taken away again, below DESTINATION.
+  const std::vector<std::string>& Left() const { return left_; }
 
  private:
   enum class Reserved { kYes, kTaken, kFailed };
@@ -63,7 +63,7 @@ class Importer {
   const Work& work_;
   std::vector<std::string> reserved_;           // Made and not yet filled, of the shot at work.
   std::uint64_t tooLarge_ = ~std::uint64_t{0};  // The smallest size for which there was no room.
-  bool leftSomething_ = false;
+  std::vector<std::string> left_;
 };
 
 /// The files and bytes that plans have to copy.

@@ -7,9 +7,11 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <string_view>
+#include <system_error>
 
 #include "text.h"
 
@@ -60,7 +62,10 @@ bool Journal::Open(const std::string& destination) {
 OrbResult Journal::OpenFile() {
   const int flags = O_RDWR | O_CREAT | O_APPEND | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK;
   descriptor_ = ::open(path_.c_str(), flags, 0644);
-  return descriptor_ >= 0 ? kOrbNoErr : CodeOfErrno();
+  if (descriptor_ < 0) return CodeOfErrno();
+  struct stat status;
+  return ::fstat(descriptor_, &status) == 0 && S_ISREG(status.st_mode) ? kOrbNoErr
+                                                                       : kOrbErrAccessDenied;
 }
 
 Journal::Locking Journal::LockFile() const {
@@ -90,7 +95,10 @@ void Journal::Remove() {
 }
 
 std::map<std::string, Promise> Journal::Read(const std::string& destination) {
-  return ParsePromises(ReadWhole(PathIn(destination)));
+  const std::string path = PathIn(destination);
+  std::error_code error;
+  if (!std::filesystem::is_regular_file(path, error)) return {};
+  return ParsePromises(ReadWhole(path));
 }
 
 std::string FormatPromise(const Promise& promise) {

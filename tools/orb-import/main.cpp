@@ -149,9 +149,10 @@ class Run {
       flushed_ = FlushToDevice(options_.destination);
     }
     progress_.Hide();
-    const std::vector<std::string> unfinished = view.Unfinished();
+    std::vector<std::string> unfinished = view.Unfinished();
+    unfinished.insert(unfinished.end(), importer.Left().begin(), importer.Left().end());
     for (const std::string& path : unfinished) report_.AddUnfinished(path);
-    if (unfinished.empty() && !importer.LeftSomething()) journal_.Remove();
+    if (unfinished.empty() && flushed_) journal_.Remove();
   }
 
   const Options& options_;

@@ -69,11 +69,10 @@ Request SetLayout(Options& options, std::string& why) {
 }
 
 std::string Complaint(int found, char** argv) {
-  if (found == ':') return Quote(argv[optind - 1]) + " needs a value";
-  if (optopt > 0 && optopt < 256) {
-    return "unknown option " + Quote(std::string("-") + static_cast<char>(optopt));
-  }
-  return "unknown option or needless value: " + Quote(argv[optind - 1]);
+  const std::string given = argv[optind - 1];
+  if (found == ':') return Quote(given) + " needs a value";
+  if (given.starts_with("--")) return "unknown option or needless value: " + Quote(given);
+  return "unknown option " + Quote(std::string("-") + static_cast<char>(optopt));
 }
 
 Request ApplyOption(int found, char** argv, Options& options, std::string& why) {

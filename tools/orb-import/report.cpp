@@ -183,7 +183,7 @@ void Report::PrintProblems() {
          << CodeMeaning(failed.code) << '\n';
   }
   for (const std::string& path : unfinished_) {
-    err_ << "orb-import: left unfinished by an import that was killed: " << Quote(path) << '\n';
+    err_ << "orb-import: unfinished until its card is imported again: " << Quote(path) << '\n';
   }
   if (!options_.quiet) {
     for (const std::string& path : links_) {

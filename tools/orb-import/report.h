@@ -30,7 +30,7 @@ class Report {
   void Add(Status status, const Item& item, const std::string& destination, OrbResult code);
   void AddFailure(const Failure& failure);
   void AddSkip(const Skip& skip);
-  /// A file of an earlier import that is still unfinished.
+  /// A file that is not whole and stays, named by the journal.
   void AddUnfinished(const std::string& destination);
 
   bool HasFailures() const { return !failures_.empty(); }

@@ -247,7 +247,9 @@ OrbResult MakeFolder(const std::string& path) {
   const std::size_t slash = path.rfind('/');
   const OrbResult made = OrbCreateFolder(
       OrbPath(slash == 0 ? "/" : path.substr(0, slash)), OrbText(path.substr(slash + 1)), nullptr);
-  return made == kOrbErrFileExists ? kOrbNoErr : made;
+  // Through the dot, so that a link to a folder will do and a file will not.
+  const bool isFolder = COrbFileHandle(OrbPath(path + "/.")).IsExist();
+  return made == kOrbErrFileExists && isFolder ? kOrbNoErr : made;
 }
 
 }  // namespace orbimport
