@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <pty.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -269,6 +270,43 @@ TEST_F(Import, StopsAtOnceOnCtrlC) {
   EXPECT_EQ(ended.exitCode, 130);
   EXPECT_NE(ended.out.find("Stopped before the end"), std::string::npos) << ended.out;
   EXPECT_EQ(Tree(), (Files{{"2024/2024-05-01/a.jpg", "a"}}));
+}
+
+TEST_F(Import, DrawsABarOnATerminal) {
+  PutHole(Put("b.mov", "b"));
+  int terminal = -1;
+  winsize size = {24, 60, 0, 0};
+  const pid_t child = ::forkpty(&terminal, nullptr, nullptr, &size);
+  if (child == 0) {
+    ::setenv("TERM", "xterm", 1);
+    ::setenv("NO_COLOR", "1", 1);
+    const std::string card = folder_ / "card";
+    ::execl(ORB_IMPORT, ORB_IMPORT, card.c_str(), Photos().c_str(), nullptr);
+    ::_exit(127);
+  }
+  const auto start = std::chrono::steady_clock::now();
+  std::string shown;
+  char piece[4096];
+  bool stopped = false;
+  for (ssize_t count; (count = ::read(terminal, piece, sizeof piece)) > 0;) {
+    shown.append(piece, static_cast<std::size_t>(count));
+    if (stopped || shown.find("/s") == std::string::npos) continue;
+    stopped = ::write(terminal, "\x03", 1) == 1;
+  }
+  ::close(terminal);
+  const std::chrono::duration<double> seconds = std::chrono::steady_clock::now() - start;
+  EXPECT_EQ(Wait(child).exitCode, 130);
+  EXPECT_EQ(shown.find("\x1b[3"), std::string::npos);  // No colour.
+  std::istringstream lines(shown.substr(0, shown.find("Type")));
+  int draws = 0;
+  for (std::string line; std::getline(lines, line, '\r');) {
+    if (line.find("files") != std::string::npos) ++draws;
+    if (line.find('%') == std::string::npos) continue;
+    EXPECT_LE(line.find("\x1b[K"), 59u) << line;
+  }
+  EXPECT_GE(draws, 2) << shown;
+  EXPECT_LE(draws, 2 + 10 * seconds.count());
+  EXPECT_EQ(Tree(), Files());
 }
 
 /// Whatever stands under a photo's name with the photo's size and time has to be that photo.
