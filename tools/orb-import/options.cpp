@@ -1,0 +1,121 @@
+// SPDX-License-Identifier: MIT
+#include "options.h"
+
+#include <getopt.h>
+
+#include <string_view>
+
+#include "text.h"
+
+namespace orbimport {
+
+const char kHelpText[] =
+    R"(Usage: orb-import [options] SOURCE DESTINATION
+
+Brings the photos, movies and sidecars below the folder SOURCE into folders by
+date below the folder DESTINATION. Nothing in SOURCE is changed, and nothing in
+DESTINATION is ever overwritten: what is there with the same size and time is
+left alone, another file of the same name makes the new one photo_1.jpg. The RAW,
+the JPEG and the sidecar of one shot always get the same number.
+
+Options:
+      --layout=PATTERN  folders below DESTINATION, by the time of modification:
+                        %Y %y year, %m month, %d day, %j day of the year,
+                        %H %M %S time, %% a percent sign
+                        (default: %Y/%Y-%m-%d)
+  -n, --dry-run         print what would be done and do nothing
+      --json            print one JSON object a line and item
+  -q, --quiet           no progress and no summary; failures are still listed
+  -v, --verbose         print a line for every item
+  -h, --help            print this text
+  -V, --version         print the version
+
+Examples:
+  orb-import /media/card ~/Pictures
+      imports a card into ~/Pictures/2026/2026-11-22 and the like
+  orb-import --dry-run /media/card ~/Pictures
+      shows where everything would go
+  orb-import --layout=%Y/%m /media/card ~/Pictures
+      a folder a month
+  orb-import --json /media/card ~/Pictures | jq -r 'select(.status == "copied").destination'
+      the new files, for a script
+
+Ctrl-C stops at once and leaves no half file. The same command run again goes on
+where it stopped.
+
+Exit status: 0 all done, 1 something failed, 2 wrong usage, 130 stopped by Ctrl-C.
+)";
+
+namespace {
+
+enum : int { kLayout = 256, kJson };
+
+constexpr option kLongOptions[] = {
+    {"layout", required_argument, nullptr, kLayout},
+    {"dry-run", no_argument, nullptr, 'n'},
+    {"json", no_argument, nullptr, kJson},
+    {"quiet", no_argument, nullptr, 'q'},
+    {"verbose", no_argument, nullptr, 'v'},
+    {"help", no_argument, nullptr, 'h'},
+    {"version", no_argument, nullptr, 'V'},
+    {nullptr, 0, nullptr, 0},
+};
+
+Request SetLayout(Options& options, std::string& why) {
+  std::string reason;
+  if (options.layout.Set(optarg, reason)) return Request::kImport;
+  why = "--layout " + Quote(optarg) + ": " + reason;
+  return Request::kBad;
+}
+
+std::string Complaint(int found, char** argv) {
+  const std::string given = argv[optind - 1];
+  if (found == ':') return Quote(given) + " needs a value";
+  if (given.starts_with("--")) return "unknown option or needless value: " + Quote(given);
+  return "unknown option " + Quote(std::string("-") + static_cast<char>(optopt));
+}
+
+Request ApplyOption(int found, char** argv, Options& options, std::string& why) {
+  switch (found) {
+    case kLayout:
+      return SetLayout(options, why);
+    case 'n':
+      options.dryRun = true;
+      return Request::kImport;
+    case kJson:
+      options.json = true;
+      return Request::kImport;
+    case 'q':
+      options.quiet = true;
+      return Request::kImport;
+    case 'v':
+      options.verbose = true;
+      return Request::kImport;
+    case 'h':
+      return Request::kHelp;
+    case 'V':
+      return Request::kVersion;
+    default:
+      why = Complaint(found, argv);
+      return Request::kBad;
+  }
+}
+
+}  // namespace
+
+Request ParseOptions(int argc, char** argv, Options& options, std::string& why) {
+  optind = 0;  // Starts afresh, also when called twice.
+  for (int found; (found = getopt_long(argc, argv, ":nqvhV", kLongOptions, nullptr)) != -1;) {
+    const Request request = ApplyOption(found, argv, options, why);
+    if (request != Request::kImport) return request;
+  }
+  if (argc - optind != 2) {
+    why = argc - optind < 2 ? "SOURCE and DESTINATION are needed" : "too many arguments";
+    return Request::kBad;
+  }
+  options.source = argv[optind];
+  options.destination = argv[optind + 1];
+  return Request::kImport;
+}
+
+}  // namespace orbimport

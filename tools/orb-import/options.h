@@ -1,0 +1,27 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <string>
+
+#include "layout.h"
+
+namespace orbimport {
+
+struct Options {
+  std::string source;
+  std::string destination;
+  Layout layout;
+  bool dryRun = false;
+  bool json = false;
+  bool quiet = false;
+  bool verbose = false;
+};
+
+enum class Request { kImport, kHelp, kVersion, kBad };
+
+/// Reads the command line. For kBad, `why` says what is wrong with it.
+Request ParseOptions(int argc, char** argv, Options& options, std::string& why);
+
+extern const char kHelpText[];
+
+}  // namespace orbimport

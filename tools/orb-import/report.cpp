@@ -1,0 +1,233 @@
+// SPDX-License-Identifier: MIT
+#include "report.h"
+
+#include <iomanip>
+#include <ostream>
+#include <string_view>
+
+#include "text.h"
+
+namespace orbimport {
+namespace {
+
+/// One JSON object on one line.
+class JsonLine {
+ public:
+  JsonLine& Text(const char* key, std::string_view value) { return Raw(key, JsonText(value)); }
+  JsonLine& Number(const char* key, std::uint64_t value) { return Raw(key, std::to_string(value)); }
+  /// A path whose bytes are no UTF-8 stands beside its text as they are, percent-encoded.
+  JsonLine& Path(const char* key, const std::string& path) {
+    Text(key, path);
+    return IsUtf8(path) ? *this : Text((std::string(key) + "_bytes").c_str(), PercentEncode(path));
+  }
+  std::string Finished() const { return "{" + text_ + "}\n"; }
+
+ private:
+  JsonLine& Raw(const char* key, const std::string& value) {
+    text_ += (text_.empty() ? "" : ",") + JsonText(key) + ":" + value;
+    return *this;
+  }
+
+  std::string text_;
+};
+
+const char* NameOf(Status status) {
+  switch (status) {
+    case Status::kCopied:
+      return "copied";
+    case Status::kPresent:
+      return "present";
+    case Status::kPlanned:
+      return "planned";
+    default:
+      return "failed";
+  }
+}
+
+const char* ReasonOf(SkipReason reason) {
+  switch (reason) {
+    case SkipReason::kHidden:
+      return "hidden";
+    case SkipReason::kLink:
+      return "link";
+    case SkipReason::kSpecial:
+      return "not a regular file";
+    case SkipReason::kDestination:
+      return "the destination itself";
+    default:
+      return "unknown type";
+  }
+}
+
+/// 2024-05-01T10:20:30Z
+std::string UtcText(const COrbTime& time) {
+  constexpr std::int64_t kDaysFrom1904To1970 = 24107;
+  const auto seconds = static_cast<std::int64_t>(WholeSeconds(time));
+  const std::int64_t rest = seconds % 86400;
+  // Days since 0000-03-01, in eras of 400 years, so that leap days end their years.
+  const std::int64_t day = seconds / 86400 - kDaysFrom1904To1970 + 719468;
+  const std::int64_t era = day / 146097;
+  const std::int64_t ofEra = day % 146097;
+  const std::int64_t year = (ofEra - ofEra / 1460 + ofEra / 36524 - ofEra / 146096) / 365;
+  const std::int64_t ofYear = ofEra - (365 * year + year / 4 - year / 100);
+  const std::int64_t month = (5 * ofYear + 2) / 153;
+  char text[48];
+  std::snprintf(text,
+                sizeof text,
+                "%04lld-%02lld-%02lldT%02lld:%02lld:%02lldZ",
+                static_cast<long long>(year + era * 400 + (month >= 10 ? 1 : 0)),
+                static_cast<long long>(month < 10 ? month + 3 : month - 9),
+                static_cast<long long>(ofYear - (153 * month + 2) / 5 + 1),
+                static_cast<long long>(rest / 3600),
+                static_cast<long long>(rest / 60 % 60),
+                static_cast<long long>(rest % 60));
+  return text;
+}
+
+std::string Counted(std::uint64_t count, const char* what) {
+  return std::to_string(count) + " " + what + (count == 1 ? "" : "s");
+}
+
+}  // namespace
+
+void Report::Add(Status status, const Item& item, const std::string& destination, OrbResult code) {
+  Tally& tally = tallies_[item.type];
+  switch (status) {
+    case Status::kCopied:
+    case Status::kPlanned:
+      ++tally.copied;
+      tally.copiedBytes += item.size;
+      break;
+    case Status::kPresent:
+      ++tally.present;
+      break;
+    case Status::kFailed:
+      ++tally.failed;
+      failures_.push_back({options_.source + "/" + item.path, code});
+  }
+  if (PrintsItems()) PrintItem(NameOf(status), item, destination, code);
+}
+
+void Report::AddFailure(const Failure& failure) {
+  ++tallies_[TypeOfName(failure.path)].failed;
+  failures_.push_back({options_.source + "/" + failure.path, failure.code});
+  if (PrintsItems()) PrintOther("failed", failure.path, nullptr, failure.code);
+}
+
+void Report::AddSkip(const Skip& skip) {
+  ++skips_[skip.reason];
+  if (skip.reason == SkipReason::kLink) links_.push_back(options_.source + "/" + skip.path);
+  if (PrintsItems()) PrintOther("skipped", skip.path, ReasonOf(skip.reason), kOrbNoErr);
+}
+
+void Report::AddUnfinished(const std::string& destination) {
+  unfinished_.push_back(options_.destination + "/" + destination);
+}
+
+std::uint64_t Report::Copied() const {
+  std::uint64_t copied = 0;
+  for (const auto& [type, tally] : tallies_) copied += tally.copied;
+  return copied;
+}
+
+void Report::PrintItem(const char* status,
+                       const Item& item,
+                       const std::string& destination,
+                       OrbResult code) {
+  if (options_.json) {
+    JsonLine line;
+    line.Text("status", status).Path("source", options_.source + "/" + item.path);
+    if (!destination.empty()) line.Path("destination", options_.destination + "/" + destination);
+    line.Text("type", TypeName(item.type)).Number("bytes", item.size);
+    line.Text("modified", UtcText(item.modified));
+    if (code >= kOrbErrFirst) line.Text("code", CodeName(code)).Text("reason", CodeMeaning(code));
+    out_ << line.Finished() << std::flush;
+    return;
+  }
+  out_ << std::left << std::setw(8) << status << ' ' << Quote(item.path);
+  if (!destination.empty()) out_ << " -> " << Quote(destination);
+  if (code >= kOrbErrFirst) out_ << " (" << CodeName(code) << ")";
+  out_ << '\n' << std::flush;
+}
+
+void Report::PrintOther(const char* status,
+                        const std::string& path,
+                        const char* reason,
+                        OrbResult code) {
+  if (options_.json) {
+    JsonLine line;
+    line.Text("status", status).Path("source", options_.source + "/" + path);
+    if (code >= kOrbErrFirst) line.Text("code", CodeName(code));
+    line.Text("reason", reason != nullptr ? reason : CodeMeaning(code));
+    out_ << line.Finished() << std::flush;
+    return;
+  }
+  out_ << std::left << std::setw(8) << status << ' ' << Quote(path) << " ("
+       << (reason != nullptr ? reason : CodeName(code)) << ")\n"
+       << std::flush;
+}
+
+void Report::Close(bool interrupted) {
+  PrintProblems();
+  if (options_.quiet) return;
+  std::ostream& to = options_.json ? err_ : out_;
+  PrintTable(to);
+  PrintSkips(to);
+  if (interrupted) to << "Stopped before the end. The same command goes on from here.\n";
+  to << std::flush;
+}
+
+void Report::PrintProblems() {
+  for (const Failed& failed : failures_) {
+    err_ << "orb-import: " << CodeName(failed.code) << " " << Quote(failed.path) << ": "
+         << CodeMeaning(failed.code) << '\n';
+  }
+  for (const std::string& path : unfinished_) {
+    err_ << "orb-import: unfinished until its card is imported again: " << Quote(path) << '\n';
+  }
+  if (!options_.quiet) {
+    for (const std::string& path : links_) {
+      err_ << "orb-import: link, not followed: " << Quote(path) << '\n';
+    }
+  }
+  err_ << std::flush;
+}
+
+void Report::PrintTable(std::ostream& to) const {
+  const auto row = [&](const std::string& name, const Tally& tally) {
+    to << std::left << std::setw(8) << name << std::right << std::setw(8) << tally.copied
+       << std::setw(12) << FormatBytes(tally.copiedBytes) << std::setw(9) << tally.present
+       << std::setw(8) << tally.failed << '\n';
+  };
+  to << std::left << std::setw(8) << "Type" << std::right << std::setw(8)
+     << (options_.dryRun ? "To copy" : "Copied") << std::setw(12) << "Size" << std::setw(9)
+     << "Present" << std::setw(8) << "Failed" << '\n';
+  Tally sum;
+  for (const auto& [type, tally] : tallies_) {
+    row(TypeName(type), tally);
+    sum.copied += tally.copied;
+    sum.copiedBytes += tally.copiedBytes;
+    sum.present += tally.present;
+    sum.failed += tally.failed;
+  }
+  row("All", sum);
+}
+
+void Report::PrintSkips(std::ostream& to) const {
+  constexpr struct {
+    SkipReason reason;
+    const char* what;
+  } kReasons[] = {{SkipReason::kLink, "link"},
+                  {SkipReason::kHidden, "hidden item"},
+                  {SkipReason::kSpecial, "special file"},
+                  {SkipReason::kUnknownType, "other file"}};
+  std::string text;
+  for (const auto& [reason, what] : kReasons) {
+    const auto found = skips_.find(reason);
+    if (found == skips_.end()) continue;
+    text += (text.empty() ? "" : ", ") + Counted(found->second, what);
+  }
+  if (!text.empty()) to << "Passed over: " << text << '\n';
+}
+
+}  // namespace orbimport
