@@ -41,7 +41,7 @@ int main(int argc, char** argv) {
 #ifdef ORB_BENCH_QT
       {"Start/Qt", "start_qt"},
 #endif
-#ifdef ORB_BENCH_GIO
+#ifdef ORB_BENCH_GLIB
       {"Start/GIO", "start_gio"},
 #endif
   };

@@ -3,7 +3,7 @@
 add_library(orb_warnings INTERFACE)
 target_compile_options(orb_warnings INTERFACE
   -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Wsign-conversion -Wnon-virtual-dtor
-  -Woverloaded-virtual -Wcast-align -Wnull-dereference -Wformat=2)
+  -Woverloaded-virtual -Wcast-align -Wformat=2)
 if(ORB_WERROR)
   target_compile_options(orb_warnings INTERFACE -Werror)
 endif()
