@@ -544,27 +544,35 @@ ORB_SSE_INLINE char* StoreGroup(char* out,
   return out;
 }
 
-/// As far as the text is ASCII, in steps of 32 and 8; the first 8 units are known to be.
+ORB_SSE_INLINE bool AreAscii(__m128i units) {
+  return _mm_testz_si128(units, _mm_set1_epi16(-0x80)) != 0;
+}
+
+/// As far as the text is ASCII, in steps of 64, 16 and 8; the first 8 units are known to be.
 ORB_SSE_INLINE std::size_t CopyAscii(std::u16string_view text, char* out) {
-  const __m128i other = _mm_set1_epi16(-0x80);
+  const char16_t* const from = text.data();
   std::size_t at = 0;
-  for (; text.size() - at >= 32; at += 32) {
-    const char16_t* from = text.data() + at;
-    const __m128i a = Load(from);
-    const __m128i b = Load(from + 8);
-    const __m128i c = Load(from + 16);
-    const __m128i d = Load(from + 24);
-    const __m128i any = _mm_or_si128(_mm_or_si128(a, b), _mm_or_si128(c, d));
-    if (!_mm_testz_si128(any, other)) break;
+  for (; text.size() - at >= 64; at += 64) {
+    __m128i units[8];
+    __m128i any = _mm_setzero_si128();
+    for (std::size_t i = 0; i < 8; ++i) {
+      units[i] = Load(from + at + i * kUnits);
+      any = _mm_or_si128(any, units[i]);
+    }
+    if (!AreAscii(any)) break;
+    for (std::size_t i = 0; i < 8; i += 2) {
+      Store(out + at + i * kUnits, _mm_packus_epi16(units[i], units[i + 1]));
+    }
+  }
+  for (; text.size() - at >= 2 * kUnits; at += 2 * kUnits) {
+    const __m128i a = Load(from + at);
+    const __m128i b = Load(from + at + kUnits);
+    if (!AreAscii(_mm_or_si128(a, b))) break;
     Store(out + at, _mm_packus_epi16(a, b));
-    Store(out + at + 16, _mm_packus_epi16(c, d));
   }
-  for (; text.size() - at >= kUnits; at += kUnits) {
-    const __m128i units = Load(text.data() + at);
-    if (!_mm_testz_si128(units, other)) break;
-    StoreAscii(out + at, units);
-  }
-  return at;
+  if (text.size() - at < kUnits || !AreAscii(Load(from + at))) return at;
+  StoreAscii(out + at, Load(from + at));
+  return at + kUnits;
 }
 
 /// How long the text begins with ASCII, in whole steps of 64.
@@ -609,15 +617,20 @@ ORB_SSE std::size_t Utf16LengthOfValid(std::string_view text) {
 
 ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
   const char* const begin = out;
+  bool wasAscii = false;
   while (text.size() >= kUnits) {
     const __m128i units = Load(text.data());
     const unsigned one = Mask(_mm_cmpeq_epi16(Bits16(units, 0xFF80), _mm_setzero_si128()));
     if (one == 0xFFFF) {
-      const std::size_t ascii = CopyAscii(text, out);
+      // A block alone is taken alone: only the second in a row promises more.
+      StoreAscii(out, units);
+      const std::size_t ascii = wasAscii ? CopyAscii(text, out) : kUnits;
       out += ascii;
       text.remove_prefix(ascii);
+      wasAscii = true;
       continue;
     }
+    wasAscii = false;
     const auto ascii = static_cast<std::size_t>(std::countr_one(one)) / 2;
     if (IsPair(text.substr(ascii))) {
       out = StoreGroup(out, units, ascii, &text);
