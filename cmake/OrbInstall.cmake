@@ -17,5 +17,7 @@ install(FILES
   ${PROJECT_BINARY_DIR}/OrbRTLConfigVersion.cmake
   DESTINATION ${orb_package_dir})
 
+# The .pc file finds the installation from where it lies, so that a moved one still works.
+file(RELATIVE_PATH orb_prefix_from_pc /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
 configure_file(cmake/OrbRTL.pc.in ${PROJECT_BINARY_DIR}/OrbRTL.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/OrbRTL.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
