@@ -123,6 +123,18 @@ TEST(Replacing, CutsAsManyUnitsAsTheWantedTextHas) {
   EXPECT_EQ(Shown(OrbStringDataReplace(COrbStringData(), S("a"), S("b"))), "");
 }
 
+TEST(Operations, ReadTheirInputsButGiveASourceNoValue) {
+  const COrbStringData source;
+  const COrbStringData read;
+  std::vector<COrbStringData> pieces;
+  OrbStringDataReplace(source, S("a"), read);  // Nothing matches, so `read` is not needed.
+  OrbStringDataSplit(source, S("a"), &pieces);
+  OrbStringDataTrim(source, S("a"));
+  EXPECT_TRUE(HasNoValue(source) && HasNoValue(read));
+  EXPECT_EQ(OrbStringDataCmp(source, read), 0);
+  EXPECT_TRUE(source.HasValueUtf8() && read.HasValueUtf8());
+}
+
 TEST(Trimming, TakesTheSetUnitByUnit) {
   const struct {
     const char *text, *set;
