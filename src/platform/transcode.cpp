@@ -208,7 +208,21 @@ std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
   return static_cast<std::size_t>(out - begin);
 }
 
+std::size_t Utf16LengthOfValid(std::string_view text) {
+  std::size_t length = 0;
+  for (const char byte : text) {
+    const auto value = static_cast<unsigned char>(byte);
+    length += (value & 0xC0) != 0x80 ? 1 : 0;
+    length += value >= 0xF0 ? 1 : 0;
+  }
+  return length;
+}
+
 }  // namespace portable
+
+std::size_t Utf16LengthOfValid(std::string_view text) {
+  return sse::IsSupported() ? sse::Utf16LengthOfValid(text) : portable::Utf16LengthOfValid(text);
+}
 
 std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
   return sse::IsSupported() ? sse::Utf16FromUtf8(text, out) : portable::Utf16FromUtf8(text, out);
@@ -221,20 +235,24 @@ std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
 #if defined(__SSE2__)
 
 // Aligned blocks of 16 bytes lie within one page, so the one that holds the terminator may be read
-// whole, with what lies before the text and behind it.
+// whole, with what lies before the text and behind it. The reads stand in this function alone,
+// where the sanitizers are told so.
 __attribute__((no_sanitize("address", "thread"))) std::size_t Utf16Length(
     const unsigned short* text) {
   const auto address = reinterpret_cast<std::uintptr_t>(text);
   const auto* block = reinterpret_cast<const __m128i*>(address & ~std::uintptr_t{15});
-  const auto zeros = [](const __m128i* units) {
-    const __m128i equal = _mm_cmpeq_epi16(*units, _mm_setzero_si128());
-    return static_cast<unsigned>(_mm_movemask_epi8(equal));
-  };
-  unsigned found = zeros(block) >> (address & 15) << (address & 15);
-  while (found == 0) found = zeros(++block);
-  const auto end =
-      reinterpret_cast<std::uintptr_t>(block) + static_cast<unsigned>(std::countr_zero(found));
-  return (end - address) / sizeof *text;
+  unsigned before = 0xFFFFU << (address & 15);  // Drops what the first block has before the text.
+  while (true) {
+    const __m128i zeros = _mm_cmpeq_epi16(*block, _mm_setzero_si128());
+    const unsigned found = static_cast<unsigned>(_mm_movemask_epi8(zeros)) & before;
+    if (found != 0) {
+      const auto end =
+          reinterpret_cast<std::uintptr_t>(block) + static_cast<unsigned>(std::countr_zero(found));
+      return (end - address) / sizeof *text;
+    }
+    before = 0xFFFF;
+    ++block;
+  }
 }
 
 #else

@@ -17,6 +17,8 @@ inline constexpr std::size_t kNotUtf8 = SIZE_MAX;
 /// UTF-8. Writes the units, without terminator, and returns their number; kNotUtf8 when the text is
 /// not valid, with the content of `out` open. `out` needs room for text.size() + kSlack units.
 std::size_t Utf16FromUtf8(std::string_view text, char16_t* out);
+/// The number of units that a text has if it is valid; one that is not has some number.
+std::size_t Utf16LengthOfValid(std::string_view text);
 /// An unpaired surrogate becomes U+FFFD. Writes the bytes, without terminator, and returns their
 /// number. `out` needs room for 3 * text.size() + kSlack bytes.
 std::size_t Utf8FromUtf16(std::u16string_view text, char* out);
@@ -48,6 +50,7 @@ MacRomanText MacRomanFromUtf16(std::u16string_view text);
 namespace portable {
 
 std::size_t Utf16FromUtf8(std::string_view text, char16_t* out);
+std::size_t Utf16LengthOfValid(std::string_view text);
 std::size_t Utf8FromUtf16(std::u16string_view text, char* out);
 
 }  // namespace portable

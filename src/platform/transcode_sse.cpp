@@ -3,7 +3,7 @@
 
 #include "platform/transcode.h"
 
-#if defined(__x86_64__) || defined(__i386__)
+#if defined(__x86_64__)
 
 #include <immintrin.h>
 
@@ -104,7 +104,7 @@ ORB_SSE_INLINE unsigned AtLeast(__m128i bytes, int least) {
   return Mask(_mm_cmpeq_epi8(_mm_max_epu8(bytes, _mm_set1_epi8(static_cast<char>(least))), bytes));
 }
 
-/// What the bytes of a block are; one bit for each.
+/// One bit for each byte of a block.
 struct Leads {
   unsigned continuation;
   unsigned two;    // Leads two bytes or more.
@@ -172,7 +172,7 @@ ORB_SSE_INLINE char16_t* StoreAscii(char16_t* out, __m128i bytes) {
   return out + 16;
 }
 
-/// As far as the text is ASCII, in steps of 64.
+/// As far as the text is ASCII, in steps of 64 and 16; the first 16 bytes are known to be.
 ORB_SSE_INLINE std::size_t WidenAscii(const char* from, std::size_t left, char16_t* out) {
   std::size_t at = 0;
   for (; left - at >= 4 * kBlock; at += 4 * kBlock) {
@@ -183,6 +183,11 @@ ORB_SSE_INLINE std::size_t WidenAscii(const char* from, std::size_t left, char16
     if (Mask(_mm_or_si128(_mm_or_si128(a, b), _mm_or_si128(c, d))) != 0) break;
     char16_t* to = out + at;
     for (const __m128i bytes : {a, b, c, d}) to = StoreAscii(to, bytes);
+  }
+  for (; left - at >= kBlock; at += kBlock) {
+    const __m128i bytes = Load(from + at);
+    if (Mask(bytes) != 0) break;
+    StoreAscii(out + at, bytes);
   }
   return at;
 }
@@ -206,74 +211,123 @@ ORB_SSE_INLINE char16_t* StoreFiveTriples(char16_t* out, __m128i bytes) {
   return out + 5;
 }
 
+/// The lanes of a block's first eight bytes and of its last.
+struct Halves {
+  __m128i low;
+  __m128i high;
+
+  ORB_SSE_INLINE bool Any() const { return Mask(_mm_or_si128(low, high)) != 0; }
+};
+
 /// Where a conversion stands.
 struct Place {
   const char* at;
   char16_t* out;
 };
 
+/// What the bytes of a block are; one bit for each.
+ORB_SSE_INLINE Leads LeadsOf(__m128i bytes, unsigned nonAscii) {
+  const unsigned continuation = Mask(_mm_cmplt_epi8(bytes, _mm_set1_epi8(-64)));
+  return {continuation, nonAscii & ~continuation, AtLeast(bytes, 0xE0), AtLeast(bytes, 0xF0)};
+}
+
+/// How many bytes of a block belong to characters that lie whole in it, as long as it is valid.
+/// Read from its last bytes and not from masks, because the next block waits for it.
+ORB_SSE_INLINE unsigned Whole(const char* block) {
+  const auto isAtLeast = [block](std::size_t at, unsigned lead) {
+    return static_cast<unsigned>(static_cast<unsigned char>(block[at]) >= lead);
+  };
+  return static_cast<unsigned>(kBlock) - isAtLeast(15, 0xC0) - 2 * isAtLeast(14, 0xE0) -
+         3 * isAtLeast(13, 0xF0);
+}
+
+ORB_SSE_INLINE unsigned Expected(const Leads& leads) {
+  return (leads.two << 1 | leads.three << 2 | leads.four << 3) & 0xFFFF;
+}
+
+/// Sets the units of the characters of four bytes. False for values that they must not carry.
+ORB_SSE_INLINE bool SetFours(
+    __m128i bytes, const Lanes& low, const Lanes& high, Halves* units, Halves* bad) {
+  const __m128i first =
+      _mm_cmpeq_epi8(_mm_max_epu8(bytes, _mm_set1_epi8(static_cast<char>(0xF0))), bytes);
+  const __m128i next = _mm_slli_si128(first, 1);
+  units->low = UpToFourBytes(
+      low, units->low, _mm_unpacklo_epi8(first, first), _mm_unpacklo_epi8(next, next), &bad->low);
+  units->high = UpToFourBytes(high,
+                              units->high,
+                              _mm_unpackhi_epi8(first, first),
+                              _mm_unpackhi_epi8(next, next),
+                              &bad->high);
+  return AtLeast(bytes, 0xF5) == 0;
+}
+
+/// The character that four bytes hold; 0 where they hold none.
+std::uint32_t FourByteCharacter(const char* at) {
+  std::uint32_t bytes = 0;
+  std::memcpy(&bytes, at, sizeof bytes);
+  if ((bytes & 0xC0C0C0F8) != 0x808080F0) return 0;
+  const std::uint32_t value = (bytes & 0x07) << 18 | (bytes & 0x3F00) << 4 |
+                              (bytes & 0x3F0000) >> 10 | (bytes & 0x3F000000) >> 24;
+  return value >= 0x10000 && value <= 0x10FFFF ? value : 0;
+}
+
+/// Among ASCII, characters of four bytes stand in small groups: takes a block's ASCII up to such a
+/// group, and the group, so that the next block begins in step with the text. Takes nothing where
+/// the first character beyond ASCII is of another kind.
+ORB_SSE_INLINE void ConvertGroup(Place* place, __m128i bytes, unsigned nonAscii, const char* end) {
+  const int ascii = std::countr_zero(nonAscii);
+  const char* at = place->at + ascii;
+  char16_t* out = place->out + ascii;
+  const auto next = [&] { return end - at >= 4 ? FourByteCharacter(at) : 0; };
+  std::uint32_t value = next();
+  if (value == 0) return;
+  StoreAscii(place->out, bytes);
+  do {
+    *out++ = static_cast<char16_t>(0xD7C0 + (value >> 10));
+    *out++ = static_cast<char16_t>(0xDC00 + (value & 0x3FF));
+    at += 4;
+    value = next();
+  } while (value != 0);
+  *place = {at, out};
+}
+
 /// Converts the characters that lie whole in the first `limit` bytes of the block, which begins
 /// with one and holds one that is not ASCII. False for what is no UTF-8.
 ORB_SSE_INLINE bool ConvertBlock(Place* place, __m128i bytes, unsigned nonAscii, unsigned limit) {
-  const unsigned continuation = Mask(_mm_cmplt_epi8(bytes, _mm_set1_epi8(-64)));
-  const Leads leads = {
-      continuation, nonAscii & ~continuation, AtLeast(bytes, 0xE0), AtLeast(bytes, 0xF0)};
+  const Leads leads = LeadsOf(bytes, nonAscii);
   constexpr unsigned kFifteen = 0x7FFF;
-  if (((leads.three ^ leads.four) & kFifteen) == 0x1249 && (continuation & kFifteen) == 0x6DB6 &&
-      limit >= 15) {
+  if (((leads.three ^ leads.four) & kFifteen) == 0x1249 &&
+      (leads.continuation & kFifteen) == 0x6DB6 && limit >= 15) {
     place->out = StoreFiveTriples(place->out, bytes);
     place->at += 15;
     return place->out != nullptr;
   }
-  const unsigned expected = (leads.two << 1 | leads.three << 2 | leads.four << 3) & 0xFFFF;
   const __m128i tooSmall = _mm_cmpeq_epi8(_mm_and_si128(bytes, _mm_set1_epi8(-2)),
                                           _mm_set1_epi8(static_cast<char>(0xC0)));
-  if (continuation != expected || Mask(tooSmall) != 0) return false;
-
-  const unsigned cut = (leads.two & 0x8000) | (leads.three & 0xC000) | (leads.four & 0xE000);
-  const unsigned whole = cut == 0 ? kBlock : static_cast<unsigned>(std::countr_zero(cut));
+  if (leads.continuation != Expected(leads) || Mask(tooSmall) != 0) return false;
+  const unsigned whole = Whole(place->at);
   const unsigned consumed = whole < limit ? whole : limit;
   const unsigned inside = (1U << consumed) - 1;
 
+  const __m128i zero = _mm_setzero_si128();
   const __m128i second = Load(place->at + 1);
-  const __m128i lowPair = _mm_unpacklo_epi8(second, bytes);
-  const __m128i highPair = _mm_unpackhi_epi8(second, bytes);
+  const __m128i third = Load(place->at + 2);
+  const Lanes low = {_mm_unpacklo_epi8(second, bytes), _mm_unpacklo_epi8(third, zero)};
+  const Lanes high = {_mm_unpackhi_epi8(second, bytes), _mm_unpackhi_epi8(third, zero)};
+  unsigned keep = ~leads.continuation & inside;
+  place->at += consumed;
   if (leads.three == 0) {
-    place->out = StoreKept(
-        place->out, UpToTwoBytes(lowPair), UpToTwoBytes(highPair), ~continuation & inside);
-    place->at += consumed;
+    place->out = StoreKept(place->out, UpToTwoBytes(low.pair), UpToTwoBytes(high.pair), keep);
     return true;
   }
-  const __m128i zero = _mm_setzero_si128();
-  const __m128i third = Load(place->at + 2);
-  const Lanes low = {lowPair, _mm_unpacklo_epi8(third, zero)};
-  const Lanes high = {highPair, _mm_unpackhi_epi8(third, zero)};
-  __m128i badLow = zero;
-  __m128i badHigh = zero;
-  __m128i lowUnits;
-  __m128i highUnits;
-  if (leads.two == leads.four) {
-    lowUnits = _mm_srli_epi16(lowPair, 8);
-    highUnits = _mm_srli_epi16(highPair, 8);
-  } else {
-    lowUnits = UpToThreeBytes(low, &badLow);
-    highUnits = UpToThreeBytes(high, &badHigh);
-  }
-  unsigned keep = ~continuation;
+  Halves bad;
+  Halves units = {UpToThreeBytes(low, &bad.low), UpToThreeBytes(high, &bad.high)};
   if (leads.four != 0) {
-    if (AtLeast(bytes, 0xF5) != 0) return false;
-    const __m128i first =
-        _mm_cmpeq_epi8(_mm_max_epu8(bytes, _mm_set1_epi8(static_cast<char>(0xF0))), bytes);
-    const __m128i next = _mm_slli_si128(first, 1);
-    lowUnits = UpToFourBytes(
-        low, lowUnits, _mm_unpacklo_epi8(first, first), _mm_unpacklo_epi8(next, next), &badLow);
-    highUnits = UpToFourBytes(
-        high, highUnits, _mm_unpackhi_epi8(first, first), _mm_unpackhi_epi8(next, next), &badHigh);
-    keep |= leads.four << 1;
+    if (!SetFours(bytes, low, high, &units, &bad)) return false;
+    keep |= leads.four << 1 & inside;
   }
-  if (Mask(_mm_or_si128(badLow, badHigh)) != 0) return false;
-  place->out = StoreKept(place->out, lowUnits, highUnits, keep & inside);
-  place->at += consumed;
+  if (bad.Any()) return false;
+  place->out = StoreKept(place->out, units.low, units.high, keep);
   return true;
 }
 
@@ -314,12 +368,16 @@ ORB_SSE std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
     const unsigned nonAscii = Mask(bytes);
     if (nonAscii == 0) {
       const std::size_t ascii = WidenAscii(place.at, left(), place.out);
-      if (ascii == 0) StoreAscii(place.out, bytes);
-      place.at += ascii == 0 ? kBlock : ascii;
-      place.out += ascii == 0 ? kBlock : ascii;
+      place.at += ascii;
+      place.out += ascii;
       continue;
     }
     if (left() < kBlock + kReadAhead) break;
+    if (AtLeast(bytes, 0xF0) != 0) {
+      const char* const before = place.at;
+      ConvertGroup(&place, bytes, nonAscii, end);
+      if (place.at != before) continue;
+    }
     if (!ConvertBlock(&place, bytes, nonAscii, kBlock)) return kNotUtf8;
   }
   if (left() != 0) place.out = ConvertTail(place.at, left(), place.out);
@@ -416,74 +474,182 @@ ORB_SSE_INLINE Triples UpToThreeBytes(__m128i units) {
           LaneMask(upToTwo) ^ 0xFF};
 }
 
-/// Any eight units, the first of which is no half of a pair begun before. Null where a surrogate
-/// stands alone; a pair cut by the end is left for the next call.
-ORB_SSE_INLINE char* StoreUnits(char* out, __m128i units, unsigned* taken) {
+/// The surrogates of a block whose first unit is no half of a pair begun before.
+struct Pairs {
+  Surrogates lanes;
+  unsigned high;
+  unsigned low;
+
+  bool AreWhole() const { return low == (high << 1 & 0xFF); }
+};
+
+/// 1 where the last of eight units begins a pair that they do not end. Read from that unit and not
+/// from a mask, because the next block waits for it.
+unsigned CutPair(std::u16string_view text) { return (text[kUnits - 1] & 0xFC00) == 0xD800 ? 1 : 0; }
+
+ORB_SSE_INLINE Pairs PairsIn(__m128i units) {
   const __m128i kind = Bits16(units, 0xFC00);
-  const Surrogates surrogates = {_mm_cmpeq_epi16(kind, _mm_set1_epi16(static_cast<short>(0xD800))),
-                                 _mm_cmpeq_epi16(kind, _mm_set1_epi16(static_cast<short>(0xDC00)))};
-  const unsigned high = LaneMask(surrogates.high);
-  const unsigned low = LaneMask(surrogates.low);
-  Triples bytes = UpToThreeBytes(units);
-  if ((high | low) == 0) {
-    return bytes.three == 0xFF ? StoreThreeBytes(out, units) : StoreTriples(out, bytes);
-  }
-  if (low != (high << 1 & 0xFF)) return nullptr;
-  const unsigned cut = high >> 7;
-  *taken = kUnits - cut;
-  const __m128i any = _mm_or_si128(surrogates.high, surrogates.low);
-  const __m128i pairs = BytesOfPairs(units, surrogates);
-  bytes.three &= ~(high | low);
-  if (bytes.three == 0) {
-    return StoreUpToTwoBytes(out, units, _mm_blendv_epi8(TwoBytes(units), pairs, any)) - 2 * cut;
-  }
-  bytes.head = _mm_blendv_epi8(bytes.head, _mm_slli_epi16(pairs, 8), any);
-  bytes.tail = _mm_blendv_epi8(bytes.tail, _mm_srli_epi16(pairs, 8), any);
-  return StoreTriples(out, bytes) - 2 * cut;
+  const Surrogates lanes = {_mm_cmpeq_epi16(kind, _mm_set1_epi16(static_cast<short>(0xD800))),
+                            _mm_cmpeq_epi16(kind, _mm_set1_epi16(static_cast<short>(0xDC00)))};
+  return {lanes, LaneMask(lanes.high), LaneMask(lanes.low)};
 }
 
-/// As far as the text is ASCII, in steps of 32.
+/// Any eight units whose surrogates are paired, but for one at the end.
+ORB_SSE_INLINE char* StoreUnits(char* out, __m128i units, const Pairs& pairs) {
+  Triples bytes = UpToThreeBytes(units);
+  if ((pairs.high | pairs.low) == 0) {
+    return bytes.three == 0xFF ? StoreThreeBytes(out, units) : StoreTriples(out, bytes);
+  }
+  const __m128i any = _mm_or_si128(pairs.lanes.high, pairs.lanes.low);
+  const __m128i two = BytesOfPairs(units, pairs.lanes);
+  bytes.head = _mm_blendv_epi8(bytes.head, _mm_slli_epi16(two, 8), any);
+  bytes.tail = _mm_blendv_epi8(bytes.tail, _mm_srli_epi16(two, 8), any);
+  bytes.three &= ~(pairs.high | pairs.low);
+  return StoreTriples(out, bytes);
+}
+
+ORB_SSE_INLINE void StoreAscii(char* out, __m128i units) {
+  _mm_storel_epi64(reinterpret_cast<__m128i*>(out), _mm_packus_epi16(units, units));
+}
+
+bool IsPair(std::u16string_view text) {
+  if (text.size() < 2) return false;
+  std::uint32_t both = 0;
+  std::memcpy(&both, text.data(), sizeof both);
+  return (both & 0xFC00FC00) == 0xDC00D800;
+}
+
+std::uint32_t BytesOfPair(std::u16string_view text) {
+  const std::uint32_t top = (text[0] & 0x3FFU) + 0x40;
+  const std::uint32_t low = text[1];
+  return 0x808080F0 | top >> 8 | (top & 0xFC) << 6 | (top & 3) << 20 | (low & 0x3C0) << 10 |
+         (low & 0x3F) << 24;
+}
+
+/// Among ASCII, pairs stand in small groups: takes a block's ASCII up to such a group, and the
+/// group, so that the next block begins in step with the text.
+ORB_SSE_INLINE char* StoreGroup(char* out,
+                                __m128i units,
+                                std::size_t ascii,
+                                std::u16string_view* text) {
+  StoreAscii(out, units);
+  out += ascii;
+  text->remove_prefix(ascii);
+  do {
+    const std::uint32_t bytes = BytesOfPair(*text);
+    std::memcpy(out, &bytes, sizeof bytes);
+    out += sizeof bytes;
+    text->remove_prefix(2);
+  } while (IsPair(*text));
+  return out;
+}
+
+ORB_SSE_INLINE bool AreAscii(__m128i units) {
+  return _mm_testz_si128(units, _mm_set1_epi16(-0x80)) != 0;
+}
+
+/// As far as the text is ASCII, in steps of 64, 16 and 8; the first 8 units are known to be.
 ORB_SSE_INLINE std::size_t CopyAscii(std::u16string_view text, char* out) {
+  const char16_t* const from = text.data();
   std::size_t at = 0;
-  for (; text.size() - at >= 32; at += 32) {
-    const char16_t* from = text.data() + at;
-    const __m128i a = Load(from);
-    const __m128i b = Load(from + 8);
-    const __m128i c = Load(from + 16);
-    const __m128i d = Load(from + 24);
-    const __m128i any = _mm_or_si128(_mm_or_si128(a, b), _mm_or_si128(c, d));
-    if (!_mm_testz_si128(any, _mm_set1_epi16(-0x80))) break;
+  for (; text.size() - at >= 64; at += 64) {
+    __m128i units[8];
+    __m128i any = _mm_setzero_si128();
+    for (std::size_t i = 0; i < 8; ++i) {
+      units[i] = Load(from + at + i * kUnits);
+      any = _mm_or_si128(any, units[i]);
+    }
+    if (!AreAscii(any)) break;
+    for (std::size_t i = 0; i < 8; i += 2) {
+      Store(out + at + i * kUnits, _mm_packus_epi16(units[i], units[i + 1]));
+    }
+  }
+  for (; text.size() - at >= 2 * kUnits; at += 2 * kUnits) {
+    const __m128i a = Load(from + at);
+    const __m128i b = Load(from + at + kUnits);
+    if (!AreAscii(_mm_or_si128(a, b))) break;
     Store(out + at, _mm_packus_epi16(a, b));
-    Store(out + at + 16, _mm_packus_epi16(c, d));
+  }
+  if (text.size() - at < kUnits || !AreAscii(Load(from + at))) return at;
+  StoreAscii(out + at, Load(from + at));
+  return at + kUnits;
+}
+
+/// How long the text begins with ASCII, in whole steps of 64.
+ORB_SSE_INLINE std::size_t AsciiLength(std::string_view text) {
+  std::size_t at = 0;
+  for (; text.size() - at >= 4 * kBlock; at += 4 * kBlock) {
+    const char* from = text.data() + at;
+    const __m128i a = _mm_or_si128(Load(from), Load(from + kBlock));
+    const __m128i b = _mm_or_si128(Load(from + 2 * kBlock), Load(from + 3 * kBlock));
+    if (Mask(_mm_or_si128(a, b)) != 0) break;
   }
   return at;
 }
 
 }  // namespace
 
+ORB_SSE std::size_t Utf16LengthOfValid(std::string_view text) {
+  constexpr std::size_t kRound = 127;  // So many blocks add up to no more than a byte holds.
+  const __m128i zero = _mm_setzero_si128();
+  const std::size_t ascii = AsciiLength(text);
+  text.remove_prefix(ascii);
+  __m128i sum = zero;
+  std::size_t blocks = text.size() / kBlock;
+  const char* at = text.data();
+  while (blocks != 0) {
+    __m128i counts = zero;
+    const std::size_t round = blocks < kRound ? blocks : kRound;
+    for (std::size_t i = 0; i < round; ++i, at += kBlock) {
+      const __m128i bytes = Load(at);
+      const __m128i first = _mm_cmpgt_epi8(bytes, _mm_set1_epi8(-65));
+      const __m128i four =
+          _mm_cmpeq_epi8(_mm_max_epu8(bytes, _mm_set1_epi8(static_cast<char>(0xF0))), bytes);
+      counts = _mm_sub_epi8(_mm_sub_epi8(counts, first), four);
+    }
+    sum = _mm_add_epi64(sum, _mm_sad_epu8(counts, zero));
+    blocks -= round;
+  }
+  const auto counted = static_cast<std::size_t>(_mm_cvtsi128_si64(sum)) +
+                       static_cast<std::size_t>(_mm_extract_epi64(sum, 1));
+  return ascii + counted + portable::Utf16LengthOfValid(text.substr(text.size() / kBlock * kBlock));
+}
+
 ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
   const char* const begin = out;
+  bool wasAscii = false;
   while (text.size() >= kUnits) {
     const __m128i units = Load(text.data());
-    unsigned taken = kUnits;
-    if (_mm_testz_si128(units, _mm_set1_epi16(-0x80))) {
-      const std::size_t ascii = CopyAscii(text, out);
+    const unsigned one = Mask(_mm_cmpeq_epi16(Bits16(units, 0xFF80), _mm_setzero_si128()));
+    if (one == 0xFFFF) {
+      // A block alone is taken alone: only the second in a row promises more.
+      StoreAscii(out, units);
+      const std::size_t ascii = wasAscii ? CopyAscii(text, out) : kUnits;
       out += ascii;
       text.remove_prefix(ascii);
-      if (ascii != 0) continue;
-      _mm_storel_epi64(reinterpret_cast<__m128i*>(out), _mm_packus_epi16(units, units));
-      out += kUnits;
-    } else if (_mm_testz_si128(units, _mm_set1_epi16(-0x800))) {
-      out = StoreUpToTwoBytes(out, units, TwoBytes(units));
-    } else if (char* stored = StoreUnits(out, units, &taken)) {
-      out = stored;
-    } else {
-      // A surrogate alone: the plain way knows what to do, up to a unit that begins a character.
-      const bool cut = (text[kUnits - 1] & 0xFC00) == 0xD800;
-      taken = cut ? kUnits - 1 : kUnits;
-      out += portable::Utf8FromUtf16(text.substr(0, taken), out);
+      wasAscii = true;
+      continue;
     }
-    text.remove_prefix(taken);
+    wasAscii = false;
+    const auto ascii = static_cast<std::size_t>(std::countr_one(one)) / 2;
+    if (IsPair(text.substr(ascii))) {
+      out = StoreGroup(out, units, ascii, &text);
+      continue;
+    }
+    if (_mm_testz_si128(units, _mm_set1_epi16(-0x800))) {
+      out = StoreUpToTwoBytes(out, units, TwoBytes(units));
+      text.remove_prefix(kUnits);
+      continue;
+    }
+    const Pairs pairs = PairsIn(units);
+    const unsigned cut = CutPair(text);
+    if (pairs.AreWhole()) {
+      out = StoreUnits(out, units, pairs) - 2 * cut;
+    } else {
+      // A surrogate alone, for which the plain way knows what to do.
+      out += portable::Utf8FromUtf16(text.substr(0, kUnits - cut), out);
+    }
+    text.remove_prefix(kUnits - cut);
   }
   return static_cast<std::size_t>(out - begin) + portable::Utf8FromUtf16(text, out);
 }
@@ -495,6 +661,7 @@ ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
 namespace orb::platform::sse {
 
 bool IsSupported() { return false; }
+std::size_t Utf16LengthOfValid(std::string_view text) { return portable::Utf16LengthOfValid(text); }
 std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
   return portable::Utf16FromUtf8(text, out);
 }

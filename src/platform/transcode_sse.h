@@ -12,6 +12,7 @@ namespace orb::platform::sse {
 bool IsSupported();
 
 std::size_t Utf16FromUtf8(std::string_view text, char16_t* out);
+std::size_t Utf16LengthOfValid(std::string_view text);
 std::size_t Utf8FromUtf16(std::u16string_view text, char* out);
 
 }  // namespace orb::platform::sse

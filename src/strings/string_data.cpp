@@ -20,6 +20,7 @@ using orb::platform::kSlack;
 using orb::platform::MacRomanFromUtf16;
 using orb::platform::Utf16FromUtf8;
 using orb::platform::Utf16Length;
+using orb::platform::Utf16LengthOfValid;
 using orb::platform::Utf8FromMacRoman;
 using orb::platform::Utf8FromUtf16;
 
@@ -68,11 +69,18 @@ Copy<unsigned short> Duplicate(const unsigned short* text, std::size_t length) {
   return {copy, length};
 }
 
-/// Gives back what a buffer has too much.
-template <typename Unit>
-Unit* Shrunk(Unit* buffer, std::size_t size) {
-  void* shrunk = std::realloc(buffer, size);
-  return shrunk == nullptr ? buffer : static_cast<Unit*>(shrunk);
+/// Gives back what a buffer has too much. A large one is copied: an allocator that maps such sizes
+/// learns to keep them only when they are freed as large as they were asked for, and would map the
+/// next one anew.
+char* Shrunk(char* buffer, std::size_t size, std::size_t before) {
+  constexpr std::size_t kLarge = 64 * 1024;
+  void* exact = before < kLarge ? std::realloc(buffer, size) : std::malloc(size);
+  if (exact == nullptr) return buffer;
+  if (before >= kLarge) {
+    std::memcpy(exact, buffer, size);
+    std::free(buffer);
+  }
+  return static_cast<char*>(exact);
 }
 
 /// `most` bounds what `write` writes, without its slack; it returns the length.
@@ -86,7 +94,7 @@ Copy<char> Written(std::size_t most, Write write) {
   if (made == nullptr) return {nullptr, 0};
   const std::size_t length = write(made);
   made[length] = '\0';
-  return {Shrunk(made, length + 1), length};
+  return {Shrunk(made, length + 1, most + kSlack), length};
 }
 
 /// The UTF-16 copy has room for twice its units, all zero behind the text.
@@ -107,16 +115,19 @@ Copy<unsigned short> ShortUnicode(std::string_view utf8) {
   return Terminated(made, length);
 }
 
-/// One pass over the text: the most that it can need is taken first and what is left given back.
+/// The second half of the room takes what the conversion overwrites. A text with fewer units than a
+/// third of its bytes is no UTF-8, and one with more has that much room.
 Copy<unsigned short> UnicodeFrom(std::string_view utf8) {
   if (utf8.size() <= kShort) return ShortUnicode(utf8);
-  const std::size_t most = UnicodeSize(utf8.size());
-  auto* made = static_cast<unsigned short*>(std::malloc(most));
+  static_assert(kShort / 3 > kSlack);
+  const std::size_t most = Utf16LengthOfValid(utf8);
+  if (most < utf8.size() / 3) return ShortUnicode({});
+  auto* made = static_cast<unsigned short*>(std::malloc(UnicodeSize(most)));
   if (made == nullptr) return {nullptr, 0};
-  std::size_t length = Utf16FromUtf8(utf8, reinterpret_cast<char16_t*>(made));
-  if (length == kNotUtf8) length = 0;
-  if (length != utf8.size()) made = Shrunk(made, UnicodeSize(length));
-  return Terminated(made, length);
+  const std::size_t length = Utf16FromUtf8(utf8, reinterpret_cast<char16_t*>(made));
+  if (length == most) return Terminated(made, length);
+  std::free(made);
+  return ShortUnicode({});
 }
 
 Copy<char> SystemFrom(std::string_view utf8) try {

@@ -130,6 +130,8 @@ TEST(Transcode, OfRandomTextsIsWhatThePlainWayGives) {
     std::string bytes = Bytes(portable::Utf8FromUtf16, units);
     ASSERT_EQ(Bytes(sse::Utf8FromUtf16, units), bytes);
     ASSERT_EQ(Units(sse::Utf16FromUtf8, bytes), units);
+    ASSERT_EQ(sse::Utf16LengthOfValid(bytes), units.size());
+    ASSERT_EQ(portable::Utf16LengthOfValid(bytes), units.size());
 
     for (auto& unit : units) {
       if (random(8) == 0) unit = static_cast<char16_t>(0xD800 + random(0x800));
