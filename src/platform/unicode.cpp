@@ -7,6 +7,7 @@
 #include <unicode/utf16.h>
 
 #include <algorithm>
+#include <limits>
 #include <memory>
 #include <vector>
 
@@ -16,19 +17,6 @@ namespace {
 using detail::CharPage;
 
 std::int32_t Size(std::u16string_view text) { return static_cast<std::int32_t>(text.size()); }
-
-/// Calls `fill(buffer, capacity, status)`, again with a larger buffer when the first is too small.
-template <typename Fill>
-std::u16string Filled(std::size_t guess, Fill fill) {
-  std::u16string out(guess, u'\0');
-  for (;;) {
-    UErrorCode status = U_ZERO_ERROR;
-    const std::int32_t length = fill(out.data(), static_cast<std::int32_t>(out.size()), &status);
-    if (U_FAILURE(status) && status != U_BUFFER_OVERFLOW_ERROR) return {};
-    out.resize(static_cast<std::size_t>(length));
-    if (U_SUCCESS(status)) return out;
-  }
-}
 
 const UNormalizer2* Nfd() {
   UErrorCode status = U_ZERO_ERROR;
@@ -144,6 +132,21 @@ CharForm Made(Form form, char32_t c) {
   return made;
 }
 
+/// ICU counts in 32 bits, and mapping may triple a text.
+constexpr std::size_t kMostUnits = std::numeric_limits<std::int32_t>::max() / 4;
+
+std::u16string Mapped(std::u16string_view text, decltype(&u_strToLower) map) {
+  std::u16string out(text);
+  if (text.empty() || text.size() > kMostUnits) return out;
+  for (;;) {
+    UErrorCode status = U_ZERO_ERROR;
+    const std::int32_t length = map(out.data(), Size(out), text.data(), Size(text), "", &status);
+    if (U_FAILURE(status) && status != U_BUFFER_OVERFLOW_ERROR) return std::u16string(text);
+    out.resize(static_cast<std::size_t>(length));
+    if (U_SUCCESS(status)) return out;
+  }
+}
+
 }  // namespace
 
 namespace detail {
@@ -173,16 +176,8 @@ std::u16string FormOfRun(Form form, std::u16string_view text) {
   return DecomposedInOrder(Folded(decomposed));
 }
 
-std::u16string Lower(std::u16string_view text) {
-  return Filled(text.size() + 16, [&](char16_t* out, std::int32_t capacity, UErrorCode* status) {
-    return u_strToLower(out, capacity, text.data(), Size(text), "", status);
-  });
-}
+std::u16string Lower(std::u16string_view text) { return Mapped(text, u_strToLower); }
 
-std::u16string Upper(std::u16string_view text) {
-  return Filled(text.size() + 16, [&](char16_t* out, std::int32_t capacity, UErrorCode* status) {
-    return u_strToUpper(out, capacity, text.data(), Size(text), "", status);
-  });
-}
+std::u16string Upper(std::u16string_view text) { return Mapped(text, u_strToUpper); }
 
 }  // namespace orb::platform
