@@ -2,8 +2,6 @@
 #include <orb/fileinfo/file_handle.h>
 #include <orb/path/path_text.h>
 
-#include <optional>
-#include <string>
 #include <string_view>
 
 #include "fileinfo/item_path.h"
@@ -22,6 +20,7 @@ using orb::platform::ItemInfo;
 using orb::platform::ItemKind;
 using orb::platform::ItemRecord;
 using orb::platform::Items;
+using orb::platform::PathText;
 using orb::platform::Result;
 using orb::platform::Status;
 using orb::platform::Timestamp;
@@ -37,13 +36,6 @@ OrbResult FailureCode(const Error& error) {
   return code == kOrbNoErr ? kOrbErrNoSuchFile : code;
 }
 
-std::optional<std::string> ItemPath(CFStringRef text) {
-  if (text == nullptr) return std::nullopt;
-  COrbStringData fullPath;
-  fullPath.InitWithCFString(text);
-  return orb::ItemPath(fullPath);
-}
-
 /// The last component as it is stored; the root is its own.
 std::string_view NameOf(std::string_view path) {
   const std::size_t last = path.find_last_not_of('/');
@@ -53,7 +45,7 @@ std::string_view NameOf(std::string_view path) {
 }
 
 /// A link that leads nowhere is an entry that can be read, and yet does not exist.
-bool Exists(const std::string& path, const Result<ItemInfo>& info) {
+bool Exists(const char* path, const Result<ItemInfo>& info) {
   if (info && info.Value().kind != ItemKind::kLink) return true;
   return Items::Current().Exists(path);
 }
@@ -82,11 +74,12 @@ unsigned int RecordedAttributes(const ItemRecord& item) {
 
 OrbResult SetTime(const COrbFileHandle& handle,
                   const COrbTime& time,
-                  Status (Items::*set)(const std::string&, Timestamp) const) {
+                  Status (Items::*set)(PathText, Timestamp) const) {
   if (handle.IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> path = orb::ItemPath(handle.GetFullPath());
-  if (!path) return kOrbErrNoSuchFile;
-  const Status status = (Items::Current().*set)(*path, orb::TimestampOf(time.GetUTCTime()));
+  const COrbStringData fullPath = handle.GetFullPath();
+  const char* path = orb::ItemPathInPlace(fullPath);
+  if (path == nullptr) return kOrbErrNoSuchFile;
+  const Status status = (Items::Current().*set)(path, orb::TimestampOf(time.GetUTCTime()));
   return status ? kOrbNoErr : FailureCode(status.Reason());
 }
 
@@ -147,16 +140,18 @@ OrbResult COrbFileHandle::Update() {
 
 OrbResult COrbFileHandle::CollectFileInformatioin() const {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(path);
-  if (!itemPath) return kOrbErrNoSuchFile;
-  const Pass pass{*itemPath, Items::Current().Read(*itemPath)};
-  return Exists(*itemPath, pass.answer) ? Keep(pass) : kOrbErrNoSuchFile;
+  const char* itemPath = orb::ItemPathInPlace(path);
+  if (itemPath == nullptr) return kOrbErrNoSuchFile;
+  const Pass pass{itemPath, Items::Current().Read(itemPath)};
+  return Exists(itemPath, pass.answer) ? Keep(pass) : kOrbErrNoSuchFile;
 }
 
 OrbResult COrbFileHandle::SetCatalogInfo(CFStringRef fullPath) const {
-  const std::optional<std::string> itemPath = ItemPath(fullPath);
-  if (!itemPath) return Keep({{}, orb::platform::kNoSuchItem});
-  return Keep({*itemPath, Items::Current().Read(*itemPath)});
+  COrbStringData text;
+  text.InitWithCFString(fullPath);
+  const char* itemPath = orb::ItemPathInPlace(text);
+  if (itemPath == nullptr) return Keep({{}, orb::platform::kNoSuchItem});
+  return Keep({itemPath, Items::Current().Read(itemPath)});
 }
 
 /// A pass that fails half-way leaves what it has found up to there, and whether anything is
@@ -218,10 +213,10 @@ OrbResult COrbFileHandle::GetActualName(COrbStringData& name) const {
 
 OrbResult COrbFileHandle::SetAttribute(unsigned int flags) {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(path);
-  if (!itemPath) return kOrbErrNoSuchFile;
+  const char* itemPath = orb::ItemPathInPlace(path);
+  if (itemPath == nullptr) return kOrbErrNoSuchFile;
   const unsigned int locked = flags & kOrbFileAttrLocked;
-  const Status status = Items::Current().SetLocked(*itemPath, locked != 0);
+  const Status status = Items::Current().SetLocked(itemPath, locked != 0);
   if (!status) return FailureCode(status.Reason());
   attributes = (attributes & ~kOrbFileAttrLocked) | locked;
   return kOrbNoErr;
@@ -254,9 +249,9 @@ UTCDateTime COrbFileHandle::GetUpdateTime() const {
 
 OrbResult COrbFileHandle::GetAccessTime(COrbTime* time) const {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(path);
-  if (!itemPath) return kOrbErrNoSuchFile;
-  const Result<Timestamp> accessed = Items::Current().AccessTime(*itemPath);
+  const char* itemPath = orb::ItemPathInPlace(path);
+  if (itemPath == nullptr) return kOrbErrNoSuchFile;
+  const Result<Timestamp> accessed = Items::Current().AccessTime(itemPath);
   if (!accessed) return FailureCode(accessed.Reason());
   if (time == nullptr) return kOrbErrNotFound;
   *time = static_cast<unsigned long long>(orb::TicksOf(accessed.Value()));
@@ -274,9 +269,9 @@ OrbResult COrbFileHandle::SetUpdateTime(const COrbTime& time) {
 OrbResult COrbFileHandle::SetAccessTime(const COrbTime&) { return kOrbErrNotSupported; }
 
 unsigned int COrbFileHandle::GetAttribute(const COrbStringData& fullPath) {
-  const std::optional<std::string> path = orb::ItemPath(fullPath);
-  if (!path) return FailureCode(orb::platform::kNoSuchItem);
-  const Result<ItemRecord> item = Items::Current().ReadRecord(*path);
+  const char* path = orb::ItemPathInPlace(fullPath);
+  if (path == nullptr) return FailureCode(orb::platform::kNoSuchItem);
+  const Result<ItemRecord> item = Items::Current().ReadRecord(path);
   return item ? RecordedAttributes(item.Value()) : FailureCode(item.Reason());
 }
 

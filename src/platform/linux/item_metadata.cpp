@@ -253,7 +253,7 @@ Timestamp ModificationTime(const StatusRecord& status) { return FromKernel(statu
 Timestamp LastAccessTime(const StatusRecord& status) { return FromKernel(status.stx_atime); }
 
 Result<OwnAttributes> FindOwnAttributes(const ItemRef& item) {
-  std::array<char, 1024> names;
+  std::array<char, 256> names;
   const ssize_t size = item.ListAttributes(names.data(), names.size());
   if (size >= 0) return ScanNames({names.data(), static_cast<std::size_t>(size)});
   if (errno != ERANGE) return WithoutNames();
