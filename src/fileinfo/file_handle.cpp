@@ -11,9 +11,8 @@
 #include "fileops/error_mapping.h"
 #include "path/file_types.h"
 #include "platform/items.h"
-#include "platform/transcode.h"
-#include "platform/unicode.h"
 #include "strings/string_access.h"
+#include "strings/text_compare.h"
 
 namespace {
 
@@ -102,13 +101,6 @@ std::string_view WithoutOneSeparator(std::string_view path) {
   return path;
 }
 
-bool IsEqualWithoutCase(std::string_view a, std::string_view b) {
-  if (a == b) return true;
-  const auto unitsA = orb::platform::Utf16FromUtf8(a);
-  const auto unitsB = orb::platform::Utf16FromUtf8(b);
-  return unitsA && unitsB && orb::platform::CompareFolded(*unitsA, *unitsB) == 0;
-}
-
 }  // namespace
 
 /// What one pass found at a path.
@@ -145,7 +137,6 @@ void COrbFileHandle::Free() {
   COrbFilePath::Free();
   collected = false;
   actualName.Clear();
-  displayName.Clear();
 }
 
 bool COrbFileHandle::IsEmpty() const { return COrbFilePath::IsEmpty(); }
@@ -156,7 +147,7 @@ OrbResult COrbFileHandle::Update() {
 
 OrbResult COrbFileHandle::CollectFileInformatioin() const {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(GetFullPath());
+  const std::optional<std::string> itemPath = orb::ItemPath(path);
   if (!itemPath) return kOrbErrNoSuchFile;
   const Pass pass{*itemPath, Items::Current().Read(*itemPath)};
   return Exists(*itemPath, pass.answer) ? Keep(pass) : kOrbErrNoSuchFile;
@@ -182,7 +173,6 @@ OrbResult COrbFileHandle::Keep(const Pass& pass) const {
   modificationTime = orb::UtcOf(info.modified);
   creationTime = orb::UtcOf(info.created);
   actualName = StringAccess::FromUtf8(NameOf(pass.path));
-  displayName = actualName;
   const bool hasType = !isFolder && info.kind != ItemKind::kLink;
   fileType = hasType ? GetFileType(actualName) : eOrbFileType_Unknown;
   collected = true;
@@ -197,7 +187,6 @@ void COrbFileHandle::CopyCollected(const COrbFileHandle& other) {
   collected = other.collected;
   if (!collected) return;
   actualName = other.actualName;
-  displayName = other.displayName;
   attributes = other.attributes;
   fileType = other.fileType;
   fileSize = other.fileSize;
@@ -205,7 +194,7 @@ void COrbFileHandle::CopyCollected(const COrbFileHandle& other) {
   modificationTime = other.modificationTime;
 }
 
-bool COrbFileHandle::IsExist() const { return orb::ItemExists(GetFullPath()); }
+bool COrbFileHandle::IsExist() const { return orb::ItemExists(path); }
 
 unsigned int COrbFileHandle::GetAttribute() const {
   return EnsureCollected() == kOrbNoErr ? attributes : 0;
@@ -219,11 +208,7 @@ std::uint64_t COrbFileHandle::GetFileSize() const {
   return EnsureCollected() == kOrbNoErr ? fileSize : 0;
 }
 
-OrbResult COrbFileHandle::GetDisplayName(COrbStringData& name) const {
-  if (EnsureCollected() != kOrbNoErr) return kOrbErrNotFound;
-  name = displayName;
-  return kOrbNoErr;
-}
+OrbResult COrbFileHandle::GetDisplayName(COrbStringData& name) const { return GetActualName(name); }
 
 OrbResult COrbFileHandle::GetActualName(COrbStringData& name) const {
   if (EnsureCollected() != kOrbNoErr) return kOrbErrNotFound;
@@ -233,7 +218,7 @@ OrbResult COrbFileHandle::GetActualName(COrbStringData& name) const {
 
 OrbResult COrbFileHandle::SetAttribute(unsigned int flags) {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(GetFullPath());
+  const std::optional<std::string> itemPath = orb::ItemPath(path);
   if (!itemPath) return kOrbErrNoSuchFile;
   const unsigned int locked = flags & kOrbFileAttrLocked;
   const Status status = Items::Current().SetLocked(*itemPath, locked != 0);
@@ -243,12 +228,10 @@ OrbResult COrbFileHandle::SetAttribute(unsigned int flags) {
 }
 
 bool COrbFileHandle::IsEqual(const COrbFileHandle& other) const {
-  const COrbStringData ours = GetFullPath();
-  const COrbStringData theirs = other.GetFullPath();
-  const std::string_view a = StringAccess::Read(ours).Readable();
-  const std::string_view b = StringAccess::Read(theirs).Readable();
+  const std::string_view a = StringAccess::Read(path).Readable();
+  const std::string_view b = StringAccess::Read(other.path).Readable();
   if (a.empty() || b.empty()) return false;
-  return IsEqualWithoutCase(WithoutOneSeparator(a), WithoutOneSeparator(b));
+  return orb::CompareFolded({WithoutOneSeparator(a)}, {WithoutOneSeparator(b)}) == 0;
 }
 
 OrbResult COrbFileHandle::GetCreateTime(COrbTime* time) const {
@@ -271,7 +254,7 @@ UTCDateTime COrbFileHandle::GetUpdateTime() const {
 
 OrbResult COrbFileHandle::GetAccessTime(COrbTime* time) const {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(GetFullPath());
+  const std::optional<std::string> itemPath = orb::ItemPath(path);
   if (!itemPath) return kOrbErrNoSuchFile;
   const Result<Timestamp> accessed = Items::Current().AccessTime(*itemPath);
   if (!accessed) return FailureCode(accessed.Reason());
