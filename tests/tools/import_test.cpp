@@ -241,6 +241,7 @@ TEST_F(Import, LeavesNothingOfAPhotoForWhichThereIsNoRoom) {
   }));
   EXPECT_EQ(ended.exitCode, 1);
   EXPECT_NE(ended.err.find("kOrbErrDiskFull " + Card("big.jpg")), std::string::npos) << ended.err;
+  EXPECT_NE(ended.err.find("1/2 2024/2024-05-01/big.jpg failed"), std::string::npos) << ended.err;
   EXPECT_EQ(Tree(), (Files{{"2024/2024-05-01/small.jpg", "small"}}));
 }
 
