@@ -25,6 +25,18 @@ auto Retry(Call call) {
   return result;
 }
 
+/// Gives the host program its errno back.
+class ErrnoKeeper {
+ public:
+  ErrnoKeeper() : kept_(errno) {}
+  ~ErrnoKeeper() { errno = kept_; }
+  ErrnoKeeper(const ErrnoKeeper&) = delete;
+  ErrnoKeeper& operator=(const ErrnoKeeper&) = delete;
+
+ private:
+  int kept_;
+};
+
 /// Owns a descriptor and closes it once.
 class UniqueFd {
  public:

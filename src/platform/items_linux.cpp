@@ -1,0 +1,384 @@
+// SPDX-License-Identifier: MIT
+#include "platform/items.h"
+
+#include <fcntl.h>
+#include <sys/random.h>
+#include <sys/stat.h>
+#include <sys/statvfs.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <atomic>
+#include <string_view>
+#include <vector>
+
+#include "platform/linux/item_metadata.h"
+#include "platform/linux/posix.h"
+
+namespace orb::platform {
+
+namespace {
+
+constexpr std::string_view kPackageExtensions[] = {".app", ".bundle", ".plugin", ".photoslibrary"};
+constexpr char kPackageMark[] = "/Contents/Info.plist";
+constexpr mode_t kNewFile = 0666;
+constexpr mode_t kNewFolder = 0777;
+/// FAT keeps times in steps of two seconds.
+constexpr std::int64_t kCoarsestStep = 2;
+
+// --- Questions
+
+std::string_view WithoutTrailingSeparators(std::string_view path) {
+  const std::size_t last = path.find_last_not_of('/');
+  return path.substr(
+      0, last == std::string_view::npos ? std::min<std::size_t>(path.size(), 1) : last + 1);
+}
+
+std::string_view LastComponent(std::string_view path) {
+  path = WithoutTrailingSeparators(path);
+  return path.substr(path.rfind('/') + 1);
+}
+
+char AsciiLower(char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; }
+
+bool HasExtension(std::string_view name, std::string_view extension) {
+  if (name.size() <= extension.size()) return false;
+  return std::ranges::equal(name.substr(name.size() - extension.size()), extension, {}, AsciiLower);
+}
+
+bool Permits(const char* path, int access, int flags) {
+  return Retry([&] { return ::faccessat(AT_FDCWD, path, access, AT_EACCESS | flags); }) == 0;
+}
+
+bool IsPackage(const std::string& path) {
+  const std::string_view name = LastComponent(path);
+  for (const std::string_view extension : kPackageExtensions) {
+    if (HasExtension(name, extension)) return true;
+  }
+  return Permits((path + kPackageMark).c_str(), F_OK, 0);
+}
+
+std::vector<std::uint32_t> ReadGroups() {
+  std::vector<gid_t> groups;
+  int count = ::getgroups(0, nullptr);
+  while (count > 0) {
+    groups.resize(static_cast<std::size_t>(count));
+    if ((count = ::getgroups(count, groups.data())) >= 0) break;
+    count = ::getgroups(0, nullptr);  // The list has grown.
+  }
+  groups.resize(static_cast<std::size_t>(std::max(count, 0)));
+  groups.push_back(::getegid());
+  return {groups.begin(), groups.end()};
+}
+
+bool CallerMayWrite(const ItemRecord& item) {
+  static const std::vector<std::uint32_t> groups = ReadGroups();
+  return MayWrite(item, ::getuid(), groups);
+}
+
+void FillRecord(ItemRecord& record,
+                const ItemRef& item,
+                const StatusRecord& status,
+                const OwnAttributes& own) {
+  record.kind = KindOf(status);
+  record.locked = own.lock || HasLockFlag(status);
+  record.mode = status.stx_mode & 07777;
+  record.owner = status.stx_uid;
+  record.group = status.stx_gid;
+  const bool hasSize = record.kind == ItemKind::kFile || record.kind == ItemKind::kLink;
+  record.size = hasSize ? status.stx_size : 0;
+  record.modified = ModificationTime(status);
+  record.created = CreationTime(item, status, own);
+}
+
+/// One question that settles two: who may read and write the item can read it, and its volume is
+/// writable. Special files may be written on a read-only volume.
+bool IsReadableOnWritableVolume(const char* path, const ItemInfo& info) {
+  if (!info.mayWrite || info.locked || info.kind == ItemKind::kOther) return false;
+  return Permits(path, R_OK | W_OK, AT_SYMLINK_NOFOLLOW);
+}
+
+UniqueFd OpenItem(const char* path) {
+  return UniqueFd(Retry([&] { return ::open(path, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
+}
+
+int ReadVolume(const char* path, ItemKind kind, struct statfs* volume) {
+  if (kind != ItemKind::kLink) return ItemRef(path).Volume(volume);
+  const UniqueFd link = OpenItem(path);
+  return link ? ItemRef(link.Get()).Volume(volume) : -1;
+}
+
+void AskTheVolume(ItemInfo& info,
+                  const char* path,
+                  const StatusRecord& status,
+                  const OwnAttributes& own) {
+  struct statfs volume;
+  if (ReadVolume(path, info.kind, &volume) != 0) {
+    info.volumeReadOnly = LastError();
+    return;
+  }
+  info.volumeReadOnly = (volume.f_flags & ST_RDONLY) != 0;
+  info.locked |= MayShowReadOnlyAttribute(status) && HasReadOnlyAttribute(volume, status, own);
+}
+
+// --- Changes
+
+Status RefuseLocked(int item) {
+  const Result<bool> locked = IsLocked(item);
+  if (!locked) return locked.Reason();
+  return locked.Value() ? Status(kNotPermitted) : Status();
+}
+
+/// Opens an item for a change of what a lock protects.
+Result<UniqueFd> OpenUnlocked(const std::string& path) {
+  UniqueFd item = OpenItem(path.c_str());
+  if (!item) return LastError();
+  if (const Status refused = RefuseLocked(item.Get()); !refused) return refused.Reason();
+  return item;
+}
+
+Status WriteModificationTime(int item, Timestamp time) {
+  const struct timespec times[] = {{0, UTIME_OMIT}, {time.seconds, time.nanoseconds}};
+  const int result = Retry([&] { return ::utimensat(item, "", times, AT_EMPTY_PATH); });
+  return result == 0 ? Status() : Status(LastError());
+}
+
+bool IsNear(Timestamp a, Timestamp b) {
+  return a.seconds - b.seconds < kCoarsestStep && b.seconds - a.seconds < kCoarsestStep;
+}
+
+/// A folder that may get a new entry, and the entry's name in it.
+struct Place {
+  UniqueFd folder;
+  std::string name;
+};
+
+Result<Place> OpenPlace(const std::string& path) {
+  const std::size_t slash = path.rfind('/');
+  const std::string folder = slash == std::string::npos ? "." : path.substr(0, slash + 1);
+  UniqueFd opened(Retry([&] { return ::open(folder.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC); }));
+  if (!opened) return LastError();
+  if (const Status refused = RefuseLocked(opened.Get()); !refused) return refused.Reason();
+  Place place{std::move(opened), path.substr(slash + 1)};
+  if (place.name.empty()) return path.empty() ? kNoSuchItem : kInvalidName;
+  return place;
+}
+
+Status CreateFile(const UniqueFd& folder, const std::string& name) {
+  const int flags = O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC;
+  const UniqueFd file(Retry([&] { return ::openat(folder.Get(), name.c_str(), flags, kNewFile); }));
+  return file ? Status() : Status(LastError());
+}
+
+/// Hidden, and not to be guessed.
+std::string PrivateName() {
+  std::array<unsigned char, 8> random{};
+  // Names that collide cost one more try, no more: a failure needs no care.
+  (void)::getrandom(random.data(), random.size(), GRND_NONBLOCK);
+  std::string name = ".orb-";
+  for (const unsigned char byte : random) {
+    name += "0123456789abcdef"[byte >> 4];
+    name += "0123456789abcdef"[byte & 15];
+  }
+  return name;
+}
+
+Result<std::string> CreatePrivateFile(const UniqueFd& folder) {
+  constexpr int kTries = 100;
+  for (int i = 0; i < kTries; ++i) {
+    std::string name = PrivateName();
+    const Status created = CreateFile(folder, name);
+    if (created.Ok()) return name;
+    if (created.Reason() != kItemExists) return created.Reason();
+  }
+  return kItemExists;
+}
+
+Status RefuseToReplace(const Place& place) {
+  const int flags = O_PATH | O_NOFOLLOW | O_CLOEXEC;
+  const UniqueFd old(
+      Retry([&] { return ::openat(place.folder.Get(), place.name.c_str(), flags); }));
+  if (!old) return LastError();
+  const Result<StatusRecord> status = ReadStatus(old.Get());
+  if (!status) return status.Reason();
+  if (KindOf(status.Value()) == ItemKind::kFolder) return kItemExists;
+  return RefuseLocked(old.Get());
+}
+
+Status ReplaceByNewFile(const Place& place) {
+  const Result<std::string> created = CreatePrivateFile(place.folder);
+  if (!created) return created.Reason();
+  const int folder = place.folder.Get();
+  const char* temporary = created.Value().c_str();
+  if (::renameat(folder, temporary, folder, place.name.c_str()) == 0) return {};
+  const Error error = LastError();
+  ::unlinkat(folder, temporary, 0);
+  return error;
+}
+
+Status CreateFolder(const std::string& path) {
+  const Result<Place> place = OpenPlace(path);
+  if (!place) return place.Reason();
+  const Place& at = place.Value();
+  return ::mkdirat(at.folder.Get(), at.name.c_str(), kNewFolder) == 0 ? Status()
+                                                                      : Status(LastError());
+}
+
+/// Where the text of the folder above ends; 0 when there is none above.
+std::size_t ParentEnd(std::string_view path) {
+  const std::size_t slash = path.rfind('/');
+  if (slash == std::string_view::npos) return 0;
+  const std::size_t last = path.find_last_not_of('/', slash);
+  return last == std::string_view::npos ? 0 : last + 1;
+}
+
+std::size_t NextEnd(std::string_view path, std::size_t end) {
+  const std::size_t begin = path.find_first_not_of('/', end);
+  return std::min(path.find('/', begin), path.size());
+}
+
+bool IsFolder(const std::string& path) {
+  struct stat status;
+  return ::stat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode);
+}
+
+/// Creates the folders on the way to `path` that are missing, and then the last one.
+Status CreateWithParents(const std::string& path) {
+  std::size_t end = path.size();
+  Status made = CreateFolder(path);
+  while (!made && made.Reason() == kNoSuchItem && ParentEnd({path.data(), end}) > 0) {
+    end = ParentEnd({path.data(), end});
+    made = CreateFolder(path.substr(0, end));
+  }
+  while (end < path.size() && (made || made.Reason() == kItemExists)) {
+    end = NextEnd(path, end);
+    made = CreateFolder(path.substr(0, end));
+  }
+  return made;
+}
+
+class SystemItems final : public Items {
+ public:
+  bool Exists(const std::string& path) const override {
+    const ErrnoKeeper errnoKeeper;
+    return Permits(path.c_str(), F_OK, 0);
+  }
+
+  Result<ItemRecord> ReadRecord(const std::string& path) const override {
+    const ErrnoKeeper errnoKeeper;
+    const ItemRef item(path.c_str());
+    const Result<StatusRecord> status = ReadStatus(item);
+    if (!status) return status.Reason();
+    const Result<OwnAttributes> own = FindOwnAttributes(item);
+    if (!own) return own.Reason();
+    ItemInfo info;
+    FillRecord(info, item, status.Value(), own.Value());
+    if (MayShowReadOnlyAttribute(status.Value())) {
+      AskTheVolume(info, path.c_str(), status.Value(), own.Value());
+    }
+    return ItemRecord(info);
+  }
+
+  Result<ItemInfo> Read(const std::string& path) const override {
+    const ErrnoKeeper errnoKeeper;
+    const ItemRef item(path.c_str());
+    const Result<StatusRecord> status = ReadStatus(item);
+    if (!status) return status.Reason();
+    const Result<OwnAttributes> own = FindOwnAttributes(item);
+    if (!own) return own.Reason();
+    ItemInfo info;
+    FillRecord(info, item, status.Value(), own.Value());
+    info.mayWrite = CallerMayWrite(info);
+    info.readable = IsReadableOnWritableVolume(path.c_str(), info);
+    if (!info.readable) {
+      info.readable = Permits(path.c_str(), R_OK, AT_SYMLINK_NOFOLLOW);
+      AskTheVolume(info, path.c_str(), status.Value(), own.Value());
+    }
+    info.isPackage = info.kind == ItemKind::kFolder && IsPackage(path);
+    return info;
+  }
+
+  Result<Timestamp> AccessTime(const std::string& path) const override {
+    const ErrnoKeeper errnoKeeper;
+    const Result<StatusRecord> status = ReadStatus(ItemRef(path.c_str()));
+    if (!status) return status.Reason();
+    return LastAccessTime(status.Value());
+  }
+
+  Status SetLocked(const std::string& path, bool locked) const override {
+    const ErrnoKeeper errnoKeeper;
+    const UniqueFd item = OpenItem(path.c_str());
+    if (!item) return LastError();
+    return platform::SetLocked(item.Get(), locked);
+  }
+
+  Status SetModified(const std::string& path, Timestamp time) const override {
+    const ErrnoKeeper errnoKeeper;
+    const Result<UniqueFd> item = OpenUnlocked(path);
+    if (!item) return item.Reason();
+    const int fd = item.Value().Get();
+    const Result<StatusRecord> before = ReadStatus(fd);
+    if (!before) return before.Reason();
+    if (const Status written = WriteModificationTime(fd, time); !written) return written;
+    const Result<StatusRecord> after = ReadStatus(fd);
+    if (after && IsNear(ModificationTime(after.Value()), time)) return {};
+    // The kernel takes what the volume cannot hold for the nearest that it can.
+    (void)WriteModificationTime(fd, ModificationTime(before.Value()));
+    return kNotPermitted;
+  }
+
+  Status SetCreated(const std::string& path, Timestamp time) const override {
+    const ErrnoKeeper errnoKeeper;
+    const Result<UniqueFd> item = OpenUnlocked(path);
+    if (!item) return item.Reason();
+    return StoreCreationTime(item.Value().Get(), time);
+  }
+
+  Status ReplaceByEmptyFile(const std::string& path) const override {
+    const ErrnoKeeper errnoKeeper;
+    const Result<Place> place = OpenPlace(path);
+    if (!place) return place.Reason();
+    const Status created = CreateFile(place.Value().folder, place.Value().name);
+    if (created || created.Reason() != kItemExists) return created;
+    const Status refused = RefuseToReplace(place.Value());
+    return refused ? ReplaceByNewFile(place.Value()) : refused;
+  }
+
+  Status CreateEmptyFile(const std::string& path) const override {
+    const ErrnoKeeper errnoKeeper;
+    const Result<Place> place = OpenPlace(path);
+    if (!place) return place.Reason();
+    return CreateFile(place.Value().folder, place.Value().name);
+  }
+
+  Status CreateFolders(const std::string& path, IfExists ifExists) const override {
+    const ErrnoKeeper errnoKeeper;
+    const Status made = CreateWithParents(std::string(WithoutTrailingSeparators(path)));
+    if (made || made.Reason() != kItemExists || ifExists == IfExists::kFail) return made;
+    return IsFolder(path) ? Status() : made;
+  }
+};
+
+const SystemItems systemItems;
+constinit std::atomic<const Items*> currentItems = nullptr;
+
+}  // namespace
+
+bool MayWrite(const ItemRecord& item, std::uint32_t user, std::span<const std::uint32_t> groups) {
+  if (item.owner == user) return (item.mode & S_IWUSR) != 0;
+  if (std::ranges::find(groups, item.group) != groups.end()) return (item.mode & S_IWGRP) != 0;
+  return (item.mode & S_IWOTH) != 0;
+}
+
+const Items& Items::Current() {
+  const Items* replacement = currentItems.load(std::memory_order_acquire);
+  return replacement != nullptr ? *replacement : systemItems;
+}
+
+ScopedItems::ScopedItems(const Items& replacement)
+    : previous_(currentItems.exchange(&replacement)) {}
+
+ScopedItems::~ScopedItems() { currentItems.store(previous_); }
+
+}  // namespace orb::platform

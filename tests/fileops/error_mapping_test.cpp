@@ -1,0 +1,61 @@
+// SPDX-License-Identifier: MIT
+#include "fileops/error_mapping.h"
+
+#include <gtest/gtest.h>
+
+namespace orb {
+namespace {
+
+using platform::Error;
+using enum platform::ErrorDomain;
+
+TEST(MapError, ReadsTheTablesByDomainAndCode) {
+  const struct {
+    Error error;
+    OrbResult general;
+    OrbResult fileOperation;
+  } kCases[] = {
+      // The Cocoa codes are where the two differ.
+      {{kCocoa, 4}, kOrbErrNotFound, kOrbErrUnknown},
+      {{kCocoa, 257}, kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {{kCocoa, 260}, kOrbErrNotFound, kOrbErrNotFound},
+      {{kCocoa, 513}, kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {{kCocoa, 514}, kOrbErrInvalidName, kOrbErrUnknown},
+      {{kCocoa, 516}, kOrbErrFileExists, kOrbErrUnknown},
+      {{kCocoa, 640}, kOrbErrDiskFull, kOrbErrDiskFull},
+      {{kCocoa, 642}, kOrbErrAccessDenied, kOrbErrUnknown},
+      {{kCocoa, 28}, kOrbErrUnknown, kOrbErrUnknown},
+      {{kOSStatus, -34}, kOrbErrDiskFull, kOrbErrDiskFull},
+      {{kOSStatus, -33}, kOrbErrDiskFull, kOrbErrDiskFull},
+      {{kOSStatus, -46}, kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {{kOSStatus, -61}, kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {{kOSStatus, -5000}, kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {{kOSStatus, -35}, kOrbErrNotFound, kOrbErrNotFound},
+      {{kOSStatus, -1301}, kOrbErrAlreadyExists, kOrbErrAlreadyExists},
+      {{kOSStatus, -43}, kOrbErrUnknown, kOrbErrUnknown},
+      {{kUrl, -1000}, kOrbErrNotFound, kOrbErrNotFound},
+      {{kUrl, -1100}, kOrbErrNotFound, kOrbErrNotFound},
+      {{kUrl, -1102}, kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {{kMach, 2}, kOrbErrUnknown, kOrbErrUnknown},
+      {{kPosix, 1}, kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {{kPosix, 2}, kOrbErrNotFound, kOrbErrNotFound},
+      {{kPosix, 3}, kOrbErrUnknown, kOrbErrUnknown},
+      {{kPosix, 12}, kOrbErrOutOfMemory, kOrbErrOutOfMemory},
+      {{kPosix, 13}, kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {{kPosix, 17}, kOrbErrAlreadyExists, kOrbErrAlreadyExists},
+      {{kPosix, 27}, kOrbErrDiskFull, kOrbErrDiskFull},
+      {{kPosix, 28}, kOrbErrDiskFull, kOrbErrDiskFull},
+      {{kPosix, 30}, kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {platform::kBusy, kOrbNoErr, kOrbNoErr},  // There is no error object.
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.error.code);
+    EXPECT_EQ(OrbMapError(c.error), c.general);
+    EXPECT_EQ(OrbMapErrorForFileOperation(c.error), c.fileOperation);
+  }
+  EXPECT_EQ(OrbMapError({}), kOrbNoErr);
+  EXPECT_EQ(OrbMapErrorForFileOperation({}), kOrbNoErr);
+}
+
+}  // namespace
+}  // namespace orb

@@ -1,0 +1,354 @@
+// SPDX-License-Identifier: MIT
+#include "platform/items.h"
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <sys/xattr.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdlib>
+#include <filesystem>
+#include <string>
+
+#include "platform/linux/item_metadata.h"
+#include "platform/linux/posix.h"
+#include "support/faults.h"
+#include "support/temp_folder.h"
+
+namespace orb::platform {
+namespace {
+
+namespace fs = std::filesystem;
+using test::TempFolder;
+
+constexpr uid_t kStranger = 65534;
+constexpr gid_t kNobodysGroup = 54321;
+
+const Items& Subject() { return Items::Current(); }
+
+Error ReasonOf(const Status& status) { return status.Ok() ? Error{} : status.Reason(); }
+
+bool Locked(const std::string& path) { return Subject().Read(path).Value().locked; }
+
+int ModeOf(const std::string& path) {
+  struct stat status {};
+  ::lstat(path.c_str(), &status);
+  return static_cast<int>(status.st_mode & 07777);
+}
+
+TEST(Read, TellsKindsAndSizesOfTheEntryItself) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "12345");
+  fs::create_directory(folder / "folder");
+  fs::create_symlink("file", folder / "link");
+  fs::create_symlink("nowhere", folder / "dangling");
+  ASSERT_EQ(::mkfifo((folder / "fifo").c_str(), 0600), 0);
+  const struct {
+    const char* name;
+    ItemKind kind;
+    std::uint64_t size;
+    bool exists;
+  } kCases[] = {
+      {"file", ItemKind::kFile, 5, true},
+      {"folder", ItemKind::kFolder, 0, true},
+      {"link", ItemKind::kLink, 4, true},
+      {"dangling", ItemKind::kLink, 7, false},
+      {"fifo", ItemKind::kOther, 0, true},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.name);
+    const auto info = Subject().Read(folder / c.name);
+    ASSERT_TRUE(info.Ok());
+    EXPECT_EQ(info.Value().kind, c.kind);
+    EXPECT_EQ(info.Value().size, c.size);
+    EXPECT_TRUE(info.Value().readable);
+    EXPECT_FALSE(info.Value().locked);
+    EXPECT_FALSE(info.Value().volumeReadOnly.Value());
+    EXPECT_EQ(Subject().Exists(folder / c.name), c.exists);
+  }
+}
+
+TEST(Read, TellsPackages) {
+  const TempFolder folder;
+  for (const char* name : {"a.app", "B.Bundle", "c.photoslibrary", "plain", ".app", "d.apps"}) {
+    fs::create_directory(folder / name);
+  }
+  fs::create_directories(folder / "marked/Contents");
+  folder.Write("marked/Contents/Info.plist", "");
+  folder.Write("file.app", "");
+  for (const char* name : {"a.app", "a.app/", "B.Bundle", "c.photoslibrary", "marked"}) {
+    EXPECT_TRUE(Subject().Read(folder / name).Value().isPackage) << name;
+  }
+  for (const char* name : {"plain", ".app", "d.apps", "file.app"}) {
+    EXPECT_FALSE(Subject().Read(folder / name).Value().isPackage) << name;
+  }
+}
+
+TEST(Read, KeepsTheHostsErrno) {
+  const TempFolder folder;
+  errno = 1234;
+  EXPECT_EQ(Subject().Read(folder / "missing").Reason(), kNoSuchItem);
+  EXPECT_EQ(errno, 1234);
+}
+
+TEST(Read, TellsAStrangerWhatItMayDo) {
+  const TempFolder folder;
+  fs::permissions(folder.Path(), fs::perms(0755));
+  for (const int mode : {0666, 0664, 0600}) {
+    const std::string file = folder.Write(std::to_string(mode), "");
+    fs::permissions(file, fs::perms(mode));
+    if (::chown(file.c_str(), 0, kNobodysGroup) != 0) GTEST_SKIP() << "needs root";
+  }
+  ORB_IN_CHILD(test::RunAsUser(kStranger, [&] {
+    const auto open = Subject().Read(folder / std::to_string(0666)).Value();
+    EXPECT_TRUE(open.readable && open.mayWrite);
+    const auto readable = Subject().Read(folder / std::to_string(0664)).Value();
+    EXPECT_TRUE(readable.readable && !readable.mayWrite);
+    const auto closed = Subject().Read(folder / std::to_string(0600)).Value();
+    EXPECT_FALSE(closed.readable || closed.mayWrite);
+    EXPECT_FALSE(closed.volumeReadOnly.Value());
+    EXPECT_EQ(ReasonOf(Subject().SetLocked(folder / std::to_string(0664), true)), kNotPermitted);
+    EXPECT_EQ(ReasonOf(Subject().SetModified(folder / std::to_string(0666), {1, 0})),
+              kNotPermitted);
+  }));
+}
+
+TEST(Read, TellsAReadOnlyVolume) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "");
+  fs::create_symlink("file", folder / "link");
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    ASSERT_TRUE(test::MakeReadOnlyVolume(folder.Path()));
+    for (const std::string& path : {file, folder / "link", folder.Path()}) {
+      SCOPED_TRACE(path);
+      EXPECT_TRUE(Subject().Read(path).Value().volumeReadOnly.Value());
+      EXPECT_TRUE(Subject().Read(path).Value().readable);
+    }
+    const Error readOnly{ErrorDomain::kPosix, EROFS};
+    EXPECT_EQ(ReasonOf(Subject().SetLocked(file, true)), readOnly);
+    EXPECT_EQ(ReasonOf(Subject().SetModified(file, {1, 0})), readOnly);
+    EXPECT_EQ(ReasonOf(Subject().ReplaceByEmptyFile(file)), readOnly);
+  }));
+}
+
+TEST(MayWrite, IsDecidedByTheFirstThatFits) {
+  const std::uint32_t groups[] = {20, 21};
+  const struct {
+    std::uint32_t owner, group;
+    std::uint16_t mode;
+    bool mayWrite;
+  } kCases[] = {
+      {1, 20, 0200, true},
+      {1, 20, 0577, false},  // The owner.
+      {2, 21, 0020, true},
+      {2, 21, 0757, false},  // A member of the group.
+      {2, 30, 0002, true},
+      {2, 30, 0775, false},  // Anybody else.
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.mode);
+    ItemRecord item;
+    item.owner = c.owner;
+    item.group = c.group;
+    item.mode = c.mode;
+    EXPECT_EQ(MayWrite(item, 1, groups), c.mayWrite);
+  }
+}
+
+TEST(SetLocked, LocksAndUnlocks) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "");
+  for (const bool locked : {true, true, false, false}) {
+    EXPECT_TRUE(Subject().SetLocked(file, locked).Ok());
+    EXPECT_EQ(Locked(file), locked);
+  }
+  EXPECT_EQ(ReasonOf(Subject().SetLocked(folder / "missing", true)), kNoSuchItem);
+  fs::create_symlink("file", folder / "link");
+  EXPECT_EQ(ReasonOf(Subject().SetLocked(folder / "link", true)), kNotPermitted);
+  EXPECT_FALSE(Locked(file));
+}
+
+TEST(SetLocked, NeedsNoWritePermissionOfTheOwner) {
+  const TempFolder folder;
+  fs::permissions(folder.Path(), fs::perms(0777));
+  ORB_IN_CHILD(test::RunAsUser(kStranger, [&] {
+    for (const int mode : {0444, 0000}) {
+      const std::string file = folder.Write(std::to_string(mode), "");
+      fs::permissions(file, fs::perms(mode));
+      EXPECT_TRUE(Subject().SetLocked(file, true).Ok());
+      EXPECT_TRUE(Locked(file));
+      EXPECT_EQ(ModeOf(file), mode);
+      EXPECT_TRUE(Subject().SetLocked(file, false).Ok());
+      EXPECT_FALSE(Locked(file));
+      EXPECT_TRUE(Subject().SetCreated(file, {1, 0}).Ok());
+      EXPECT_EQ(ModeOf(file), mode);
+    }
+  }));
+}
+
+TEST(SetLocked, ClearsTheImmutableFlagWhereItMay) {
+  const TempFolder folder;
+  fs::permissions(folder.Path(), fs::perms(0755));
+  const std::string file = folder.Write("file", "");
+  for (const char* flag : {"i", "a"}) {
+    ASSERT_TRUE(Subject().SetLocked(file, true).Ok());
+    if (std::system(("chattr +" + std::string(flag) + " " + file + " 2>/dev/null").c_str()) != 0) {
+      GTEST_SKIP() << "no such flags here";
+    }
+    const auto unlockAsStranger = [&] {
+      EXPECT_TRUE(Locked(file));
+      EXPECT_EQ(ReasonOf(Subject().SetLocked(file, false)), kNotPermitted);
+    };
+    EXPECT_NE(test::RunAsUser(kStranger, unlockAsStranger), test::ChildOutcome::kFailed);
+    EXPECT_EQ(ReasonOf(Subject().ReplaceByEmptyFile(file)), kNotPermitted);
+    EXPECT_TRUE(Subject().SetLocked(file, false).Ok());
+    EXPECT_FALSE(Locked(file));
+  }
+}
+
+TEST(SetModified, KeepsNanosecondsAndRefusesLockedItems) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "");
+  const Timestamp time{1588334400, 123456789};
+  ASSERT_TRUE(Subject().SetModified(file, time).Ok());
+  EXPECT_EQ(Subject().Read(file).Value().modified, time);
+  ASSERT_TRUE(Subject().SetLocked(file, true).Ok());
+  EXPECT_EQ(ReasonOf(Subject().SetModified(file, {1, 0})), kNotPermitted);
+  EXPECT_EQ(ReasonOf(Subject().SetCreated(file, {1, 0})), kNotPermitted);
+  EXPECT_EQ(Subject().Read(file).Value().modified, time);
+}
+
+TEST(SetModified, ChangesTheLinkAndNotWhatItLeadsTo) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "");
+  fs::create_symlink("file", folder / "link");
+  ASSERT_TRUE(Subject().SetModified(folder / "link", {5, 0}).Ok());
+  EXPECT_EQ(Subject().Read(folder / "link").Value().modified, (Timestamp{5, 0}));
+  EXPECT_GT(Subject().Read(file).Value().modified.seconds, 5);
+}
+
+TEST(SetModified, RefusesATimeThatTheVolumeCannotHold) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "");
+  const Timestamp before = Subject().Read(file).Value().modified;
+  const Timestamp beyondEverything{1LL << 47, 0};
+  const Status status = Subject().SetModified(file, beyondEverything);
+  if (status.Ok()) GTEST_SKIP() << "this volume holds every time";
+  EXPECT_EQ(status.Reason(), kNotPermitted);
+  EXPECT_EQ(Subject().Read(file).Value().modified, before);
+}
+
+TEST(SetCreated, IsReadBackUnlessTheAttributeIsGarbage) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "");
+  const Timestamp born = Subject().Read(file).Value().created;
+  const Timestamp time{-86400, 999999999};
+  ASSERT_TRUE(Subject().SetCreated(file, time).Ok());
+  EXPECT_EQ(Subject().Read(file).Value().created, time);
+  for (const std::string value : {"",
+                                  "x",
+                                  "12",
+                                  "12 ",
+                                  "12 1000000000",
+                                  "12 3x",
+                                  "1 -1",
+                                  "9e9 0",
+                                  "99999999999999999999 0",
+                                  "+1 0",
+                                  " 1 0"}) {
+    SCOPED_TRACE(value);
+    ASSERT_EQ(::setxattr(file.c_str(), kCreatedAttribute, value.data(), value.size(), 0), 0);
+    EXPECT_EQ(Subject().Read(file).Value().created, born);
+  }
+}
+
+TEST(FindOwnAttributes, SeesThemAmongManyOthers) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "");
+  ASSERT_TRUE(Subject().SetLocked(file, true).Ok());
+  for (int i = 0; i < 30; ++i) {
+    const std::string name = "user." + std::string(60, 'n') + std::to_string(i);
+    if (::setxattr(file.c_str(), name.c_str(), "", 0, 0) != 0) break;
+  }
+  ASSERT_GT(::listxattr(file.c_str(), nullptr, 0), 1024);
+  EXPECT_TRUE(Locked(file));
+  const UniqueFd byDescriptor(::open(file.c_str(), O_PATH));
+  EXPECT_TRUE(IsLocked(byDescriptor.Get()).Value());
+}
+
+TEST(HasReadOnlyAttribute, IsAMatterOfTheVolumesType) {
+  const struct {
+    long type;
+    unsigned deviceMajor;
+    bool attributes, expected;
+  } kCases[] = {
+      {0x4d44, 8, false, true},       // FAT.
+      {0x2011bab0, 8, false, true},   // exFAT.
+      {0x65735546, 8, false, true},   // A disk behind FUSE.
+      {0x65735546, 8, true, false},   // NTFS there.
+      {0x65735546, 0, false, false},  // A remote folder behind FUSE.
+      {0xef53, 8, true, false},       // ext4.
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.type);
+    struct statfs volume {};
+    volume.f_type = c.type;
+    StatusRecord status{};
+    status.stx_dev_major = c.deviceMajor;
+    EXPECT_EQ(HasReadOnlyAttribute(volume, status, {.supported = c.attributes}), c.expected);
+  }
+}
+
+TEST(ReplaceByEmptyFile, PutsANewFileInPlace) {
+  const TempFolder folder;
+  const std::string kept = folder.Write("kept", "content");
+  fs::create_hard_link(kept, folder / "name");
+  fs::create_symlink("kept", folder / "link");
+  fs::create_directory(folder / "folder");
+  const std::string longest = folder / std::string(255, 'n');
+  for (const std::string& path : {folder / "name", folder / "link", folder / "new", longest}) {
+    for (int time = 0; time < 2; ++time) EXPECT_TRUE(Subject().ReplaceByEmptyFile(path).Ok());
+    EXPECT_EQ(Subject().Read(path).Value().kind, ItemKind::kFile);
+    EXPECT_EQ(Subject().Read(path).Value().size, 0U);
+  }
+  EXPECT_EQ(test::ReadAll(kept), "content");
+  EXPECT_EQ(ReasonOf(Subject().ReplaceByEmptyFile(folder / "folder")), kItemExists);
+  EXPECT_EQ(ReasonOf(Subject().ReplaceByEmptyFile(folder / "folder/")), kInvalidName);
+  EXPECT_EQ(ReasonOf(Subject().ReplaceByEmptyFile("")), kNoSuchItem);
+  ASSERT_TRUE(Subject().SetLocked(kept, true).Ok());
+  EXPECT_EQ(ReasonOf(Subject().ReplaceByEmptyFile(kept)), kNotPermitted);
+  EXPECT_EQ(test::ReadAll(kept), "content");
+  EXPECT_EQ(std::distance(fs::directory_iterator(folder.Path()), {}), 6);  // Nothing is left over.
+}
+
+TEST(CreateEmptyFile, TakesOnlyAFreeNameInAnUnlockedFolder) {
+  const TempFolder folder;
+  fs::create_symlink("nowhere", folder / "dangling");
+  EXPECT_TRUE(Subject().CreateEmptyFile(folder / "new").Ok());
+  EXPECT_EQ(ReasonOf(Subject().CreateEmptyFile(folder / "new")), kItemExists);
+  EXPECT_EQ(ReasonOf(Subject().CreateEmptyFile(folder / "dangling")), kItemExists);
+  EXPECT_EQ(ReasonOf(Subject().CreateEmptyFile(folder / "no/new")), kNoSuchItem);
+  EXPECT_EQ(ReasonOf(Subject().CreateEmptyFile(folder / std::string(256, 'n'))), kInvalidName);
+  ASSERT_TRUE(Subject().SetLocked(folder.Path(), true).Ok());
+  EXPECT_EQ(ReasonOf(Subject().CreateEmptyFile(folder / "other")), kNotPermitted);
+  EXPECT_EQ(ReasonOf(Subject().ReplaceByEmptyFile(folder / "new")), kNotPermitted);
+  EXPECT_EQ(ReasonOf(Subject().CreateFolders(folder / "a/b", IfExists::kFail)), kNotPermitted);
+  EXPECT_FALSE(Subject().Exists(folder / "other") || Subject().Exists(folder / "a"));
+}
+
+TEST(CreateFolders, MakesWhatIsMissing) {
+  const TempFolder folder;
+  folder.Write("file", "");
+  EXPECT_TRUE(Subject().CreateFolders(folder / "a//b/../c/d/", IfExists::kFail).Ok());
+  EXPECT_TRUE(fs::is_directory(folder / "a/b") && fs::is_directory(folder / "a/c/d"));
+  EXPECT_EQ(ReasonOf(Subject().CreateFolders(folder / "a", IfExists::kFail)), kItemExists);
+  EXPECT_TRUE(Subject().CreateFolders(folder / "a", IfExists::kAccept).Ok());
+  EXPECT_EQ(ReasonOf(Subject().CreateFolders(folder / "file", IfExists::kAccept)), kItemExists);
+  EXPECT_FALSE(Subject().CreateFolders(folder / "file/a/b", IfExists::kAccept).Ok());
+  EXPECT_FALSE(Subject().CreateFolders("", IfExists::kAccept).Ok());
+}
+
+}  // namespace
+}  // namespace orb::platform
