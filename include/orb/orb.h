@@ -5,6 +5,7 @@
 /// The whole public interface.
 
 #include <orb/export.h>
+#include <orb/fileinfo/drive_type.h>
 #include <orb/fileinfo/file_handle.h>
 #include <orb/fileops/copy.h>
 #include <orb/fileops/create.h>

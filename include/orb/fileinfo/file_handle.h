@@ -79,6 +79,12 @@ class ORB_EXPORT COrbFileHandle : public COrbFilePath {
   /// Whether both paths are the same text without regard to case and to a trailing "/".
   bool IsEqual(const COrbFileHandle& other) const;
 
+  /// One of the eOrbDriveType values, found out once for each volume and then kept as long as the
+  /// process runs. eOrbDriveType_Fixed also where nothing exists, which is not kept. Nothing is
+  /// collected. May be called from several threads at once on different handles; never waits for a
+  /// network volume, of which nobody asks whether the item is there.
+  unsigned int GetDriveType() const;
+
   /// Times with a resolution of 1/65536 s. kOrbErrNoSuchFile when they cannot be collected; the
   /// output is then untouched.
   OrbResult GetCreateTime(COrbTime* time) const;
