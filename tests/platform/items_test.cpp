@@ -247,17 +247,17 @@ TEST(SetCreated, IsReadBackUnlessTheAttributeIsGarbage) {
   const Timestamp time{-86400, 999999999};
   ASSERT_TRUE(Subject().SetCreated(file, time).Ok());
   EXPECT_EQ(Subject().Read(file).Value().created, time);
-  for (const std::string value : {"",
-                                  "x",
-                                  "12",
-                                  "12 ",
-                                  "12 1000000000",
-                                  "12 3x",
-                                  "1 -1",
-                                  "9e9 0",
-                                  "99999999999999999999 0",
-                                  "+1 0",
-                                  " 1 0"}) {
+  for (const std::string& value : std::initializer_list<std::string>{"",
+                                                                     "x",
+                                                                     "12",
+                                                                     "12 ",
+                                                                     "12 1000000000",
+                                                                     "12 3x",
+                                                                     "1 -1",
+                                                                     "9e9 0",
+                                                                     "99999999999999999999 0",
+                                                                     "+1 0",
+                                                                     " 1 0"}) {
     SCOPED_TRACE(value);
     ASSERT_EQ(::setxattr(file.c_str(), kCreatedAttribute, value.data(), value.size(), 0), 0);
     EXPECT_EQ(Subject().Read(file).Value().created, born);

@@ -110,7 +110,10 @@ class ORB_EXPORT COrbFileHandle : public COrbFilePath {
   static eOrbFileType GetFileType(const COrbStringData& name);
 
  private:
+  struct Pass;
+
   OrbResult EnsureCollected() const;
+  OrbResult Keep(const Pass& pass) const;
   void CopyCollected(const COrbFileHandle& other);
 
   mutable COrbStringData actualName;

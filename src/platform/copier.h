@@ -1,0 +1,20 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <string>
+
+#include "platform/error.h"
+
+namespace orb::platform {
+
+/// Copies a file, a link (as a link) or a folder with all it holds, with mode, times, attributes,
+/// access control lists, creation time and lock; the owner is the copier. Holes stay holes. Hard
+/// links inside a folder become files of their own.
+///
+/// kItemExists when anything is at the destination, also a link that leads nowhere. kNotPermitted
+/// for sockets, pipes and devices, also inside a folder, and for a locked destination folder. A
+/// destination inside the source is refused. A copied file is complete or absent, also when the
+/// process is killed; what the copy of a folder finished before a failure stays.
+Status CopyItem(const std::string& source, const std::string& destination);
+
+}  // namespace orb::platform

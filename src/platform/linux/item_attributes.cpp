@@ -1,0 +1,141 @@
+// SPDX-License-Identifier: MIT
+#include "platform/linux/item_attributes.h"
+
+#include <fcntl.h>
+#include <sys/xattr.h>
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "platform/linux/item_metadata.h"
+#include "platform/linux/posix.h"
+
+namespace orb::platform {
+namespace {
+
+constexpr std::size_t kMaxAttribute =
+    64 * 1024;                 // The kernel's own limit of a list and of a value.
+constexpr int kSizeTries = 4;  // While somebody changes it under us.
+
+bool IsUserAttribute(std::string_view name) {
+  if (name == kLockAttribute || name == kCreatedAttribute) return false;  // Carried by meaning.
+  return name.starts_with("user.");
+}
+
+bool IsAccessList(std::string_view name) {
+  return name == "system.posix_acl_access" || name == "system.posix_acl_default";
+}
+
+/// What the destination cannot carry, and what a source does not let us see.
+bool IsRefusal(int number) {
+  switch (number) {
+    case EOPNOTSUPP:
+    case EPERM:
+    case EACCES:
+    case ENOSPC:
+    case EDQUOT:
+    case E2BIG:
+    case ERANGE:
+    case ENODATA:
+    case EINVAL:  // An access control list that names users the volume does not know.
+      return true;
+    default:
+      return false;
+  }
+}
+
+Status UnlessRefused() { return IsRefusal(errno) ? Status() : Status(LastError()); }
+
+/// Calls `read(buffer, size)` with a buffer of the size that it tells. Nothing for a refusal and
+/// for more than an attribute can hold.
+template <typename Read>
+Result<std::optional<std::string>> ReadSized(Read read) {
+  std::string value;
+  for (int i = 0; i < kSizeTries; ++i) {
+    const ssize_t size = read(nullptr, 0);
+    if (size < 0) break;
+    if (static_cast<std::size_t>(size) > kMaxAttribute) return std::optional<std::string>();
+    value.resize(static_cast<std::size_t>(size));
+    const ssize_t count = size == 0 ? 0 : read(value.data(), value.size());
+    if (count >= 0) return std::optional(value.substr(0, static_cast<std::size_t>(count)));
+    if (errno != ERANGE) break;
+  }
+  if (IsRefusal(errno)) return std::optional<std::string>();
+  return LastError();
+}
+
+using Names = std::vector<std::string>;
+
+Result<Names> ListAttributes(int from) {
+  const auto list =
+      ReadSized([&](char* buffer, std::size_t size) { return ::flistxattr(from, buffer, size); });
+  if (!list) return list.Reason();
+  Names names;
+  if (!list.Value()) return names;
+  const std::string_view text = *list.Value();
+  for (std::size_t at = 0; at < text.size(); at += names.back().size() + 1)
+    names.emplace_back(text.substr(at, text.find('\0', at) - at));
+  return names;
+}
+
+Status CarryOne(int from, int to, const char* name) {
+  const auto value = ReadSized(
+      [&](char* buffer, std::size_t size) { return ::fgetxattr(from, name, buffer, size); });
+  if (!value) return value.Reason();
+  if (!value.Value()) return {};
+  const std::string& bytes = *value.Value();
+  if (::fsetxattr(to, name, bytes.data(), bytes.size(), 0) != 0) return UnlessRefused();
+  return {};
+}
+
+Status CarryThose(int from, int to, const Names& names, bool (*chosen)(std::string_view)) {
+  for (const std::string& name : names) {
+    if (!chosen(name)) continue;
+    if (Status carried = CarryOne(from, to, name.c_str()); !carried) return carried;
+  }
+  return {};
+}
+
+/// Set-id bits lend the owner's rights: they go along only where the owner is the same.
+mode_t ModeFor(const struct stat& source, const struct stat& copy) {
+  mode_t mode = source.st_mode & 07777;
+  if (source.st_uid != copy.st_uid) mode &= ~mode_t{S_ISUID};
+  if (source.st_gid != copy.st_gid) mode &= ~mode_t{S_ISGID};
+  return mode;
+}
+
+/// Refused on FAT, network and user-space volumes, which is no failed copy.
+void CarryModeAndTimes(int to, const struct stat& source) {
+  struct stat copy;
+  if (::fstat(to, &copy) == 0) (void)::fchmod(to, ModeFor(source, copy));
+  const timespec times[2] = {source.st_atim, source.st_mtim};
+  (void)::futimens(to, times);
+}
+
+void CarryCreationTime(int from, int to) {
+  if (const auto created = CreationTime(from)) (void)StoreCreationTime(to, created.Value());
+}
+
+void CarryLock(int from, int to) {
+  const auto locked = IsLocked(from);
+  if (locked && locked.Value()) (void)SetLocked(to, true);
+}
+
+}  // namespace
+
+Status CarryAttributes(int from, int to, const struct stat& source) {
+  const auto names = ListAttributes(from);
+  if (!names) return names.Reason();
+  // An owner without write permission cannot set attributes any more: lists and mode come later.
+  CarryCreationTime(from, to);
+  for (const auto chosen : {IsUserAttribute, IsAccessList}) {
+    if (Status carried = CarryThose(from, to, names.Value(), chosen); !carried) return carried;
+  }
+  CarryModeAndTimes(to, source);
+  CarryLock(from, to);
+  return {};
+}
+
+}  // namespace orb::platform

@@ -1,0 +1,98 @@
+// SPDX-License-Identifier: MIT
+#include "platform/linux/new_file.h"
+
+#include <fcntl.h>
+#include <stdio.h>
+#include <sys/random.h>
+#include <sys/stat.h>
+
+#include <cstdint>
+#include <utility>
+
+namespace orb::platform {
+namespace {
+
+constexpr int kNameTries = 16;
+
+std::string RandomHiddenName() {
+  std::uint64_t random = 0;
+  if (::getrandom(&random, sizeof random, GRND_NONBLOCK) != sizeof random)
+    random = reinterpret_cast<std::uintptr_t>(&random) ^ static_cast<std::uint64_t>(::getpid());
+  char name[32];
+  std::snprintf(name, sizeof name, ".orb-%016llx", static_cast<unsigned long long>(random));
+  return name;
+}
+
+UniqueFd OpenNameless(int folder, mode_t mode) {
+  return UniqueFd(
+      Retry([&] { return ::openat(folder, ".", O_TMPFILE | O_RDWR | O_CLOEXEC, mode); }));
+}
+
+UniqueFd OpenExclusively(int folder, const std::string& name, mode_t mode) {
+  constexpr int kFlags = O_CREAT | O_EXCL | O_NOFOLLOW | O_RDWR | O_CLOEXEC;
+  return UniqueFd(Retry([&] { return ::openat(folder, name.c_str(), kFlags, mode); }));
+}
+
+/// By descriptor, which older kernels allow only to the privileged, else through /proc.
+bool LinkNameless(int file, int folder, const char* name) {
+  if (::linkat(file, "", folder, name, AT_EMPTY_PATH) == 0) return true;
+  if (errno == EEXIST) return false;
+  const std::string path = "/proc/self/fd/" + std::to_string(file);
+  return ::linkat(AT_FDCWD, path.c_str(), folder, name, AT_SYMLINK_FOLLOW) == 0;
+}
+
+bool IsFree(int folder, const char* name) {
+  struct stat ignored;
+  if (::fstatat(folder, name, &ignored, AT_SYMLINK_NOFOLLOW) != 0) return errno == ENOENT;
+  errno = EEXIST;
+  return false;
+}
+
+/// A file system that knows neither renaming without replacing nor links leaves the test before.
+bool RenameWithoutReplacing(int folder, const char* from, const char* to) {
+  if (::renameat2(folder, from, folder, to, RENAME_NOREPLACE) == 0) return true;
+  if (errno == EEXIST) return false;
+  if (::linkat(folder, from, folder, to, 0) == 0) {
+    ::unlinkat(folder, from, 0);
+    return true;
+  }
+  if (errno == EEXIST) return false;
+  return IsFree(folder, to) && ::renameat(folder, from, folder, to) == 0;
+}
+
+}  // namespace
+
+Status Flush(int file) {
+  UniqueFd second(::fcntl(file, F_DUPFD_CLOEXEC, 0));
+  return second && second.Close() ? Status() : Status(LastError());
+}
+
+Result<NewFile> NewFile::Create(int folder, mode_t mode) {
+  if (UniqueFd file = OpenNameless(folder, mode)) return NewFile(folder, std::move(file), {});
+  for (int i = 0; i < kNameTries; ++i) {
+    std::string name = RandomHiddenName();
+    if (UniqueFd file = OpenExclusively(folder, name, mode))
+      return NewFile(folder, std::move(file), std::move(name));
+    if (errno != EEXIST) break;
+  }
+  return LastError();
+}
+
+NewFile::NewFile(int folder, UniqueFd file, std::string hiddenName)
+    : folder_(folder), file_(std::move(file)), hiddenName_(std::move(hiddenName)) {}
+
+NewFile::~NewFile() {
+  if (file_ && !hiddenName_.empty()) ::unlinkat(folder_, hiddenName_.c_str(), 0);
+}
+
+Status NewFile::Publish(const char* name) {
+  if (Status flushed = Flush(file_.Get()); !flushed) return flushed;
+  const bool published = hiddenName_.empty()
+                             ? LinkNameless(file_.Get(), folder_, name)
+                             : RenameWithoutReplacing(folder_, hiddenName_.c_str(), name);
+  if (!published) return LastError();
+  hiddenName_.clear();
+  return {};
+}
+
+}  // namespace orb::platform

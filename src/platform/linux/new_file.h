@@ -1,0 +1,43 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <sys/types.h>
+
+#include <string>
+
+#include "platform/linux/posix.h"
+
+namespace orb::platform {
+
+/// What a network or user-space file system has kept back shows when a descriptor is closed. This
+/// lets it show while the file can still be dropped or taken back.
+Status Flush(int file);
+
+/// A file that is being written and that nobody sees before it is complete: it has no name where
+/// the file system can do that, so that it ends with the process, else a hidden one. Unless it is
+/// published it goes away with this object.
+class NewFile {
+ public:
+  /// In a folder that must stay open as long as this object lives.
+  static Result<NewFile> Create(int folder, mode_t mode);
+
+  NewFile(NewFile&& other) noexcept = default;
+  NewFile& operator=(NewFile&&) = delete;
+  NewFile(const NewFile&) = delete;
+  NewFile& operator=(const NewFile&) = delete;
+  ~NewFile();
+
+  int Descriptor() const { return file_.Get(); }
+  /// Gives it its name, once, and never in the place of another item: kItemExists. An error that
+  /// only closing shows is found before that.
+  Status Publish(const char* name);
+
+ private:
+  NewFile(int folder, UniqueFd file, std::string hiddenName);
+
+  int folder_;
+  UniqueFd file_;
+  std::string hiddenName_;  // Empty when it has none.
+};
+
+}  // namespace orb::platform

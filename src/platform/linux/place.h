@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <sys/stat.h>
+
+#include <string>
+
+#include "platform/linux/posix.h"
+
+namespace orb::platform {
+
+/// An item by the folder that holds it and its name there. What is done through the folder's
+/// descriptor cannot be led astray by somebody who swaps a folder on the path for a link.
+struct Place {
+  /// Opened with O_PATH; links on the way to it were followed, as every lookup does.
+  UniqueFd folder;
+  /// One component; "." for the root.
+  std::string name;
+  /// The path ended in "/": only a folder can be meant.
+  bool folderMeant = false;
+
+  /// "." and "..": they name a folder, but not by its entry.
+  bool NamesNoEntry() const { return name == "." || name == ".."; }
+};
+
+/// Finds the folder; whether the item exists is not asked. kNoSuchItem for the empty path.
+Result<Place> Locate(const std::string& path);
+
+/// The record of the item itself. kNoSuchItem where a folder was meant and something else is.
+Result<struct stat> ReadStatus(const Place& place);
+
+/// Which file or folder it is, for as long as somebody holds it open.
+struct Identity {
+  dev_t device = 0;
+  ino_t inode = 0;
+
+  bool operator==(const Identity&) const = default;
+};
+
+inline Identity IdentityOf(const struct stat& status) { return {status.st_dev, status.st_ino}; }
+Result<Identity> IdentityOf(int item);
+
+/// Opens the folder above one that is open, for reading, if it is still the expected one.
+Result<UniqueFd> OpenAbove(int folder, const Identity& expected);
+
+/// Whether an open folder is the one that is asked for or lies below it.
+Result<bool> IsInOrBelow(int folder, const Identity& sought);
+
+}  // namespace orb::platform

@@ -1,0 +1,175 @@
+// SPDX-License-Identifier: MIT
+#include "platform/removal.h"
+
+#include <fcntl.h>
+
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "platform/linux/folder_stream.h"
+#include "platform/linux/item_metadata.h"
+#include "platform/linux/place.h"
+
+namespace orb::platform {
+namespace {
+
+/// How many levels of a tree are held open at once.
+constexpr std::size_t kOpenLevels = 32;
+/// How often a folder that is found not empty after everything in it was removed is gone through
+/// again, before it counts as one that somebody else is filling.
+constexpr int kMaxPasses = 32;
+
+Status RefuseLocked(int item) {
+  const auto locked = IsLocked(item);
+  if (!locked) return locked.Reason();
+  return locked.Value() ? Status(kNotPermitted) : Status();
+}
+
+Status RefuseLockedEntry(int folder, const char* name) {
+  const UniqueFd item(
+      Retry([&] { return ::openat(folder, name, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
+  return item ? RefuseLocked(item.Get()) : Status(LastError());
+}
+
+enum class Outcome { kGone, kNotEmpty };
+
+Result<Outcome> RemoveFolderEntry(int folder, const char* name) {
+  if (::unlinkat(folder, name, AT_REMOVEDIR) == 0) return Outcome::kGone;
+  if (errno == ENOTEMPTY || errno == EEXIST) return Outcome::kNotEmpty;
+  return LastRemovalError();
+}
+
+/// Removes an entry that is no folder with content, whatever it may be by now.
+Result<Outcome> RemoveEntry(int folder, const char* name, unsigned char type) {
+  if (Status open = RefuseLockedEntry(folder, name); !open) return open.Reason();
+  if (type == DT_DIR) return RemoveFolderEntry(folder, name);
+  if (::unlinkat(folder, name, 0) == 0) return Outcome::kGone;
+  if (errno == EISDIR) return RemoveFolderEntry(folder, name);
+  return LastRemovalError();
+}
+
+/// A folder that is being emptied.
+struct Level {
+  std::string name;
+  Identity identity;
+  /// Nothing while it is one of those far above that are closed.
+  std::optional<FolderStream> entries;
+  int passes = 0;
+};
+
+/// Empties and removes a folder that was found not empty, in a loop of its own stack so that no
+/// depth is too deep. Levels far above the current one are closed meanwhile and found again through
+/// "..".
+class TreeRemover {
+ public:
+  explicit TreeRemover(int above) : above_(above) {}
+
+  Status Remove(const std::string& name) {
+    if (Status entered = Enter(above_, name.c_str()); !entered) return entered;
+    while (!levels_.empty()) {
+      if (Status done = Proceed(); !done) return done;
+    }
+    return {};
+  }
+
+ private:
+  Status Proceed() {
+    FolderStream& entries = *levels_.back().entries;
+    const auto entry = entries.Next();
+    if (!entry) return entry.Reason();
+    const char* name = entry.Value().name;
+    if (name == nullptr) return Leave();
+    const auto outcome = RemoveEntry(entries.Descriptor(), name, entry.Value().type);
+    if (!outcome) return outcome.Reason();
+    if (outcome.Value() == Outcome::kGone) return {};
+    return Enter(entries.Descriptor(), name);
+  }
+
+  Status Enter(int above, const char* name) {
+    constexpr int kFlags = O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
+    auto entries =
+        FolderStream::Open(UniqueFd(Retry([&] { return ::openat(above, name, kFlags); })));
+    if (!entries) return entries.Reason();
+    const auto identity = IdentityOf(entries.Value().Descriptor());
+    if (!identity) return identity.Reason();
+    levels_.push_back({name, identity.Value(), std::move(entries).Value(), 0});
+    if (levels_.size() > kOpenLevels) levels_[levels_.size() - 1 - kOpenLevels].entries.reset();
+    return {};
+  }
+
+  Status Leave() {
+    if (levels_.size() > 1) {
+      if (Status open = ReopenAbove(); !open) return open;
+    }
+    Level& level = levels_.back();
+    const auto outcome = RemoveFolderEntry(FolderAbove(), level.name.c_str());
+    if (!outcome) return outcome.Reason();
+    if (outcome.Value() == Outcome::kNotEmpty) return PassAgain(&level);
+    levels_.pop_back();
+    return {};
+  }
+
+  /// What a level removed already is not listed again, so it begins at the start.
+  Status ReopenAbove() {
+    Level& level = levels_[levels_.size() - 2];
+    if (level.entries) return {};
+    auto folder = OpenAbove(levels_.back().entries->Descriptor(), level.identity);
+    if (!folder) return folder.Reason();
+    auto entries = FolderStream::Open(std::move(folder).Value());
+    if (!entries) return entries.Reason();
+    level.entries = std::move(entries).Value();
+    return {};
+  }
+
+  int FolderAbove() const {
+    return levels_.size() > 1 ? levels_[levels_.size() - 2].entries->Descriptor() : above_;
+  }
+
+  /// Removing while listing hides entries on some file systems.
+  Status PassAgain(Level* level) {
+    if (++level->passes == kMaxPasses) return ErrorFromErrno(ENOTEMPTY);
+    level->entries->Restart();
+    return {};
+  }
+
+  int above_;
+  std::vector<Level> levels_;
+};
+
+Result<Place> LocateRemovable(const std::string& path) {
+  auto place = Locate(path);
+  if (!place) return place;
+  if (place.Value().NamesNoEntry()) return kNotPermitted;
+  const auto status = ReadStatus(place.Value());
+  if (!status) return status.Reason();
+  if (Status open = RefuseLocked(place.Value().folder.Get()); !open) return open.Reason();
+  return place;
+}
+
+}  // namespace
+
+Status RemoveItem(const std::string& path) {
+  const ErrnoKeeper errnoKeeper;
+  const auto place = LocateRemovable(path);
+  if (!place) return place.Reason();
+  const int folder = place.Value().folder.Get();
+  const std::string& name = place.Value().name;
+  const auto outcome = RemoveEntry(folder, name.c_str(), DT_UNKNOWN);
+  if (!outcome) return outcome.Reason();
+  return outcome.Value() == Outcome::kGone ? Status() : TreeRemover(folder).Remove(name);
+}
+
+Status UnlinkItem(const std::string& path) {
+  const ErrnoKeeper errnoKeeper;
+  const auto place = LocateRemovable(path);
+  if (!place) return place.Reason();
+  const int folder = place.Value().folder.Get();
+  const char* name = place.Value().name.c_str();
+  if (Status open = RefuseLockedEntry(folder, name); !open) return open;
+  if (::unlinkat(folder, name, 0) != 0) return LastRemovalError();
+  return {};
+}
+
+}  // namespace orb::platform

@@ -1,0 +1,133 @@
+// SPDX-License-Identifier: MIT
+#include "platform/streams.h"
+
+#include <fcntl.h>
+
+#include <optional>
+#include <utility>
+
+#include "platform/linux/file_data.h"
+#include "platform/linux/item_metadata.h"
+#include "platform/linux/new_file.h"
+#include "platform/linux/place.h"
+
+namespace orb::platform {
+namespace {
+
+constexpr mode_t kUsualMode = 0666;
+
+Status RefuseLocked(int item) {
+  const auto locked = IsLocked(item);
+  if (!locked) return locked.Reason();
+  return locked.Value() ? Status(kNotPermitted) : Status();
+}
+
+/// kNoSuchItem where nothing is.
+Result<UniqueFd> OpenExisting(const Place& place) {
+  constexpr int kFlags = O_WRONLY | O_APPEND | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
+  UniqueFd file(Retry([&] { return ::openat(place.folder.Get(), place.name.c_str(), kFlags); }));
+  if (file) return file;
+  const bool isLink = errno == ELOOP;
+  const bool isPipe = errno == ENXIO;
+  return isLink || isPipe ? kNotPermitted : LastError();
+}
+
+}  // namespace
+
+struct InputStream::State {
+  UniqueFd file;
+  Identity identity;
+};
+
+InputStream::InputStream(std::unique_ptr<State> state) : state_(std::move(state)) {}
+InputStream::InputStream(InputStream&&) noexcept = default;
+InputStream::~InputStream() = default;
+
+Result<InputStream> InputStream::Open(const std::string& path) {
+  const ErrnoKeeper errnoKeeper;
+  constexpr int kFlags = O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
+  UniqueFd file(Retry([&] { return ::open(path.c_str(), kFlags); }));
+  if (!file) return LastError();
+  struct stat status;
+  if (::fstat(file.Get(), &status) != 0) return LastError();
+  if (S_ISDIR(status.st_mode)) return ErrorFromErrno(EISDIR);
+  if (!S_ISREG(status.st_mode)) return kNotPermitted;
+  return InputStream(std::make_unique<State>(State{std::move(file), IdentityOf(status)}));
+}
+
+Result<std::size_t> InputStream::Read(std::span<std::byte> block) {
+  const ErrnoKeeper errnoKeeper;
+  return ReadBlock(state_->file.Get(), block);
+}
+
+/// Either a new file, or an older one and what it was.
+struct OutputStream::State {
+  Place place;
+  std::optional<NewFile> made;
+  UniqueFd existing;
+  struct stat before;
+
+  int Descriptor() const { return made ? made->Descriptor() : existing.Get(); }
+
+  Status Make() {
+    if (Status open = RefuseLocked(place.folder.Get()); !open) return open;
+    auto file = NewFile::Create(place.folder.Get(), kUsualMode);
+    if (!file) return file.Reason();
+    made.emplace(std::move(file).Value());
+    return {};
+  }
+
+  Status Take(UniqueFd file) {
+    if (::fstat(file.Get(), &before) != 0) return LastError();
+    if (!S_ISREG(before.st_mode)) return kNotPermitted;
+    if (Status open = RefuseLocked(file.Get()); !open) return open;
+    existing = std::move(file);
+    return {};
+  }
+
+  void TakeBack() const {
+    const timespec times[2] = {before.st_atim, before.st_mtim};
+    if (Retry([&] { return ::ftruncate(existing.Get(), before.st_size); }) == 0)
+      (void)::futimens(existing.Get(), times);
+  }
+
+  ~State() {
+    if (existing) TakeBack();
+  }
+};
+
+OutputStream::OutputStream(std::unique_ptr<State> state) : state_(std::move(state)) {}
+OutputStream::OutputStream(OutputStream&&) noexcept = default;
+OutputStream::~OutputStream() = default;
+
+Result<OutputStream> OutputStream::Append(const std::string& path) {
+  const ErrnoKeeper errnoKeeper;
+  auto place = Locate(path);
+  if (!place) return place.Reason();
+  auto state = std::make_unique<State>();
+  state->place = std::move(place).Value();
+  auto file = OpenExisting(state->place);
+  if (!file && file.Reason() != kNoSuchItem) return file.Reason();
+  if (Status open = file ? state->Take(std::move(file).Value()) : state->Make(); !open)
+    return open.Reason();
+  return OutputStream(std::move(state));
+}
+
+bool OutputStream::Writes(const InputStream& source) const {
+  return state_->existing && IdentityOf(state_->before) == source.state_->identity;
+}
+
+Status OutputStream::Write(std::span<const std::byte> block) {
+  const ErrnoKeeper errnoKeeper;
+  return WriteBlock(state_->Descriptor(), block);
+}
+
+Status OutputStream::Finish() {
+  const ErrnoKeeper errnoKeeper;
+  if (state_->made) return state_->made->Publish(state_->place.name.c_str());
+  if (Status flushed = Flush(state_->existing.Get()); !flushed) return flushed;
+  state_->existing.Reset();
+  return {};
+}
+
+}  // namespace orb::platform

@@ -1,0 +1,427 @@
+// SPDX-License-Identifier: MIT
+#include <gtest/gtest.h>
+#include <orb/fileinfo/file_handle.h>
+#include <sys/stat.h>
+
+#include <cerrno>
+#include <filesystem>
+#include <string>
+#include <tuple>
+
+#include "fileinfo/item_times.h"
+#include "platform/items.h"
+#include "support/faults.h"
+#include "support/forwarding_items.h"
+#include "support/temp_folder.h"
+#include "support/texts.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+using orb::platform::ItemInfo;
+using orb::platform::Items;
+using orb::platform::Result;
+using orb::platform::Timestamp;
+using orb::test::TempFolder;
+
+constexpr unsigned int kUsual =
+    kOrbFileAttrVolumeWritable | kOrbFileAttrReadable | kOrbFileAttrWritable;
+constexpr uid_t kStranger = 65534;
+constexpr gid_t kNobodysGroup = 54321;
+
+COrbFileHandle HandleOf(const std::string& path) {
+  COrbFileHandle handle;
+  const COrbStringData text = S(path);
+  handle.Initialize(&text);
+  return handle;
+}
+
+unsigned int AttributesOf(const std::string& path) { return HandleOf(path).GetAttribute(); }
+
+std::uint64_t Seconds(const UTCDateTime& time) {
+  return std::uint64_t{time.highSeconds} << 32 | time.lowSeconds;
+}
+
+/// Answers for the real item, with a change that a test makes.
+struct AlteredItems : orb::test::ForwardingItems {
+  Result<ItemInfo> Read(const std::string& path) const override {
+    if (failure) return *failure;
+    Result<ItemInfo> info = ForwardingItems::Read(path);
+    if (volumeFailure) info.Value().volumeReadOnly = *volumeFailure;
+    return info;
+  }
+  std::optional<orb::platform::Error> failure;
+  std::optional<orb::platform::Error> volumeFailure;
+};
+
+TEST(GetAttribute, TellsFilesFoldersAndPackages) {
+  const TempFolder folder;
+  folder.Write("a.jpg", "12345");
+  folder.Write("read-only.JPEG", "");
+  fs::permissions(folder / "read-only.JPEG", fs::perms(0444));
+  for (const char* name : {"x.jpg", "p.app", "q.mov"}) fs::create_directory(folder / name);
+  fs::create_directory(folder / "q.mov/Contents");
+  folder.Write("q.mov/Contents/Info.plist", "");
+  fs::create_symlink("a.jpg", folder / "link.jpg");
+  const struct {
+    const char* name;
+    unsigned int attributes;
+    eOrbFileType type;
+    std::uint64_t size;
+  } kCases[] = {
+      {"a.jpg", kUsual, eOrbFileType_Jpeg, 5},
+      {"read-only.JPEG", 0x0C, eOrbFileType_Jpeg, 0},
+      {"x.jpg", kUsual | kOrbFileAttrFolder, eOrbFileType_Unknown, 0},
+      {"x.jpg/", kUsual | kOrbFileAttrFolder, eOrbFileType_Unknown, 0},
+      {"p.app", kUsual, eOrbFileType_Unknown, 0},
+      {"q.mov", kUsual, eOrbFileType_Mov, 0},  // A package is typed by its name like a file.
+      {"link.jpg", kUsual, eOrbFileType_Unknown, 5},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.name);
+    const COrbFileHandle handle = HandleOf(folder / c.name);
+    EXPECT_EQ(handle.GetAttribute(), c.attributes);
+    EXPECT_EQ(handle.GetFileType(), c.type);
+    EXPECT_EQ(handle.GetFileSize(), c.size);
+  }
+}
+
+TEST(GetAttribute, AsksForTheCallerAndTheVolume) {
+  const TempFolder folder;
+  fs::permissions(folder.Path(), fs::perms(0755));
+  for (const int mode : {0666, 0664}) {
+    const std::string file = folder.Write(std::to_string(mode), "");
+    fs::permissions(file, fs::perms(mode));
+    if (::chown(file.c_str(), 0, kNobodysGroup) != 0) GTEST_SKIP() << "needs root";
+  }
+  ORB_IN_CHILD(orb::test::RunAsUser(kStranger, [&] {
+    EXPECT_EQ(AttributesOf(folder / std::to_string(0666)), kUsual);
+    EXPECT_EQ(AttributesOf(folder / std::to_string(0664)), 0x0CU);
+  }));
+  ORB_IN_CHILD(orb::test::RunWithPrivateMounts([&] {
+    ASSERT_TRUE(orb::test::MakeReadOnlyVolume(folder.Path()));
+    EXPECT_EQ(AttributesOf(folder / std::to_string(0666)), kOrbFileAttrReadable);
+    EXPECT_EQ(AttributesOf(folder.Path()), kOrbFileAttrReadable | kOrbFileAttrFolder);
+    COrbFileHandle handle = HandleOf(folder / std::to_string(0666));
+    EXPECT_EQ(handle.SetUpdateTime(COrbTime(1ULL)), kOrbErrAccessDenied);
+  }));
+}
+
+TEST(GetAttribute, OfAPathReadsTheRecordAlone) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "");
+  fs::create_directory(folder / "p.app");
+  const struct {
+    int mode;
+    unsigned int attributes;
+  } kCases[] = {
+      {0644, kUsual},
+      {0444, kOrbFileAttrReadable},
+      {0040, kOrbFileAttrReadable},
+      {0004, 0},
+      {0020, 0},
+      {0200, kUsual & ~kOrbFileAttrReadable},
+  };
+  for (const auto& c : kCases) {
+    fs::permissions(file, fs::perms(c.mode));
+    EXPECT_EQ(COrbFileHandle::GetAttribute(S(file)), c.attributes) << c.mode;
+  }
+  EXPECT_EQ(COrbFileHandle::GetAttribute(S(folder / "p.app")), kUsual | kOrbFileAttrFolder);
+  EXPECT_EQ(HandleOf(file).SetAttribute(kOrbFileAttrLocked), kOrbNoErr);
+  EXPECT_EQ(COrbFileHandle::GetAttribute(S(file)), kOrbFileAttrLocked | kOrbFileAttrWritable);
+  for (const std::string& path : {folder / "missing", std::string(), folder / "\xFF"}) {
+    EXPECT_EQ(COrbFileHandle::GetAttribute(S(path)), kOrbErrNotFound);
+  }
+}
+
+TEST(Collect, GivesNeutralAnswersWhereNothingIs) {
+  const TempFolder folder;
+  folder.Write("\xFF", "");  // A name that is no UTF-8 is out of reach.
+  fs::create_symlink("nowhere", folder / "dangling");
+  for (const std::string& path : {std::string(),
+                                  folder / "no",
+                                  folder / "\xFF",
+                                  folder / "dangling",
+                                  folder / std::string(300, 'n')}) {
+    SCOPED_TRACE(path);
+    COrbFileHandle handle = HandleOf(path);
+    EXPECT_FALSE(handle.IsExist());
+    EXPECT_EQ(handle.CollectFileInformatioin(), kOrbErrNoSuchFile);
+    EXPECT_EQ(handle.Update(), kOrbErrNoSuchFile);
+    EXPECT_EQ(handle.GetAttribute(), 0U);
+    EXPECT_EQ(handle.GetFileType(), eOrbFileType_Unknown);
+    EXPECT_EQ(handle.GetFileSize(), 0U);
+    COrbStringData name = S("kept");
+    EXPECT_EQ(handle.GetDisplayName(name), kOrbErrNotFound);
+    EXPECT_EQ(handle.GetActualName(name), kOrbErrNotFound);
+    EXPECT_EQ(Text(name), "kept");
+    COrbTime time(7ULL);
+    EXPECT_EQ(handle.GetCreateTime(&time), kOrbErrNoSuchFile);
+    EXPECT_EQ(handle.GetUpdateTime(&time), kOrbErrNoSuchFile);
+    EXPECT_EQ(time.ticks, 7U);
+    EXPECT_EQ(Seconds(handle.GetUpdateTime()), 0U);
+  }
+}
+
+TEST(Collect, TakesTheNameFromTheEndOfThePath) {
+  const TempFolder folder;
+  fs::create_directory(folder / "\xC3\xA4%n");
+  for (const auto& [path, name] : {std::pair(folder / "\xC3\xA4%n", "\xC3\xA4%n"),
+                                   {folder / "\xC3\xA4%n//", "\xC3\xA4%n"},
+                                   {std::string("/"), "/"}}) {
+    COrbStringData actual, shown;
+    const COrbFileHandle handle = HandleOf(path);
+    EXPECT_EQ(handle.GetActualName(actual), kOrbNoErr);
+    EXPECT_EQ(handle.GetDisplayName(shown), kOrbNoErr);
+    EXPECT_EQ(Text(actual), name);
+    EXPECT_EQ(Text(shown), name);
+  }
+}
+
+TEST(Collect, KeepsTheAnswersUntilAskedAgain) {
+  const TempFolder folder;
+  const std::string file = folder.Write("a.jpg", "123");
+  COrbFileHandle handle = HandleOf(file);
+  EXPECT_EQ(handle.GetFileSize(), 3U);
+  folder.Write("a.jpg", "12345");
+  EXPECT_EQ(handle.GetFileSize(), 3U);
+  EXPECT_EQ(handle.Update(), kOrbNoErr);
+  EXPECT_EQ(handle.GetFileSize(), 5U);
+  fs::remove(file);
+  EXPECT_EQ(handle.GetAttribute(), kUsual);
+  EXPECT_EQ(handle.Update(), kOrbErrNoSuchFile);
+  EXPECT_EQ(handle.GetAttribute(), kUsual);
+  EXPECT_EQ(handle.GetFileType(), eOrbFileType_Jpeg);
+}
+
+TEST(Collect, LeavesWhatAFailedPassHadFound) {
+  const TempFolder folder;
+  const std::string file = folder.Write("a.jpg", "123");
+  const COrbFileHandle fresh = HandleOf(file);
+  COrbFileHandle old = HandleOf(file);
+  EXPECT_EQ(old.GetAttribute(), kUsual);
+  AlteredItems items;
+  const orb::platform::ScopedItems scope(items);
+
+  items.volumeFailure = orb::platform::Error{orb::platform::ErrorDomain::kPosix, ENOSPC};
+  EXPECT_EQ(fresh.CollectFileInformatioin(), kOrbErrDiskFull);
+  EXPECT_EQ(fresh.GetFileSize(), 0U);  // Not collected: it is asked again.
+  EXPECT_EQ(old.Update(), kOrbErrNoSuchFile);
+  EXPECT_EQ(old.GetAttribute(), kOrbFileAttrReadable);
+  EXPECT_EQ(old.GetFileSize(), 3U);
+
+  items.volumeFailure = orb::platform::kBusy;  // No answer and no reason: goes on.
+  EXPECT_EQ(fresh.CollectFileInformatioin(), kOrbNoErr);
+  EXPECT_EQ(fresh.GetAttribute(), kOrbFileAttrReadable);
+
+  items.failure = orb::platform::kNotPermitted;
+  EXPECT_EQ(old.CollectFileInformatioin(), kOrbErrAccessDenied);
+  EXPECT_EQ(old.GetAttribute(), 0U);
+  EXPECT_EQ(old.GetFileType(), eOrbFileType_Jpeg);
+}
+
+TEST(Collect, OfAnotherPathFillsTheSameCache) {
+  const TempFolder folder;
+  const COrbStringData file = S(folder.Write("a.mov", "123"));
+  const CFStringRef text = file.CreateCopyCFString();
+  const COrbFileHandle handle;
+  EXPECT_EQ(handle.SetCatalogInfo(text), kOrbNoErr);
+  EXPECT_EQ(handle.GetFileType(), eOrbFileType_Mov);
+  fs::remove(Text(file));
+  EXPECT_EQ(handle.SetCatalogInfo(text), kOrbErrNotFound);
+  EXPECT_EQ(handle.SetCatalogInfo(nullptr), kOrbErrNotFound);
+  CFRelease(text);
+}
+
+TEST(Assignment, CopiesOrForgetsWhatWasCollected) {
+  const TempFolder folder;
+  const std::string file = folder.Write("a.jpg", "123");
+  COrbFileHandle collected = HandleOf(file);
+  EXPECT_EQ(collected.GetFileSize(), 3U);
+  fs::remove(file);  // From here on only what was collected can answer.
+  const COrbFileHandle copy(collected);
+  COrbFileHandle assigned;
+  assigned = collected;
+  for (const COrbFileHandle* each :
+       std::initializer_list<const COrbFileHandle*>{&copy, &assigned}) {
+    EXPECT_EQ(Text(each->GetFullPath()), file);
+    EXPECT_EQ(each->GetFileSize(), 3U);
+    EXPECT_EQ(each->GetAttribute(), kUsual);
+    COrbStringData name;
+    EXPECT_EQ(each->GetActualName(name), kOrbNoErr);
+    EXPECT_EQ(Text(name), "a.jpg");
+  }
+  collected = *&collected;
+  static_cast<COrbFilePath&>(collected) = collected;
+  EXPECT_EQ(collected.GetFileSize(), 3U);
+
+  const COrbFilePath& asPath = copy;
+  const COrbFileHandle fromPath(asPath);
+  EXPECT_EQ(Text(fromPath.GetFullPath()), file);
+  EXPECT_EQ(fromPath.GetFileSize(), 0U);
+  static_cast<COrbFilePath&>(assigned) = copy;
+  EXPECT_EQ(assigned.GetFileSize(), 0U);
+  const COrbStringData sameText = S(file);
+  collected.Initialize(&sameText);
+  EXPECT_EQ(collected.GetFileSize(), 0U);
+  collected.Free();
+  EXPECT_TRUE(collected.IsEmpty());
+}
+
+TEST(Construction, TakesReferencesAndTexts) {
+  const TempFolder folder;
+  const std::string file = folder.Write("a.jpg", "123");
+  FSRef reference;
+  ASSERT_EQ(HandleOf(file).GetFSRef(&reference), kOrbNoErr);
+  EXPECT_EQ(COrbFileHandle(&reference).GetFileSize(), 3U);
+  const CFStringRef text = S(file).CreateCopyCFString();
+  EXPECT_EQ(COrbFileHandle(&text).GetFileSize(), 3U);
+  CFRelease(text);
+  EXPECT_TRUE(COrbFileHandle(static_cast<const FSRef*>(nullptr)).IsEmpty());
+}
+
+TEST(SetAttribute, AdjustsTheLockAlone) {
+  const TempFolder folder;
+  COrbFileHandle handle = HandleOf(folder.Write("a.jpg", ""));
+  EXPECT_EQ(handle.GetAttribute(), kUsual);
+  EXPECT_EQ(handle.SetAttribute(kOrbFileAttrLocked), kOrbNoErr);
+  EXPECT_EQ(handle.GetAttribute(), kUsual | kOrbFileAttrLocked);
+  EXPECT_EQ(handle.Update(), kOrbNoErr);
+  EXPECT_EQ(handle.GetAttribute(), kUsual | kOrbFileAttrLocked);
+  EXPECT_EQ(handle.SetUpdateTime(COrbTime(1ULL)), kOrbErrAccessDenied);
+  EXPECT_EQ(handle.SetAttribute(kOrbFileAttrWritable), kOrbNoErr);
+  EXPECT_EQ(handle.GetAttribute(), kUsual);
+  EXPECT_EQ(AttributesOf(folder / "a.jpg"), kUsual);
+  EXPECT_EQ(COrbFileHandle().SetAttribute(2), kOrbErrNoSuchFile);
+  EXPECT_EQ(HandleOf(folder / "missing").SetAttribute(2), kOrbErrNotFound);
+}
+
+TEST(IsEqual, ComparesTextWithoutCase) {
+  const struct {
+    const char* a;
+    const char* b;
+    bool equal;
+  } kCases[] = {
+      {"/Users/a/Pic", "/users/A/pic/", true},
+      {"/\xC3\x84/x", "/\xC3\xA4/X", true},
+      {"/stra\xC3\x9F"
+       "e",
+       "/STRASSE",
+       true},
+      {"/\xC3\xA4", "/a\xCC\x88", false},  // Composed and decomposed are different texts.
+      {"/a//", "/a/", false},
+      {"/", "/", true},
+      {"/a", "/b", false},
+      {"/a", "", false},
+      {"", "", false},
+      {"/\xFF", "/\xFF", false},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.b);
+    EXPECT_EQ(HandleOf(c.a).IsEqual(HandleOf(c.b)), c.equal);
+    EXPECT_EQ(OrbPathIsEqualActually(HandleOf(c.a), HandleOf(c.b)), c.equal);
+    EXPECT_EQ(OrbPathIsEqualVirtually(HandleOf(c.b), HandleOf(c.a)), c.equal);
+  }
+  EXPECT_TRUE(OrbPathIsEqualOrRootActually(HandleOf("/a"), HandleOf("/A/b")));
+  EXPECT_FALSE(OrbPathIsEqualOrRootVirtually(HandleOf("/a/b"), HandleOf("/a")));
+}
+
+TEST(FindExtensionType, LooksAtFoldersWhenAsked) {
+  const TempFolder folder;
+  fs::create_directory(folder / "y.mov");
+  const struct {
+    std::string path;
+    eOrbFileType type, typeWithoutFolders;
+  } kCases[] = {
+      {"/a/b.JPEG", eOrbFileType_Jpeg, eOrbFileType_Jpeg},
+      {"/a/b.tar.mov", eOrbFileType_Mov, eOrbFileType_Mov},
+      {"/a/b", eOrbFileType_Unknown, eOrbFileType_Unknown},
+      {"/a.jpg/b", eOrbFileType_Unknown, eOrbFileType_Unknown},
+      {folder / "y.mov", eOrbFileType_Mov, eOrbFileType_Unknown},
+      {folder / "z.mov", eOrbFileType_Mov, eOrbFileType_Mov},
+      {"", eOrbFileType_Unknown, eOrbFileType_Unknown},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.path);
+    EXPECT_EQ(OrbPathFindExtensionType(S(c.path), false), c.type);
+    EXPECT_EQ(OrbPathFindExtensionType(S(c.path), true), c.typeWithoutFolders);
+    const COrbFilePath& path = HandleOf(c.path);
+    EXPECT_EQ(OrbPathFindExtensionType(path, true), c.typeWithoutFolders);
+  }
+  EXPECT_EQ(COrbFileHandle::GetFileType(S("b.Jpg")), eOrbFileType_Jpeg);
+  EXPECT_EQ(COrbFileHandle::GetFileType(S("b.")), eOrbFileType_Unknown);
+}
+
+TEST(ItemTimes, AreExactAndStayInRange) {
+  const struct {
+    Timestamp time;
+    std::uint64_t ticks, seconds;
+    unsigned fraction;
+  } kCases[] = {
+      {{0, 0}, 20'828'448'000'000'000, 2'082'844'800, 0},
+      {{1'588'334'400, 750'000'099}, 36'711'792'007'500'000, 3'671'179'200, 49152},
+      {{1'588'334'400, 999'999'999}, 36'711'792'009'999'999, 3'671'179'200, 65535},
+      {{-2'082'844'800, 100}, 1, 0, 0},
+      {{-2'082'844'801, 999'999'999}, 0, 0, 0},
+      {{-9'223'372'036'854'775'807, 0}, 0, 0, 0},
+      {{9'223'372'036'854'775'807, 0}, 18'446'744'073'709'551'615U, 1'844'674'407'370, 62597},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.time.seconds);
+    EXPECT_EQ(orb::TicksOf(c.time), c.ticks);
+    EXPECT_EQ(Seconds(orb::UtcOf(c.time)), c.seconds);
+    EXPECT_EQ(orb::UtcOf(c.time).fraction, c.fraction);
+  }
+  EXPECT_EQ(orb::TimestampOf({1, 5, 9}), (Timestamp{2'212'122'501, 0}));
+}
+
+TEST(Times, AreSetInWholeSecondsAndSeenAfterUpdate) {
+  const TempFolder folder;
+  const std::string file = folder.Write("a.jpg", "");
+  COrbFileHandle handle = HandleOf(file);
+  COrbTime before, time;
+  ASSERT_EQ(handle.GetUpdateTime(&before), kOrbNoErr);
+  const COrbTime noon(36'711'792'007'500'000ULL);  // 2020-05-01 12:00:00.75
+  EXPECT_EQ(handle.SetUpdateTime(noon), kOrbNoErr);
+  EXPECT_EQ(handle.SetCreateTime(COrbTime(36'711'792'017'500'000ULL)), kOrbNoErr);
+  ASSERT_EQ(handle.GetUpdateTime(&time), kOrbNoErr);
+  EXPECT_EQ(time, before);
+  EXPECT_EQ(handle.Update(), kOrbNoErr);
+  ASSERT_EQ(handle.GetUpdateTime(&time), kOrbNoErr);
+  EXPECT_EQ(std::tuple(time.ticks, time.fraction), std::tuple(36'711'792'000'000'000U, 0));
+  EXPECT_EQ(Seconds(handle.GetUpdateTime()), 3'671'179'200U);
+  ASSERT_EQ(handle.GetCreateTime(&time), kOrbNoErr);
+  EXPECT_EQ(time.ticks, 36'711'792'010'000'000U);
+}
+
+TEST(Times, OfTheLastAccessAreReadNow) {
+  const TempFolder folder;
+  const std::string file = folder.Write("a.jpg", "");
+  COrbFileHandle handle = HandleOf(file);
+  for (const long nanoseconds : {123'456'789L, 5L}) {
+    const struct timespec times[] = {{1'588'334'400, nanoseconds}, {0, UTIME_OMIT}};
+    ASSERT_EQ(::utimensat(AT_FDCWD, file.c_str(), times, 0), 0);
+    COrbTime time;
+    EXPECT_EQ(handle.GetAccessTime(&time), kOrbNoErr);
+    EXPECT_EQ(time.ticks, 36'711'792'000'000'000U + static_cast<unsigned long>(nanoseconds) / 100);
+  }
+  EXPECT_EQ(handle.SetAccessTime(COrbTime(0ULL)), kOrbErrNotSupported);
+  EXPECT_EQ(COrbFileHandle().SetAccessTime(COrbTime(0ULL)), kOrbErrNotSupported);
+}
+
+TEST(Times, FailWithTheReason) {
+  const TempFolder folder;
+  COrbTime time;
+  COrbFileHandle missing = HandleOf(folder / "missing");
+  EXPECT_EQ(missing.GetAccessTime(&time), kOrbErrNotFound);
+  EXPECT_EQ(missing.SetCreateTime(time), kOrbErrNotFound);
+  EXPECT_EQ(missing.SetUpdateTime(time), kOrbErrNotFound);
+  for (const std::string& path : {std::string(), folder / "\xFF"}) {
+    COrbFileHandle handle = HandleOf(path);
+    EXPECT_EQ(handle.GetAccessTime(&time), kOrbErrNoSuchFile);
+    EXPECT_EQ(handle.SetCreateTime(time), kOrbErrNoSuchFile);
+    EXPECT_EQ(handle.SetUpdateTime(time), kOrbErrNoSuchFile);
+  }
+}
+
+}  // namespace

@@ -1,0 +1,76 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <dirent.h>
+#include <fcntl.h>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <filesystem>
+#include <map>
+#include <string>
+
+#include "support/temp_folder.h"
+
+namespace orb::test {
+
+inline int OpenDescriptors() {
+  int count = 0;
+  for ([[maybe_unused]] const auto& fd : std::filesystem::directory_iterator("/proc/self/fd"))
+    ++count;
+  return count;
+}
+
+inline bool LimitDescriptors(rlim_t count) {
+  const rlimit limit{count, count};
+  return ::setrlimit(RLIMIT_NOFILE, &limit) == 0;
+}
+
+/// What lies below a folder by relative path: kind and mode, time of modification, content.
+inline std::map<std::string, std::string> Describe(const std::string& folder) {
+  namespace fs = std::filesystem;
+  std::map<std::string, std::string> items;
+  for (const auto& item : fs::recursive_directory_iterator(folder)) {
+    const std::string path = item.path().string();
+    struct stat status {};
+    ::lstat(path.c_str(), &status);
+    std::string text = std::to_string(status.st_mode) + " " +
+                       std::to_string(status.st_mtim.tv_sec) + "." +
+                       std::to_string(status.st_mtim.tv_nsec);
+    if (item.is_symlink()) text += " -> " + fs::read_symlink(item.path()).string();
+    if (item.is_regular_file() && !item.is_symlink()) text += " " + ReadAll(path);
+    items[path.substr(folder.size())] = text;
+  }
+  return items;
+}
+
+/// A chain of folders d/d/d/..., `depth` levels with a file at the end, deeper than a path can
+/// tell.
+inline bool MakeChain(const std::string& folder, int depth) {
+  int level = ::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+  for (int i = 0; i < depth && level >= 0; ++i) {
+    const int next = ::mkdirat(level, "d", 0755) == 0
+                         ? ::openat(level, "d", O_RDONLY | O_DIRECTORY | O_CLOEXEC)
+                         : -1;
+    ::close(level);
+    level = next;
+  }
+  const int file = level < 0 ? -1 : ::openat(level, "end", O_CREAT | O_WRONLY | O_CLOEXEC, 0644);
+  if (level >= 0) ::close(level);
+  return file >= 0 && ::close(file) == 0;
+}
+
+/// How many levels of a chain there are, with the file at its end counted as one.
+inline int ChainDepth(const std::string& folder) {
+  int depth = 0;
+  int level = ::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+  for (int next = level; next >= 0; level = next) {
+    next = ::openat(level, "d", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    if (next >= 0 || ::faccessat(level, "end", F_OK, 0) == 0) ++depth;
+    ::close(level);
+  }
+  return depth;
+}
+
+}  // namespace orb::test
