@@ -12,6 +12,7 @@
 #include <orb/fileops/path_relations.h>
 #include <orb/fileops/progress.h>
 #include <orb/fileops/remove.h>
+#include <orb/fileops/trash.h>
 #include <orb/path/file_path.h>
 #include <orb/path/file_type.h>
 #include <orb/path/path_text.h>

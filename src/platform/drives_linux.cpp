@@ -34,12 +34,42 @@ constexpr std::chrono::seconds kTableAge{1};
 /// Mappings stand on mappings; a chain longer than this is a loop.
 constexpr int kMostSlaves = 8;
 
-constexpr std::string_view kRemoteTypes[] = {
-    "9p", "afs", "auristorfs", "beegfs", "ceph", "cifs", "coda", "davfs", "fuse.afp", "fuse.beegfs",
-    "fuse.ceph", "fuse.curlftpfs", "fuse.davfs", "fuse.davfs2", "fuse.gcsfuse", "fuse.glusterfs",
-    "fuse.goofys", "fuse.gvfsd-fuse", "fuse.juicefs", "fuse.kio-fuse", "fuse.rclone", "fuse.s3fs",
-    "fuse.smbnetfs", "fuse.sshfs", "gfs2", "glusterfs", "gpfs", "gvfs", "lustre", "ncpfs", "nfs",
-    "nfs4", "ocfs2", "orangefs", "smb3", "smbfs"};
+constexpr std::string_view kRemoteTypes[] = {"9p",
+                                             "afs",
+                                             "auristorfs",
+                                             "beegfs",
+                                             "ceph",
+                                             "cifs",
+                                             "coda",
+                                             "davfs",
+                                             "fuse.afp",
+                                             "fuse.beegfs",
+                                             "fuse.ceph",
+                                             "fuse.curlftpfs",
+                                             "fuse.davfs",
+                                             "fuse.davfs2",
+                                             "fuse.gcsfuse",
+                                             "fuse.glusterfs",
+                                             "fuse.goofys",
+                                             "fuse.gvfsd-fuse",
+                                             "fuse.juicefs",
+                                             "fuse.kio-fuse",
+                                             "fuse.rclone",
+                                             "fuse.s3fs",
+                                             "fuse.smbnetfs",
+                                             "fuse.sshfs",
+                                             "gfs2",
+                                             "glusterfs",
+                                             "gpfs",
+                                             "gvfs",
+                                             "lustre",
+                                             "ncpfs",
+                                             "nfs",
+                                             "nfs4",
+                                             "ocfs2",
+                                             "orangefs",
+                                             "smb3",
+                                             "smbfs"};
 
 bool IsRemote(const Mount& mount) { return std::ranges::binary_search(kRemoteTypes, mount.type); }
 
@@ -71,7 +101,8 @@ bool HasNumbered(std::string_view path, std::string_view word) {
     const std::size_t number = at + word.size();
     const std::size_t end = std::min(path.find('/', number), path.size());
     const std::string_view digits = path.substr(number, end - number);
-    if (at > 0 && path[at - 1] == '/' && !digits.empty() && std::ranges::all_of(digits, isDigit)) return true;
+    if (at > 0 && path[at - 1] == '/' && !digits.empty() && std::ranges::all_of(digits, isDigit))
+      return true;
   }
   return false;
 }
@@ -118,7 +149,8 @@ std::string MappedDevice(const std::string& sysfs, std::string_view source) {
   if (!source.starts_with(kMapper)) return {};
   std::error_code ignored;
   for (const auto& entry : std::filesystem::directory_iterator(sysfs + "/block", ignored)) {
-    if (DiskAttribute(entry.path(), "dm/name") == source.substr(kMapper.size())) return entry.path();
+    if (DiskAttribute(entry.path(), "dm/name") == source.substr(kMapper.size()))
+      return entry.path();
   }
   return {};
 }

@@ -17,8 +17,8 @@ using orb::platform::DriveTraits;
 using orb::platform::Result;
 using orb::platform::VolumeId;
 
-/// A machine of one volume, which counts how often it is looked at. Every test takes a number of its
-/// own, because what was found out stays.
+/// A machine of one volume, which counts how often it is looked at. Every test takes a number of
+/// its own, because what was found out stays.
 class OneVolume final : public orb::platform::Drives {
  public:
   OneVolume(std::uint64_t number, Result<DriveTraits> traits) : number_(number), traits_(traits) {}

@@ -15,8 +15,8 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// Lays out sysfs and the mount table of a machine of its own. Its mounts are plain folders, known by
-/// their paths: no mount here has a number that the kernel gives out.
+/// Lays out sysfs and the mount table of a machine of its own. Its mounts are plain folders, known
+/// by their paths: no mount here has a number that the kernel gives out.
 class Machine {
  public:
   /// A disk or partition, "pci0/usb1/1-2/block/sdb/sdb1", found by number and by name.
@@ -41,7 +41,8 @@ class Machine {
     folder_.Write(file, value + "\n");
   }
   void AddSlave(const std::string& path, const std::string& slave) const {
-    Link("sys/devices/" + path + "/slaves", fs::path(slave).filename(),
+    Link("sys/devices/" + path + "/slaves",
+         fs::path(slave).filename(),
          folder_ / ("sys/devices/" + slave));
   }
 

@@ -13,7 +13,8 @@ namespace {
 constexpr char kTable[] =
     "22 1 8:2 / / rw,relatime shared:1 - ext4 /dev/sda2 rw,errors=remount-ro\n"
     "30 22 0:5 / /proc rw,nosuid - proc proc rw\n"
-    "36 22 8:33 / /media/my\\040stick\\011\\134x ro,nosuid shared:9 master:2 - vfat /dev/sdc1 rw,fmask=0022\n"
+    "36 22 8:33 / /media/my\\040stick\\011\\134x ro,nosuid shared:9 master:2 - vfat /dev/sdc1 "
+    "rw,fmask=0022\n"
     "37 22 8:2 /srv/photos /home/photos rw - ext4 /dev/sda2 rw\n"
     "38 22 0:48 / /mnt/nas rw - nfs4 nas:/export\\040one rw,addr=10.0.0.1\n"
     "39 22 0:49 / /mnt/disc rw unbindable - iso9660 /dev/sr0 ro\n"
