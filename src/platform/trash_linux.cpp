@@ -249,7 +249,7 @@ class Trash::Batch {
   }
 
   static Status MoveInto(TrashFolder& trash, const Item& item) {
-    if (IsPartOf(trash, item)) return kNotPermitted;
+    if (Concerns(trash, item)) return kNotPermitted;
     const auto rename = [&](const std::string& name) {
       return trash.RenameIn(item.parent.folder.Get(), item.name, name);
     };
@@ -267,7 +267,7 @@ class Trash::Batch {
     if (!survey) return survey.Reason();
     const auto capacity = Volumes::Current().AvailableCapacity(trash.PathOf("."));
     if (capacity && survey.Value().bytes > *capacity) return kVolumeFull;
-    if (IsPartOf(trash, item)) return kNotPermitted;
+    if (Concerns(trash, item)) return kNotPermitted;
     const auto copy = [&](const std::string& name) {
       return CopyWhole(item.path, trash.PathOf(name));
     };
@@ -277,9 +277,10 @@ class Trash::Batch {
     return RemoveCopied(item, trash, taken.Value());
   }
 
-  static bool IsPartOf(const TrashFolder& trash, const Item& item) {
-    return trash.IsPart(IdentityOf(item.status)) || trash.IsPart(IdentityOf(item.parent.status)) ||
-           trash.IsTrashOfVolume(item.path);
+  /// The trash does not go into itself, nor does a folder that holds it.
+  static bool Concerns(const TrashFolder& trash, const Item& item) {
+    return trash.IsPart(IdentityOf(item.parent.status)) || trash.IsTrashOfVolume(item.path) ||
+           (item.IsFolder() && trash.IsPartOrAbove(IdentityOf(item.status)));
   }
 
   Result<TrashFolder>& Home() {

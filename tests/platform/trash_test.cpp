@@ -200,11 +200,12 @@ TEST_F(TrashTest, RefusesAndLeavesEverythingAsItWas) {
 }
 
 TEST_F(TrashTest, FindsTheHome) {
-  const std::string inHome = folder_ / "home/.local/share/Trash/files/a.jpg";
+  const std::string inHome = folder_ / "home/.local/share/Trash";
   for (const auto& data : {std::optional<std::string>(), std::optional<std::string>("relative")}) {
     const test::ScopedVariable scoped("XDG_DATA_HOME", data);
     EXPECT_TRUE(Put(Make("items/a.jpg")).Ok());
-    EXPECT_TRUE(fs::remove(inHome));
+    EXPECT_TRUE(fs::exists(inHome + "/files/a.jpg"));
+    fs::remove_all(inHome);
   }
   fs::create_directories(folder_ / "disk/Trash");
   fs::create_directory_symlink(folder_ / "disk", folder_ / "data");

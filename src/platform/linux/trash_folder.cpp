@@ -205,6 +205,12 @@ bool TrashFolder::IsPart(const Identity& folder) const {
   return std::ranges::find(parts_, folder) != parts_.end();
 }
 
+bool TrashFolder::IsPartOrAbove(const Identity& folder) const {
+  if (IsPart(folder)) return true;
+  const Result<bool> isAbove = IsInOrBelow(root_.Get(), folder);
+  return !isAbove || isAbove.Value();
+}
+
 bool TrashFolder::IsTrashOfVolume(std::string_view path) const {
   if (topFolder_.empty() || !path.starts_with(topFolder_)) return false;
   const std::string_view name = path.substr(topFolder_.size());

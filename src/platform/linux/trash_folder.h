@@ -47,6 +47,8 @@ class TrashFolder {
 
   /// Whether it is this trash folder, or the folder in it that has the items or the records.
   bool IsPart(const Identity& folder) const;
+  /// Whether it is one of these or a folder above; also when nobody can tell.
+  bool IsPartOrAbove(const Identity& folder) const;
   /// Whether the path is that of a trash folder in the top folder of this volume.
   bool IsTrashOfVolume(std::string_view path) const;
   /// Where an item of this name is.
