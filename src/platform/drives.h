@@ -27,7 +27,7 @@ struct DriveTraits {
   bool remote = false;
   /// Meant to be taken out: the disk says so, or hangs on USB or FireWire or in an SD slot.
   bool ejectable = false;
-  /// The caller may write to the folder where the volume is mounted.
+  /// It can be taken out, and the caller may write to the folder where it is mounted.
   bool writable = false;
 };
 

@@ -73,25 +73,31 @@ constexpr std::string_view kRemoteTypes[] = {"9p",
 
 bool IsRemote(const Mount& mount) { return std::ranges::binary_search(kRemoteTypes, mount.type); }
 
-// --- The disk below a volume, as sysfs tells of it
+// --- The device below a volume, as sysfs tells of it
 
-/// The attribute of a disk. A partition has none of its own and lies in its disk's folder.
-std::string DiskAttribute(const std::string& device, const std::string& name) {
-  for (const char* up : {"/", "/../"}) {
-    Result<std::string> text = ReadSystemFile(device + up + name);
-    if (text) return text.Value().substr(0, text.Value().find('\n'));
-  }
-  return {};
+/// A disk, a partition, or what is made of such ones.
+struct Device {
+  /// Its folder in sysfs, by a link, and that of the disk which a partition is on.
+  std::string folder;
+  std::string disk;
+  /// Where the link leads: "../../devices/pci0000:00/0000:00:14.0/usb1/1-2/.../block/sdb/sdb1".
+  std::string path;
+};
+
+std::optional<Device> FindDevice(const std::string& folder) {
+  std::array<char, PATH_MAX> target;
+  const ssize_t size = ::readlink(folder.c_str(), target.data(), target.size());
+  if (size < 0 && errno != EINVAL) return std::nullopt;  // EINVAL: a folder, and no link.
+  Device device{folder, folder, size < 0 ? folder : std::string(target.data(), std::size_t(size))};
+  const bool isPartition = ::access((folder + "/partition").c_str(), F_OK) == 0;
+  if (isPartition) device.disk += "/..";
+  return device;
 }
 
-bool Exists(const std::string& path) { return ::access(path.c_str(), F_OK) == 0; }
-
-/// Where the device hangs, which the link to its folder says:
-/// "../../devices/pci0000:00/0000:00:14.0/usb1/1-2/.../block/sdb/sdb1".
-std::string DevicePath(const std::string& device) {
-  std::array<char, PATH_MAX> target;
-  const ssize_t size = ::readlink(device.c_str(), target.data(), target.size());
-  return size < 0 ? device : std::string(target.data(), static_cast<std::size_t>(size));
+/// Empty when there is none.
+std::string ReadAttribute(const std::string& folder, const char* name) {
+  const Result<std::string> text = ReadSystemFile(folder + '/' + name);
+  return text ? text.Value().substr(0, text.Value().find('\n')) : std::string();
 }
 
 /// Whether a component of the path is the word and a number, as in usb1 and fw0.
@@ -101,89 +107,96 @@ bool HasNumbered(std::string_view path, std::string_view word) {
     const std::size_t number = at + word.size();
     const std::size_t end = std::min(path.find('/', number), path.size());
     const std::string_view digits = path.substr(number, end - number);
-    if (at > 0 && path[at - 1] == '/' && !digits.empty() && std::ranges::all_of(digits, isDigit))
-      return true;
+    const bool begins = at > 0 && path[at - 1] == '/';
+    if (begins && !digits.empty() && std::ranges::all_of(digits, isDigit)) return true;
   }
   return false;
 }
 
-bool HangsOutside(std::string_view devicePath) {
-  return HasNumbered(devicePath, "usb") || HasNumbered(devicePath, "fw");
+/// Only devices that the kernel makes of others stand on some.
+bool IsPhysical(const Device& device) {
+  return device.path.find("/devices/") != std::string::npos &&
+         device.path.find("/virtual/") == std::string::npos;
 }
 
-/// The disks that a device-mapper or md device stands on.
-std::vector<std::string> Slaves(const std::string& device) {
-  std::vector<std::string> slaves;
+/// The disks and partitions that a device-mapper or md device stands on.
+std::vector<Device> Slaves(const Device& device) {
+  std::vector<Device> slaves;
   std::error_code ignored;
-  for (const auto& entry : std::filesystem::directory_iterator(device + "/slaves", ignored)) {
-    slaves.push_back(entry.path());
+  for (const auto& entry :
+       std::filesystem::directory_iterator(device.folder + "/slaves", ignored)) {
+    if (auto slave = FindDevice(entry.path())) slaves.push_back(*std::move(slave));
   }
   return slaves;
 }
 
-bool IsEjectable(const std::string& device, int depth = 0) {
-  if (HangsOutside(DevicePath(device))) return true;
-  if (DiskAttribute(device, "removable") == "1") return true;
-  // Of an MMC host's slot "SD" can be taken out, "MMC" is soldered.
-  if (DiskAttribute(device, "device/type").starts_with("SD")) return true;
-  if (depth == kMostSlaves) return false;
-  return std::ranges::any_of(Slaves(device),
-                             [&](const auto& slave) { return IsEjectable(slave, depth + 1); });
-}
+/// Of a SCSI device its kind, where 5 is an optical drive; of a card "SD", or "MMC" for one that is
+/// soldered in.
+std::string TypeOf(const Device& device) { return ReadAttribute(device.disk, "device/type"); }
 
-bool IsOptical(const std::string& device) {
-  constexpr std::string_view kScsiOptical = "5";
-  return DiskAttribute(device, "device/type") == kScsiOptical;
+bool IsEjectable(const Device& device, const std::string& type, int depth = 0) {
+  if (HasNumbered(device.path, "usb") || HasNumbered(device.path, "fw")) return true;
+  if (type.starts_with("SD") || ReadAttribute(device.disk, "removable") == "1") return true;
+  if (IsPhysical(device) || depth == kMostSlaves) return false;
+  return std::ranges::any_of(Slaves(device), [&](const auto& slave) {
+    return IsEjectable(slave, TypeOf(slave), depth + 1);
+  });
 }
 
 /// sysfs has "!" for the "/" of such names as cciss/c0d0.
 std::string SysfsName(std::string_view source) {
-  std::string name(source.substr(source.rfind("/dev/", 0) == 0 ? 5 : source.size()));
+  constexpr std::string_view kDevices = "/dev/";
+  if (!source.starts_with(kDevices)) return {};
+  std::string name(source.substr(kDevices.size()));
   std::ranges::replace(name, '/', '!');
   return name;
 }
 
 /// A mapping's source is the link that udev makes; the kernel calls its device dm-0 and the like.
-std::string MappedDevice(const std::string& sysfs, std::string_view source) {
+std::optional<Device> FindMapping(const std::string& sysfs, std::string_view source) {
   constexpr std::string_view kMapper = "/dev/mapper/";
-  if (!source.starts_with(kMapper)) return {};
+  if (!source.starts_with(kMapper)) return std::nullopt;
   std::error_code ignored;
   for (const auto& entry : std::filesystem::directory_iterator(sysfs + "/block", ignored)) {
-    if (DiskAttribute(entry.path(), "dm/name") == source.substr(kMapper.size()))
-      return entry.path();
+    const std::string folder = entry.path();
+    if (ReadAttribute(folder, "dm/name") == source.substr(kMapper.size())) {
+      return FindDevice(folder);
+    }
   }
-  return {};
+  return std::nullopt;
 }
 
-/// The folder in sysfs of the device that a volume is on; empty when it is on none. Volumes of
-/// several devices, such as those of btrfs, have no device number and are found by their source.
-std::string FindDevice(const std::string& sysfs, const Mount& mount) {
+/// The device that a volume is on, if it is on one. Volumes that may be on several, such as those
+/// of btrfs, have no device number and are found by their source.
+std::optional<Device> FindDevice(const std::string& sysfs, const Mount& mount) {
   if (mount.device.major != 0) {
     const std::string number =
         std::to_string(mount.device.major) + ':' + std::to_string(mount.device.minor);
-    if (std::string device = sysfs + "/dev/block/" + number; Exists(device)) return device;
+    if (auto device = FindDevice(sysfs + "/dev/block/" + number)) return device;
   }
   const std::string name = SysfsName(mount.source);
-  if (name.empty()) return {};
-  for (const char* folder : {"/class/block/", "/block/"}) {
-    if (std::string device = sysfs + folder + name; Exists(device)) return device;
-  }
-  return MappedDevice(sysfs, mount.source);
+  if (name.empty()) return std::nullopt;
+  if (auto device = FindDevice(sysfs + "/class/block/" + name)) return device;
+  if (auto device = FindDevice(sysfs + "/block/" + name)) return device;
+  return FindMapping(sysfs, mount.source);
 }
 
-bool CallerMayWrite(const Mount& mount) {
-  return !mount.readOnly && ::faccessat(AT_FDCWD, mount.folder.c_str(), W_OK, AT_EACCESS) == 0;
+bool CallerMayWrite(const Mount& mount, const Device& device) {
+  if (mount.readOnly || ReadAttribute(device.folder, "ro") == "1") return false;
+  if (device.folder != device.disk && ReadAttribute(device.disk, "ro") == "1") return false;
+  return ::faccessat(AT_FDCWD, mount.folder.c_str(), W_OK, AT_EACCESS) == 0;
 }
 
 DriveTraits TraitsOf(const Mount& mount, const std::string& sysfs) {
+  constexpr std::string_view kScsiOptical = "5";
   if (IsRemote(mount)) return {.remote = true};
+  const std::optional<Device> device = FindDevice(sysfs, mount);
+  if (!device) return {};
   DriveTraits traits;
-  traits.writable = CallerMayWrite(mount);
-  const std::string device = FindDevice(sysfs, mount);
-  if (device.empty()) return traits;
-  traits.optical = IsOptical(device);
-  traits.ejectable = traits.optical || IsEjectable(device);
-  traits.writable &= DiskAttribute(device, "ro") != "1";
+  const std::string type = TypeOf(*device);
+  traits.optical = type == kScsiOptical;
+  traits.ejectable = traits.optical || IsEjectable(*device, type);
+  traits.writable = traits.ejectable && CallerMayWrite(mount, *device);
   return traits;
 }
 
