@@ -6,6 +6,7 @@
 #include <mutex>
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "platform/drives.h"
 #include "strings/string_access.h"
@@ -64,5 +65,6 @@ eOrbDriveType FindType(const std::string& path) {
 unsigned int COrbFileHandle::GetDriveType() const {
   const COrbStringData fullPath = GetFullPath();
   const std::string_view text = orb::StringAccess::Read(fullPath).Readable();
-  return text.empty() ? eOrbDriveType_Fixed : FindType(std::string(text));
+  if (text.empty()) return eOrbDriveType_Fixed;
+  return FindType(std::string(text));
 }

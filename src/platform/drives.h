@@ -32,8 +32,8 @@ struct DriveTraits {
 };
 
 /// The service that tells kinds of drives apart. Everything may be called from any thread. An item
-/// below a network mount is never looked at, so that a server that is gone does not hang the
-/// answer; a mount younger than a second may not be known for one yet.
+/// whose path lies below a network mount is not looked at, so that a server that is gone does not
+/// hang the answer; for a second after it was mounted it may not be known for one.
 class Drives {
  public:
   /// The system's, unless a test has put another in place.

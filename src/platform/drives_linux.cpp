@@ -228,8 +228,9 @@ class RecentMountTable {
  public:
   explicit RecentMountTable(std::string file) : file_(std::move(file)) {}
 
-  /// The network mount that a path is on by its text.
+  /// The network mount that a path is on by its text. What ".." means only the kernel knows.
   std::optional<Mount> FindRemote(std::string_view path) {
+    if (path.find("/..") != std::string_view::npos) return std::nullopt;
     const std::lock_guard lock(mutex_);
     if (!freshUntil_ || Clock::now() >= *freshUntil_) Refresh();
     const Mount* mount = hasRemote_ ? table_.FindByPath(path) : nullptr;
