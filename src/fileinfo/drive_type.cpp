@@ -7,6 +7,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <tuple>
 
 #include "platform/drives.h"
 #include "strings/string_access.h"
@@ -16,6 +17,12 @@ namespace {
 using orb::platform::Drives;
 using orb::platform::DriveTraits;
 using orb::platform::VolumeId;
+
+struct ByNumbers {
+  bool operator()(const VolumeId& a, const VolumeId& b) const {
+    return std::tie(a.mount, a.device) < std::tie(b.mount, b.device);
+  }
+};
 
 /// The types that were found out. Entries are never changed or removed. Guarded by its lock.
 class DriveTypeCache {
@@ -38,7 +45,7 @@ class DriveTypeCache {
 
  private:
   std::mutex mutex_;
-  std::map<VolumeId, eOrbDriveType> types_;
+  std::map<VolumeId, eOrbDriveType, ByNumbers> types_;
 };
 
 eOrbDriveType TypeOf(const DriveTraits& drive) {

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #pragma once
 
-#include <compare>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -16,7 +15,7 @@ struct VolumeId {
   std::uint64_t mount = 0;
   std::uint64_t device = 0;
 
-  auto operator<=>(const VolumeId&) const = default;
+  bool operator==(const VolumeId&) const = default;
 };
 
 /// What kind of drive a volume is on.

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #pragma once
 
-#include <compare>
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -16,7 +15,7 @@ struct DeviceNumber {
   std::uint32_t major = 0;
   std::uint32_t minor = 0;
 
-  auto operator<=>(const DeviceNumber&) const = default;
+  bool operator==(const DeviceNumber&) const = default;
 };
 
 /// One line of the mount table.

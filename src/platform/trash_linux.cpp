@@ -74,7 +74,7 @@ std::string NameBelow(std::string_view path, std::string_view folderText) {
   return std::string(path.substr(0, path.find('/')));
 }
 
-/// Never asks a server for what it may have by now.
+/// What is known of an item on a server does for this: it is not asked again.
 Result<StatusRecord> ReadStatus(int folder, const char* name, int flags) {
   constexpr unsigned kFields = STATX_TYPE | STATX_MODE | STATX_UID | STATX_INO | STATX_MNT_ID;
   flags |= AT_STATX_DONT_SYNC;
