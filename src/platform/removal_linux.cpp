@@ -2,6 +2,9 @@
 #include "platform/removal.h"
 
 #include <fcntl.h>
+#include <limits.h>
+#include <stdio.h>
+#include <sys/xattr.h>
 
 #include <optional>
 #include <string>
@@ -27,7 +30,17 @@ Status RefuseLocked(int item) {
   return locked.Value() ? Status(kNotPermitted) : Status();
 }
 
+/// The kernel itself refuses to remove what has the immutable or the append-only flag. Where the
+/// attribute is not simply missing, all is looked at.
+bool HasNoLockAttribute(int folder, const char* name) {
+  char path[sizeof "/proc/self/fd/" + 12 + NAME_MAX + 1];
+  const int length = std::snprintf(path, sizeof path, "/proc/self/fd/%d/%s", folder, name);
+  if (length < 0 || static_cast<std::size_t>(length) >= sizeof path) return false;
+  return ::lgetxattr(path, kLockAttribute, nullptr, 0) < 0 && errno == ENODATA;
+}
+
 Status RefuseLockedEntry(int folder, const char* name) {
+  if (HasNoLockAttribute(folder, name)) return {};
   const UniqueFd item(
       Retry([&] { return ::openat(folder, name, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
   return item ? RefuseLocked(item.Get()) : Status(LastError());
