@@ -73,5 +73,5 @@ unsigned int COrbFileHandle::GetDriveType() const {
   const COrbStringData fullPath = GetFullPath();
   const std::string_view text = orb::StringAccess::Read(fullPath).Readable();
   if (text.empty()) return eOrbDriveType_Fixed;
-  return FindType(std::string(text));
+  return static_cast<unsigned int>(FindType(std::string(text)));
 }
