@@ -5,12 +5,14 @@
 /// The whole public interface.
 
 #include <orb/export.h>
+#include <orb/fileinfo/drive_type.h>
 #include <orb/fileinfo/file_handle.h>
 #include <orb/fileops/copy.h>
 #include <orb/fileops/create.h>
 #include <orb/fileops/path_relations.h>
 #include <orb/fileops/progress.h>
 #include <orb/fileops/remove.h>
+#include <orb/fileops/trash.h>
 #include <orb/path/file_path.h>
 #include <orb/path/file_type.h>
 #include <orb/path/path_text.h>
