@@ -1,0 +1,181 @@
+// SPDX-License-Identifier: MIT
+#include "platform/calendar.h"
+
+#include <sys/stat.h>
+#include <time.h>
+
+#include <algorithm>
+#include <array>
+#include <cstdlib>
+#include <cstring>
+
+namespace orb::platform {
+namespace {
+
+// glibc takes a lock and searches the zone for every conversion. Each thread therefore keeps what
+// it learnt of the zone, in blocks of half a year; a block is surveyed when first needed.
+constexpr int kBlockBits = 24;
+constexpr std::int64_t kBlockLength = std::int64_t{1} << kBlockBits;
+// Three days. No zone of the tz database has changed its offset twice within less than 3.98 days
+// since 1900, so two probes that differ have one change between them and two that agree have none.
+constexpr std::int64_t kProbeDistance = std::int64_t{1} << 18;
+// More than any zone is ahead of or behind GMT, and less than half of the distance above.
+constexpr std::int64_t kFarthestOffset = 26 * 3600;
+
+constexpr std::int64_t kNoBlock = INT64_MIN;
+constexpr int kMostChanges = 4;
+
+/// What to add to the instants of one block to get local time.
+struct Block {
+  std::int64_t index = kNoBlock;
+  int changes = 0;  // More than kMostChanges: too many to keep, every instant is asked for.
+  std::array<std::int64_t, kMostChanges> at{};
+  std::array<std::int32_t, kMostChanges + 1> offsets{};
+};
+
+/// The zone as glibc has it now. A leap second, where the zone has them, counts as a change.
+std::int32_t AskOffset(std::int64_t instant) {
+  struct tm fields;
+  const time_t time = instant;
+  if (::localtime_r(&time, &fields) == nullptr) return 0;  // A year beyond what an int holds.
+  const CivilTime local{fields.tm_year + std::int64_t{1900},
+                        static_cast<unsigned>(fields.tm_mon + 1),
+                        static_cast<unsigned>(fields.tm_mday),
+                        static_cast<unsigned>(fields.tm_hour),
+                        static_cast<unsigned>(fields.tm_min),
+                        static_cast<unsigned>(fields.tm_sec)};
+  return static_cast<std::int32_t>(SecondsFromCivil(local) - instant);
+}
+
+/// The first instant that no longer has the offset of `begin`; `end` is known not to have it.
+std::int64_t FindChange(std::int64_t begin, std::int64_t end, std::int32_t offset) {
+  while (end - begin > 1) {
+    const std::int64_t middle = begin + (end - begin) / 2;
+    (AskOffset(middle) == offset ? begin : end) = middle;
+  }
+  return end;
+}
+
+void AddChange(Block* block, std::int64_t at, std::int32_t offset) {
+  if (block->changes < kMostChanges) {
+    const auto position = static_cast<std::size_t>(block->changes);
+    block->at[position] = at;
+    block->offsets[position + 1] = offset;
+  }
+  ++block->changes;
+}
+
+Block Survey(std::int64_t index) {
+  ::tzset();  // Another thread may have put another zone in place meanwhile.
+  Block block;
+  block.index = index;
+  const std::int64_t begin = index * kBlockLength;
+  std::int32_t offset = AskOffset(begin);
+  block.offsets[0] = offset;
+  for (std::int64_t at = begin; at < begin + kBlockLength; at += kProbeDistance) {
+    const std::int32_t next = AskOffset(at + kProbeDistance);
+    if (next == offset) continue;
+    AddChange(&block, FindChange(at, at + kProbeDistance, offset), next);
+    offset = next;
+  }
+  return block;
+}
+
+std::int32_t OffsetIn(const Block& block, std::int64_t instant) {
+  if (block.changes > kMostChanges) return AskOffset(instant);
+  std::size_t position = 0;
+  while (position < static_cast<std::size_t>(block.changes) && instant >= block.at[position]) {
+    ++position;
+  }
+  return block.offsets[position];
+}
+
+/// Tells whether the zone is still the one that it was.
+class ZoneWatch {
+ public:
+  /// True on the first call.
+  bool Changed() {
+    const char* name = std::getenv("TZ");
+    return name == nullptr ? SystemZoneChanged() : NamedZoneChanged(name);
+  }
+
+ private:
+  enum class Source { kNone, kSystem, kNamed, kTooLongToKeep };
+
+  bool NamedZoneChanged(const char* name) {
+    if (source_ == Source::kNamed && std::strcmp(name, name_.data()) == 0) return false;
+    const std::size_t length = std::strlen(name);
+    source_ = length < name_.size() ? Source::kNamed : Source::kTooLongToKeep;
+    if (source_ == Source::kNamed) std::memcpy(name_.data(), name, length + 1);
+    return true;
+  }
+
+  bool SystemZoneChanged() {
+    struct timespec now;
+    ::clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
+    if (source_ == Source::kSystem && now.tv_sec == lookedAt_) return false;
+    lookedAt_ = now.tv_sec;
+    return SystemZoneFileChanged();
+  }
+
+  bool SystemZoneFileChanged() {
+    struct stat file {};
+    if (::stat("/etc/localtime", &file) != 0) file = {};  // GMT then.
+    const bool same = source_ == Source::kSystem && file.st_dev == file_.st_dev &&
+                      file.st_ino == file_.st_ino && file.st_mtime == file_.st_mtime;
+    source_ = Source::kSystem;
+    file_ = file;
+    return !same;
+  }
+
+  Source source_ = Source::kNone;
+  std::array<char, 128> name_{};
+  time_t lookedAt_ = 0;
+  struct stat file_ {};
+};
+
+/// One thread's knowledge of the zone: some seventy years.
+class Zone {
+ public:
+  void Refresh() {
+    if (!watch_.Changed()) return;
+    for (Block& block : blocks_) block.index = kNoBlock;
+  }
+
+  std::int32_t Offset(std::int64_t instant) {
+    const std::int64_t index = instant >> kBlockBits;
+    Block& block = blocks_[static_cast<std::size_t>(index) % blocks_.size()];
+    if (block.index != index) block = Survey(index);
+    return OffsetIn(block, instant);
+  }
+
+ private:
+  ZoneWatch watch_;
+  std::array<Block, 128> blocks_{};
+};
+
+Zone& CurrentZone() {
+  static thread_local constinit Zone zone;
+  zone.Refresh();
+  return zone;
+}
+
+}  // namespace
+
+CivilTime LocalFromInstant(std::int64_t instant) {
+  return CivilFromSeconds(instant + CurrentZone().Offset(instant));
+}
+
+std::int64_t InstantFromLocal(const CivilTime& local) {
+  Zone& zone = CurrentZone();
+  const std::int64_t seconds = SecondsFromCivil(local);
+  // A change of the clock, if it is near at all, lies between these two.
+  const std::int32_t before = zone.Offset(seconds - kFarthestOffset);
+  const std::int32_t after = zone.Offset(seconds + kFarthestOffset);
+  const std::int64_t early = seconds - before;
+  if (before == after || zone.Offset(early) == before) return early;
+  const std::int64_t late = seconds - after;
+  return zone.Offset(late) == after ? late : early;
+}
+
+}  // namespace orb::platform

@@ -1,0 +1,208 @@
+// SPDX-License-Identifier: MIT
+#include <gtest/gtest.h>
+#include <orb/strings/string_functions.h>
+
+#include <string>
+#include <vector>
+
+#include "support/texts.h"
+
+namespace {
+
+/// What a result shows: its text, or that it has no value.
+std::string Shown(const COrbStringData& s) { return HasNoValue(s) ? "(no value)" : Text(s); }
+
+const std::string kNone = "(no value)";
+const std::string kInvalid = "a\xFF";
+
+std::vector<std::string> Pieces(const std::string& s, const std::string& sep) {
+  std::vector<COrbStringData> out = {S("old")};
+  OrbStringDataSplit(S(s), S(sep), &out);
+  std::vector<std::string> pieces;
+  for (const COrbStringData& piece : out) pieces.push_back(Text(piece));
+  return pieces;
+}
+
+TEST(Cutting, CountsUtf16UnitsAndClamps) {
+  const struct {
+    const char* text;
+    unsigned long start, count;
+    std::string middle;
+  } kMid[] = {
+      {"abcd", 2, 10, "cd"},
+      {"abcd", 4, 1, kNone},
+      {"abcd", 0, 0, ""},
+      {"abcd", 1, static_cast<unsigned long>(-1), "bcd"},
+      {"", 0, 1, kNone},
+      {"é漢x", 1, 1, "漢"},
+      {"a😀b", 1, 2, "😀"},
+      {"a😀b", 1, 1, "\uFFFD"},
+      {"a😀b",
+       2,
+       2,
+       "\uFFFD"
+       "b"},
+      {kInvalid.c_str(), 0, 1, kNone},
+  };
+  for (const auto& c : kMid) {
+    SCOPED_TRACE(c.text + std::to_string(c.start));
+    EXPECT_EQ(Shown(S(c.text).Mid(c.start, c.count)), c.middle);
+  }
+  const struct {
+    const char* text;
+    unsigned long from;
+    std::string rest;
+  } kInc[] = {
+      {"abcd", 4, ""},
+      {"abcd", 5, kNone},
+      {"abcd", 1, "bcd"},
+      {"😀", 1, "\uFFFD"},
+      {kInvalid.c_str(), 0, ""},
+      {kInvalid.c_str(), 1, kNone},
+  };
+  for (const auto& c : kInc) EXPECT_EQ(Shown(OrbStringDataInc(S(c.text), c.from)), c.rest);
+  EXPECT_EQ(Shown(OrbStringDataInc(COrbStringData(), 0)), "");
+  EXPECT_EQ(Shown(OrbStringDataInc(COrbStringData(), 1)), kNone);
+  EXPECT_EQ(Shown(COrbStringData().Mid(0, 0)), kNone);
+}
+
+TEST(Joining, AlwaysHasAValueAndKeepsRawBytes) {
+  EXPECT_EQ(Shown(COrbStringData() + S("a")), "a");
+  EXPECT_EQ(Shown(OrbStringDataCat(COrbStringData(), COrbStringData())), "");
+  EXPECT_EQ(Text(OrbStringDataCat(S("\xE6\xBC"), S("\xA2"))), "漢");
+  COrbStringData doubled = S("ab");
+  const COrbStringData copy = doubled;
+  (doubled += doubled) += S("c");
+  EXPECT_EQ(Text(doubled), "ababc");
+  EXPECT_EQ(Text(copy), "ab");
+}
+
+TEST(Splitting, DropsEmptyPiecesAndGivesNothingWithoutASeparator) {
+  using Texts = std::vector<std::string>;
+  EXPECT_EQ(Pieces(",a,,b,", ","), (Texts{"a", "b"}));
+  EXPECT_EQ(Pieces("ab", ","), Texts());
+  EXPECT_EQ(Pieces("a,b", ""), Texts());
+  EXPECT_EQ(Pieces("aéb", "e\u0301"), Texts{"a"});  // Two units go, although the match has one.
+  EXPECT_EQ(Pieces("aé😀b", "e\u0301"),
+            (Texts{"a",
+                   "\uFFFD"
+                   "b"}));
+  OrbStringDataSplit(S("a"), S("a"), nullptr);
+  std::vector<COrbStringData> own = {S("x-y"), S("-")};
+  OrbStringDataSplit(own[0], own[1], &own);
+  ASSERT_EQ(own.size(), 2U);
+  EXPECT_EQ(Text(own[1]), "y");
+}
+
+TEST(Replacing, CutsAsManyUnitsAsTheWantedTextHas) {
+  const struct {
+    const char *text, *find, *with, *result;
+  } kCases[] = {
+      {"aXbXc", "X", "--", "a--b--c"},
+      {"aaa", "aa", "b", "ba"},
+      {"abc", "", "x", "abc"},
+      {"", "a", "x", ""},
+      {kInvalid.c_str(), "a", "x", kInvalid.c_str()},
+      {"abc",
+       "b",
+       kInvalid.c_str(),
+       "aa\xFF"
+       "c"},
+      {"e\u0301x", "é", "-", "-\u0301x"},  // One unit goes; the mark begins the rest.
+      {"éxyé", "e\u0301", "-", "-y-"},
+      {"\u212A"
+       "K",
+       "K",
+       "-",
+       "--"},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.text);
+    EXPECT_EQ(Shown(OrbStringDataReplace(S(c.text), S(c.find), S(c.with))), c.result);
+  }
+  EXPECT_EQ(Shown(OrbStringDataReplace(COrbStringData(), S("a"), S("b"))), "");
+}
+
+TEST(Trimming, TakesTheSetUnitByUnit) {
+  const struct {
+    const char *text, *set;
+    bool left, right;
+    std::string result;
+  } kCases[] = {
+      {"  ab c  ", " ", true, true, "ab c"},
+      {"  ab c  ", " ", true, false, "ab c  "},
+      {"  ab c  ", " ", false, true, "  ab c"},
+      {"  ab c  ", " ", false, false, "  ab c  "},
+      {"-_x_-", "-_", true, true, "x"},
+      {"---", "-", true, true, kNone},
+      {"", "-", true, false, kNone},
+      {"abc", "-", true, true, "abc"},
+      {"abc", "", true, true, "abc"},
+      {"😀a😀", "😀", true, true, "😀a😀"},  // The set holds halves, and no half stands in the text.
+      {"\uFFFDa", "😀", true, true, "a"},
+      {"\u0301a", "\u0301", true, true, "a"},
+      {" \u0301a ", " ", true, true, " \u0301a"},
+      {kInvalid.c_str(), "a", true, true, kInvalid},
+      {"a", kInvalid.c_str(), true, true, "a"},
+      {"", kInvalid.c_str(), true, true, kNone},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.text);
+    EXPECT_EQ(Shown(OrbString::Trim(S(c.text), S(c.set), c.left, c.right)), c.result);
+  }
+  EXPECT_EQ(Shown(OrbStringDataTrim(S(" a "), S(" "))), "a");
+  EXPECT_EQ(Shown(OrbStringDataTrimLeft(S(" a "), S(" "))), "a ");
+  EXPECT_EQ(Shown(OrbStringDataTrimRight(S(" a "), S(" "))), " a");
+  EXPECT_EQ(Shown(OrbString::Trim(COrbStringData(), S(""), true, true)), kNone);
+}
+
+TEST(CaseMapping, IsFullAndLocaleIndependent) {
+  EXPECT_EQ(Text(OrbStringDataUpper(S("straße ŉ i"))), "STRASSE ʼN I");
+  EXPECT_EQ(Text(OrbStringDataLower(S("ΟΔΟΣ ΑΣ. İ"))), "οδος ας. i̇");
+  EXPECT_EQ(Text(OrbStringDataLower(S("A-Z[`{@"))), "a-z[`{@");
+  EXPECT_EQ(Shown(OrbStringDataUpper(COrbStringData())), "");
+  EXPECT_EQ(Shown(OrbStringDataLower(S(kInvalid))), "");
+}
+
+TEST(Numbers, ReadWhatStandsInFront) {
+  EXPECT_EQ(OrbStringDataToNumber(" -12x"), -12);
+  EXPECT_EQ(OrbStringDataToNumber("x"), 0);
+  EXPECT_EQ(OrbStringDataToFloat("2.5e1,"), 25.0);
+  EXPECT_EQ(OrbStringDataToNumber(OrbCharPlatform(static_cast<const char*>(nullptr))), 0);
+  EXPECT_EQ(OrbStringDataToFloat(OrbCharPlatform(static_cast<const char*>(nullptr))), 0);
+}
+
+TEST(Formatting, GivesNoValueWhereItFails) {
+  const COrbStringData format = S("%d-%s");
+  EXPECT_EQ(Text(OrbStringDataFormat(&format, 7, "x")), "7-x");
+  EXPECT_TRUE(format.HasValueSystemEncoding());
+  const OrbCharPlatform platform("é%s%.1f%n!");
+  int written = 0;
+  EXPECT_EQ(Text(OrbStringDataFormat(&platform, "\xFF", 0.5, &written)),
+            "é\xFF"
+            "0.5!");
+  EXPECT_EQ(written, 6);
+  const std::string large(100000, 'x');
+  EXPECT_EQ(Text(OrbStringDataFormat(&format, 1, large.c_str())), "1-" + large);
+  const OrbCharPlatform wide("%ls");  // Fails in the "C" locale, which the tests run in.
+  EXPECT_EQ(Shown(OrbStringDataFormat(&wide, L"é")), kNone);
+  EXPECT_EQ(Shown(OrbStringDataFormat(static_cast<const COrbStringData*>(nullptr))), kNone);
+  EXPECT_EQ(Shown(OrbStringDataFormat(static_cast<const OrbCharPlatform*>(nullptr))), kNone);
+  const OrbCharPlatform null(static_cast<const char*>(nullptr));
+  EXPECT_EQ(Shown(OrbStringDataFormat(&null)), kNone);
+}
+
+TEST(Formatting, OfWideTextIsBounded) {
+  const OrbCharUnicode format(L"%d é漢😀 %ls");
+  EXPECT_EQ(Text(OrbStringDataFormatW(&format, 7, L"x")), "7 é漢😀 x");
+  const OrbCharUnicode repeated(L"%*d");
+  EXPECT_EQ(OrbStringDataFormatW(&repeated, 2047, 1).GetLengthChar(), 2047U);
+  EXPECT_EQ(Shown(OrbStringDataFormatW(&repeated, 2048, 1)), kNone);
+  const OrbCharUnicode narrow(L"%s");
+  EXPECT_EQ(Shown(OrbStringDataFormatW(&narrow, "\xFF")), kNone);
+  const OrbCharUnicode null(static_cast<const wchar_t*>(nullptr));
+  EXPECT_EQ(Shown(OrbStringDataFormatW(&null)), kNone);
+  EXPECT_EQ(Shown(OrbStringDataFormatW(nullptr)), kNone);
+}
+
+}  // namespace
