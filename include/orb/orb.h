@@ -15,6 +15,9 @@
 #include <orb/path/file_type.h>
 #include <orb/path/path_text.h>
 #include <orb/platform/core_foundation.h>
+#include <orb/records/geometry.h>
+#include <orb/records/geotag.h>
+#include <orb/records/image_property.h>
 #include <orb/result.h>
 #include <orb/strings/char_types.h>
 #include <orb/strings/string_data.h>
