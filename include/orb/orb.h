@@ -18,6 +18,8 @@
 #include <orb/records/geometry.h>
 #include <orb/records/geotag.h>
 #include <orb/records/image_property.h>
+#include <orb/records/metadata.h>
+#include <orb/records/output.h>
 #include <orb/result.h>
 #include <orb/strings/char_types.h>
 #include <orb/strings/string_data.h>
