@@ -20,6 +20,7 @@
 #include <orb/records/image_property.h>
 #include <orb/records/metadata.h>
 #include <orb/records/output.h>
+#include <orb/records/upload.h>
 #include <orb/result.h>
 #include <orb/strings/char_types.h>
 #include <orb/strings/string_data.h>
