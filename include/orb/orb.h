@@ -21,6 +21,7 @@
 #include <orb/records/metadata.h>
 #include <orb/records/output.h>
 #include <orb/records/upload.h>
+#include <orb/records/workspace.h>
 #include <orb/result.h>
 #include <orb/strings/char_types.h>
 #include <orb/strings/string_data.h>
