@@ -17,6 +17,13 @@
 #include <orb/path/file_type.h>
 #include <orb/path/path_text.h>
 #include <orb/platform/core_foundation.h>
+#include <orb/records/geometry.h>
+#include <orb/records/geotag.h>
+#include <orb/records/image_property.h>
+#include <orb/records/metadata.h>
+#include <orb/records/output.h>
+#include <orb/records/upload.h>
+#include <orb/records/workspace.h>
 #include <orb/result.h>
 #include <orb/strings/char_types.h>
 #include <orb/strings/string_data.h>
