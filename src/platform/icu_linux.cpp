@@ -18,7 +18,7 @@ namespace orb::platform {
 namespace {
 
 /// Tells packaging tools of the library that is loaded by name, which no ELF entry shows.
-/// https://uapi-group.org/specifications/specs/elf_dlopen_metadata/
+/// The form is the "ELF dlopen metadata" of uapi-group.org.
 constexpr char kNeeds[] =
     R"([{"feature":"unicode","description":"Unicode data","priority":"required","soname":[")" ORB_ICU_LIBRARY
     R"("]}])";
