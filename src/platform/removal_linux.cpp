@@ -10,7 +10,7 @@
 
 #include "platform/linux/folder_stream.h"
 #include "platform/linux/item_metadata.h"
-#include "platform/linux/place.h"
+#include "platform/linux/removal_at.h"
 
 namespace orb::platform {
 namespace {
@@ -20,18 +20,6 @@ constexpr std::size_t kOpenLevels = 32;
 /// How often a folder that is found not empty after everything in it was removed is gone through
 /// again, before it counts as one that somebody else is filling.
 constexpr int kMaxPasses = 32;
-
-Status RefuseLocked(int item) {
-  const auto locked = IsLocked(item);
-  if (!locked) return locked.Reason();
-  return locked.Value() ? Status(kNotPermitted) : Status();
-}
-
-Status RefuseLockedEntry(int folder, const char* name) {
-  const UniqueFd item(
-      Retry([&] { return ::openat(folder, name, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
-  return item ? RefuseLocked(item.Get()) : Status(LastError());
-}
 
 enum class Outcome { kGone, kNotEmpty };
 
@@ -138,6 +126,14 @@ class TreeRemover {
   std::vector<Level> levels_;
 };
 
+}  // namespace
+
+Status RefuseLockedEntry(int folder, const char* name) {
+  const UniqueFd item(
+      Retry([&] { return ::openat(folder, name, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
+  return item ? RefuseLocked(item.Get()) : Status(LastError());
+}
+
 Result<Place> LocateRemovable(const std::string& path) {
   auto place = Locate(path);
   if (!place) return place;
@@ -148,17 +144,17 @@ Result<Place> LocateRemovable(const std::string& path) {
   return place;
 }
 
-}  // namespace
+Status RemoveItemAt(int folder, const std::string& name) {
+  const auto outcome = RemoveEntry(folder, name.c_str(), DT_UNKNOWN);
+  if (!outcome) return outcome.Reason();
+  return outcome.Value() == Outcome::kGone ? Status() : TreeRemover(folder).Remove(name);
+}
 
 Status RemoveItem(const std::string& path) {
   const ErrnoKeeper errnoKeeper;
   const auto place = LocateRemovable(path);
   if (!place) return place.Reason();
-  const int folder = place.Value().folder.Get();
-  const std::string& name = place.Value().name;
-  const auto outcome = RemoveEntry(folder, name.c_str(), DT_UNKNOWN);
-  if (!outcome) return outcome.Reason();
-  return outcome.Value() == Outcome::kGone ? Status() : TreeRemover(folder).Remove(name);
+  return RemoveItemAt(place.Value().folder.Get(), place.Value().name);
 }
 
 Status UnlinkItem(const std::string& path) {
