@@ -6,11 +6,13 @@
 
 #include <orb/export.h>
 #include <orb/fileinfo/file_handle.h>
+#include <orb/fileops/access.h>
 #include <orb/fileops/copy.h>
 #include <orb/fileops/create.h>
 #include <orb/fileops/path_relations.h>
 #include <orb/fileops/progress.h>
 #include <orb/fileops/remove.h>
+#include <orb/fileops/rename.h>
 #include <orb/path/file_path.h>
 #include <orb/path/file_type.h>
 #include <orb/path/path_text.h>

@@ -83,7 +83,8 @@ Result<Place> LocateDestination(const std::string& path, const Place& source) {
   if (place.Value().NamesNoEntry()) return kItemExists;
   const auto status = ReadStatus(source);
   if (!status) return status.Reason();
-  if (place.Value().folderMeant && !S_ISDIR(status.Value().st_mode)) return kInvalidName;
+  if (place.Value().folderMeant && !S_ISDIR(status.Value().st_mode))
+    return ReadStatus(place.Value()) ? kItemExists : kInvalidName;
   const Status open = RefuseLocked(place.Value().folder.Get());
   return open ? std::move(place) : open.Reason();
 }
