@@ -13,6 +13,7 @@
 #include <orb/fileops/progress.h>
 #include <orb/fileops/remove.h>
 #include <orb/fileops/rename.h>
+#include <orb/fileops/temp_files.h>
 #include <orb/fileops/whole_file.h>
 #include <orb/path/file_path.h>
 #include <orb/path/file_type.h>
