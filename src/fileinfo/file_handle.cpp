@@ -2,8 +2,6 @@
 #include <orb/fileinfo/file_handle.h>
 #include <orb/path/path_text.h>
 
-#include <optional>
-#include <string>
 #include <string_view>
 
 #include "fileinfo/item_path.h"
@@ -11,9 +9,8 @@
 #include "fileops/error_mapping.h"
 #include "path/file_types.h"
 #include "platform/items.h"
-#include "platform/transcode.h"
-#include "platform/unicode.h"
 #include "strings/string_access.h"
+#include "strings/text_compare.h"
 
 namespace {
 
@@ -23,6 +20,7 @@ using orb::platform::ItemInfo;
 using orb::platform::ItemKind;
 using orb::platform::ItemRecord;
 using orb::platform::Items;
+using orb::platform::PathText;
 using orb::platform::Result;
 using orb::platform::Status;
 using orb::platform::Timestamp;
@@ -38,13 +36,6 @@ OrbResult FailureCode(const Error& error) {
   return code == kOrbNoErr ? kOrbErrNoSuchFile : code;
 }
 
-std::optional<std::string> ItemPath(CFStringRef text) {
-  if (text == nullptr) return std::nullopt;
-  COrbStringData fullPath;
-  fullPath.InitWithCFString(text);
-  return orb::ItemPath(fullPath);
-}
-
 /// The last component as it is stored; the root is its own.
 std::string_view NameOf(std::string_view path) {
   const std::size_t last = path.find_last_not_of('/');
@@ -54,7 +45,7 @@ std::string_view NameOf(std::string_view path) {
 }
 
 /// A link that leads nowhere is an entry that can be read, and yet does not exist.
-bool Exists(const std::string& path, const Result<ItemInfo>& info) {
+bool Exists(const char* path, const Result<ItemInfo>& info) {
   if (info && info.Value().kind != ItemKind::kLink) return true;
   return Items::Current().Exists(path);
 }
@@ -83,11 +74,12 @@ unsigned int RecordedAttributes(const ItemRecord& item) {
 
 OrbResult SetTime(const COrbFileHandle& handle,
                   const COrbTime& time,
-                  Status (Items::*set)(const std::string&, Timestamp) const) {
+                  Status (Items::*set)(PathText, Timestamp) const) {
   if (handle.IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> path = orb::ItemPath(handle.GetFullPath());
-  if (!path) return kOrbErrNoSuchFile;
-  const Status status = (Items::Current().*set)(*path, orb::TimestampOf(time.GetUTCTime()));
+  const COrbStringData fullPath = handle.GetFullPath();
+  const char* path = orb::ItemPathInPlace(fullPath);
+  if (path == nullptr) return kOrbErrNoSuchFile;
+  const Status status = (Items::Current().*set)(path, orb::TimestampOf(time.GetUTCTime()));
   return status ? kOrbNoErr : FailureCode(status.Reason());
 }
 
@@ -100,13 +92,6 @@ bool IsFolder(const COrbStringData& path) {
 std::string_view WithoutOneSeparator(std::string_view path) {
   if (path.ends_with('/')) path.remove_suffix(1);
   return path;
-}
-
-bool IsEqualWithoutCase(std::string_view a, std::string_view b) {
-  if (a == b) return true;
-  const auto unitsA = orb::platform::Utf16FromUtf8(a);
-  const auto unitsB = orb::platform::Utf16FromUtf8(b);
-  return unitsA && unitsB && orb::platform::CompareFolded(*unitsA, *unitsB) == 0;
 }
 
 }  // namespace
@@ -145,7 +130,6 @@ void COrbFileHandle::Free() {
   COrbFilePath::Free();
   collected = false;
   actualName.Clear();
-  displayName.Clear();
 }
 
 bool COrbFileHandle::IsEmpty() const { return COrbFilePath::IsEmpty(); }
@@ -156,16 +140,18 @@ OrbResult COrbFileHandle::Update() {
 
 OrbResult COrbFileHandle::CollectFileInformatioin() const {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(GetFullPath());
-  if (!itemPath) return kOrbErrNoSuchFile;
-  const Pass pass{*itemPath, Items::Current().Read(*itemPath)};
-  return Exists(*itemPath, pass.answer) ? Keep(pass) : kOrbErrNoSuchFile;
+  const char* itemPath = orb::ItemPathInPlace(path);
+  if (itemPath == nullptr) return kOrbErrNoSuchFile;
+  const Pass pass{itemPath, Items::Current().Read(itemPath)};
+  return Exists(itemPath, pass.answer) ? Keep(pass) : kOrbErrNoSuchFile;
 }
 
 OrbResult COrbFileHandle::SetCatalogInfo(CFStringRef fullPath) const {
-  const std::optional<std::string> itemPath = ItemPath(fullPath);
-  if (!itemPath) return Keep({{}, orb::platform::kNoSuchItem});
-  return Keep({*itemPath, Items::Current().Read(*itemPath)});
+  COrbStringData text;
+  text.InitWithCFString(fullPath);
+  const char* itemPath = orb::ItemPathInPlace(text);
+  if (itemPath == nullptr) return Keep({{}, orb::platform::kNoSuchItem});
+  return Keep({itemPath, Items::Current().Read(itemPath)});
 }
 
 /// A pass that fails half-way leaves what it has found up to there, and whether anything is
@@ -182,7 +168,6 @@ OrbResult COrbFileHandle::Keep(const Pass& pass) const {
   modificationTime = orb::UtcOf(info.modified);
   creationTime = orb::UtcOf(info.created);
   actualName = StringAccess::FromUtf8(NameOf(pass.path));
-  displayName = actualName;
   const bool hasType = !isFolder && info.kind != ItemKind::kLink;
   fileType = hasType ? GetFileType(actualName) : eOrbFileType_Unknown;
   collected = true;
@@ -197,7 +182,6 @@ void COrbFileHandle::CopyCollected(const COrbFileHandle& other) {
   collected = other.collected;
   if (!collected) return;
   actualName = other.actualName;
-  displayName = other.displayName;
   attributes = other.attributes;
   fileType = other.fileType;
   fileSize = other.fileSize;
@@ -205,7 +189,7 @@ void COrbFileHandle::CopyCollected(const COrbFileHandle& other) {
   modificationTime = other.modificationTime;
 }
 
-bool COrbFileHandle::IsExist() const { return orb::ItemExists(GetFullPath()); }
+bool COrbFileHandle::IsExist() const { return orb::ItemExists(path); }
 
 unsigned int COrbFileHandle::GetAttribute() const {
   return EnsureCollected() == kOrbNoErr ? attributes : 0;
@@ -219,11 +203,7 @@ std::uint64_t COrbFileHandle::GetFileSize() const {
   return EnsureCollected() == kOrbNoErr ? fileSize : 0;
 }
 
-OrbResult COrbFileHandle::GetDisplayName(COrbStringData& name) const {
-  if (EnsureCollected() != kOrbNoErr) return kOrbErrNotFound;
-  name = displayName;
-  return kOrbNoErr;
-}
+OrbResult COrbFileHandle::GetDisplayName(COrbStringData& name) const { return GetActualName(name); }
 
 OrbResult COrbFileHandle::GetActualName(COrbStringData& name) const {
   if (EnsureCollected() != kOrbNoErr) return kOrbErrNotFound;
@@ -233,22 +213,20 @@ OrbResult COrbFileHandle::GetActualName(COrbStringData& name) const {
 
 OrbResult COrbFileHandle::SetAttribute(unsigned int flags) {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(GetFullPath());
-  if (!itemPath) return kOrbErrNoSuchFile;
+  const char* itemPath = orb::ItemPathInPlace(path);
+  if (itemPath == nullptr) return kOrbErrNoSuchFile;
   const unsigned int locked = flags & kOrbFileAttrLocked;
-  const Status status = Items::Current().SetLocked(*itemPath, locked != 0);
+  const Status status = Items::Current().SetLocked(itemPath, locked != 0);
   if (!status) return FailureCode(status.Reason());
   attributes = (attributes & ~kOrbFileAttrLocked) | locked;
   return kOrbNoErr;
 }
 
 bool COrbFileHandle::IsEqual(const COrbFileHandle& other) const {
-  const COrbStringData ours = GetFullPath();
-  const COrbStringData theirs = other.GetFullPath();
-  const std::string_view a = StringAccess::Read(ours).Readable();
-  const std::string_view b = StringAccess::Read(theirs).Readable();
+  const std::string_view a = StringAccess::Read(path).Readable();
+  const std::string_view b = StringAccess::Read(other.path).Readable();
   if (a.empty() || b.empty()) return false;
-  return IsEqualWithoutCase(WithoutOneSeparator(a), WithoutOneSeparator(b));
+  return orb::CompareFolded({WithoutOneSeparator(a)}, {WithoutOneSeparator(b)}) == 0;
 }
 
 OrbResult COrbFileHandle::GetCreateTime(COrbTime* time) const {
@@ -271,9 +249,9 @@ UTCDateTime COrbFileHandle::GetUpdateTime() const {
 
 OrbResult COrbFileHandle::GetAccessTime(COrbTime* time) const {
   if (IsEmpty()) return kOrbErrNoSuchFile;
-  const std::optional<std::string> itemPath = orb::ItemPath(GetFullPath());
-  if (!itemPath) return kOrbErrNoSuchFile;
-  const Result<Timestamp> accessed = Items::Current().AccessTime(*itemPath);
+  const char* itemPath = orb::ItemPathInPlace(path);
+  if (itemPath == nullptr) return kOrbErrNoSuchFile;
+  const Result<Timestamp> accessed = Items::Current().AccessTime(itemPath);
   if (!accessed) return FailureCode(accessed.Reason());
   if (time == nullptr) return kOrbErrNotFound;
   *time = static_cast<unsigned long long>(orb::TicksOf(accessed.Value()));
@@ -291,9 +269,9 @@ OrbResult COrbFileHandle::SetUpdateTime(const COrbTime& time) {
 OrbResult COrbFileHandle::SetAccessTime(const COrbTime&) { return kOrbErrNotSupported; }
 
 unsigned int COrbFileHandle::GetAttribute(const COrbStringData& fullPath) {
-  const std::optional<std::string> path = orb::ItemPath(fullPath);
-  if (!path) return FailureCode(orb::platform::kNoSuchItem);
-  const Result<ItemRecord> item = Items::Current().ReadRecord(*path);
+  const char* path = orb::ItemPathInPlace(fullPath);
+  if (path == nullptr) return FailureCode(orb::platform::kNoSuchItem);
+  const Result<ItemRecord> item = Items::Current().ReadRecord(path);
   return item ? RecordedAttributes(item.Value()) : FailureCode(item.Reason());
 }
 

@@ -6,15 +6,19 @@
 
 namespace orb {
 
+const char* ItemPathInPlace(const COrbStringData& fullPath) {
+  if (StringAccess::Read(fullPath).scan.kind == TextKind::kInvalid) return nullptr;
+  return fullPath.GetPtrUtf8();
+}
+
 std::optional<std::string> ItemPath(const COrbStringData& fullPath) {
-  const Utf8Text text = StringAccess::Read(fullPath);
-  if (text.scan.kind == TextKind::kInvalid) return std::nullopt;
-  return std::string(text.bytes);
+  const char* path = ItemPathInPlace(fullPath);
+  return path == nullptr ? std::nullopt : std::optional<std::string>(path);
 }
 
 bool ItemExists(const COrbStringData& fullPath) {
-  const std::optional<std::string> path = ItemPath(fullPath);
-  return path && !path->empty() && platform::Items::Current().Exists(*path);
+  const char* path = ItemPathInPlace(fullPath);
+  return path != nullptr && *path != '\0' && platform::Items::Current().Exists(path);
 }
 
 }  // namespace orb

@@ -12,6 +12,9 @@ namespace orb {
 /// valid UTF-8: no item can be reached through it.
 std::optional<std::string> ItemPath(const COrbStringData& fullPath);
 
+/// The same in place, null instead of nothing; valid while the string's value lives.
+const char* ItemPathInPlace(const COrbStringData& fullPath);
+
 /// Whether something exists at the path now, following links.
 bool ItemExists(const COrbStringData& fullPath);
 

@@ -7,7 +7,7 @@
 #include <array>
 #include <cstdint>
 #include <iterator>
-#include <optional>
+#include <string_view>
 #include <utility>
 
 #include "strings/string_access.h"
@@ -16,29 +16,35 @@ namespace {
 
 using orb::StringAccess;
 
-/// An extension of up to eight ASCII characters as one number. Numbers order as the texts do.
-using PackedExtension = std::uint64_t;
-constexpr std::size_t kMostCharacters = sizeof(PackedExtension);
+constexpr unsigned char Byte(char character) { return static_cast<unsigned char>(character); }
 
-constexpr unsigned char LowerAscii(char character) {
-  const auto byte = static_cast<unsigned char>(character);
-  return byte >= 'A' && byte <= 'Z' ? static_cast<unsigned char>(byte + ('a' - 'A')) : byte;
+/// The lower-case letters of an extension with its dot as one number. Every known one has four or
+/// five bytes.
+using PackedExtension = std::uint64_t;
+constexpr PackedExtension kEveryByte = 0x01'01'01'01'01;
+
+constexpr bool HasPackableSize(std::string_view dotted) {
+  return dotted.size() == 4 || dotted.size() == 5;
 }
 
-constexpr PackedExtension Pack(std::string_view extension) {
+/// All bytes at once; each must be ASCII, so that none carries into the next.
+constexpr PackedExtension LowerAscii(PackedExtension packed) {
+  const PackedExtension fromA = packed + kEveryByte * (0x80 - 'A');
+  const PackedExtension beyondZ = packed + kEveryByte * (0x80 - 'Z' - 1);
+  return packed | (fromA & ~beyondZ & kEveryByte * 0x80) >> 2;
+}
+
+constexpr PackedExtension Pack(std::string_view dotted) {
   PackedExtension packed = 0;
-  for (const char character : extension) packed = packed << 8 | LowerAscii(character);
-  return packed << 8 * (kMostCharacters - extension.size());
+  for (std::size_t i = 0; i < 4; ++i) packed |= PackedExtension{Byte(dotted[i])} << 8 * i;
+  // The last of four again, or the fifth: no branch for the two sizes.
+  return packed | PackedExtension{Byte(dotted.back())} << 8 * (dotted.size() - 1);
 }
 
 struct Row {
-  constexpr Row(const char* extensionWithDot, eOrbFileType itsType)
-      : dotted(extensionWithDot), packed(Pack(Extension())), type(itsType) {}
+  constexpr std::string_view Extension() const { return dotted; }
 
-  constexpr std::string_view Extension() const { return std::string_view(dotted).substr(1); }
-
-  const char* dotted;
-  PackedExtension packed;
+  char dotted[6];  // No pointer, so that loading the library has nothing to relocate.
   eOrbFileType type;
 };
 
@@ -57,49 +63,77 @@ constexpr Row kRows[] = {
 };
 static_assert(std::size(kRows) == 30);
 static_assert(std::is_sorted(std::begin(kRows), std::end(kRows), [](const Row& a, const Row& b) {
-  return a.packed < b.packed;
+  return a.Extension() < b.Extension();
 }));
 
-bool IsAscii(std::string_view text) {
-  return std::all_of(
-      text.begin(), text.end(), [](char c) { return static_cast<unsigned char>(c) < 0x80; });
-}
+/// Finds a row by its packed extension in one step: a multiplication that sends every known
+/// extension to a slot of its own.
+class RowIndex {
+ public:
+  constexpr RowIndex() {
+    while (!Fill()) multiplier_ += 0x9E37'79B9'7F4A'7C16;  // Even, so the multiplier stays odd.
+  }
 
-eOrbFileType TypeOfAscii(std::string_view extension) {
-  if (extension.size() > kMostCharacters) return eOrbFileType_Unknown;
-  const PackedExtension packed = Pack(extension);
-  const Row* row = std::lower_bound(
-      std::begin(kRows), std::end(kRows), packed, [](const Row& each, PackedExtension wanted) {
-        return each.packed < wanted;
-      });
-  return row != std::end(kRows) && row->packed == packed ? row->type : eOrbFileType_Unknown;
+  constexpr eOrbFileType TypeOf(PackedExtension packed) const {
+    const Slot& slot = slots_[SlotOf(packed)];
+    return slot.packed == packed ? slot.type : eOrbFileType_Unknown;
+  }
+
+ private:
+  struct Slot {
+    PackedExtension packed = 0;
+    eOrbFileType type = eOrbFileType_Unknown;
+  };
+
+  constexpr std::size_t SlotOf(PackedExtension packed) const { return packed * multiplier_ >> 57; }
+
+  constexpr bool Fill() {
+    slots_ = {};
+    for (const Row& row : kRows) {
+      const PackedExtension packed = Pack(row.Extension());
+      Slot& slot = slots_[SlotOf(packed)];
+      if (slot.packed != 0) return false;
+      slot = {packed, row.type};
+    }
+    return true;
+  }
+
+  std::uint64_t multiplier_ = 1;
+  std::array<Slot, 128> slots_;
+};
+constexpr RowIndex kRowIndex;
+
+bool IsAscii(std::string_view text) {
+  return std::all_of(text.begin(), text.end(), [](char c) { return Byte(c) < 0x80; });
 }
 
 /// A few characters beyond ASCII fold to ASCII letters: the long s, the ligature ff.
-eOrbFileType TypeOfFolded(std::string_view extension) {
-  const COrbStringData text = StringAccess::FromUtf8(extension);
+eOrbFileType TypeOfFolded(std::string_view dotted) {
+  const COrbStringData text = StringAccess::FromUtf8(dotted);
   if (StringAccess::Read(text).Readable().empty()) return eOrbFileType_Unknown;
   for (const Row& row : kRows) {
-    const COrbStringData known = StringAccess::FromUtf8(row.Extension());
-    if (OrbStringDataCmpi(text, known) == 0) return row.type;
+    if (OrbStringDataCmpi(text, StringAccess::FromUtf8(row.dotted)) == 0) return row.type;
   }
   return eOrbFileType_Unknown;
+}
+
+eOrbFileType TypeOfExtension(std::string_view dotted) {
+  if (HasPackableSize(dotted)) {
+    const PackedExtension packed = Pack(dotted);
+    if ((packed & kEveryByte * 0x80) == 0) return kRowIndex.TypeOf(LowerAscii(packed));
+  }
+  return IsAscii(dotted) ? eOrbFileType_Unknown : TypeOfFolded(dotted);
 }
 
 }  // namespace
 
 namespace orb {
 
-eOrbFileType TypeOfExtension(std::string_view extension) {
-  return IsAscii(extension) ? TypeOfAscii(extension) : TypeOfFolded(extension);
-}
-
 eOrbFileType FileTypeOfName(const COrbStringData& name) {
   if (name.IsEmpty()) return eOrbFileType_Unknown;
   const std::string_view text = StringAccess::Read(name).Readable();
   const std::size_t dot = text.rfind('.');
-  if (dot == std::string_view::npos) return eOrbFileType_Unknown;
-  return TypeOfExtension(text.substr(dot + 1));
+  return dot == std::string_view::npos ? eOrbFileType_Unknown : TypeOfExtension(text.substr(dot));
 }
 
 }  // namespace orb
@@ -107,14 +141,13 @@ eOrbFileType FileTypeOfName(const COrbStringData& name) {
 eOrbFileType OrbPathConvertExtensionToType(const COrbStringData& extension) {
   if (extension.IsEmpty()) return eOrbFileType_Unknown;
   const char* text = extension.GetPtrUtf8();
-  if (text == nullptr || text[0] != '.') return eOrbFileType_Unknown;
-  return orb::TypeOfExtension(text + 1);
+  return text == nullptr ? eOrbFileType_Unknown : TypeOfExtension(text);
 }
 
 OrbResult OrbPathFindTypeExtension(eOrbFileType type, std::vector<COrbStringData>& extensions) {
   std::vector<COrbStringData> found;
   for (const Row& row : kRows) {
-    if (row.type == type) found.push_back(OrbCharUtf8(row.dotted));
+    if (row.type == type) found.push_back(StringAccess::FromUtf8(row.dotted));
   }
   if (found.empty()) return kOrbErrNotFound;
   extensions = std::move(found);

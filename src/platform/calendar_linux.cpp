@@ -3,11 +3,11 @@
 
 #include <sys/stat.h>
 #include <time.h>
+#include <unistd.h>
 
-#include <algorithm>
 #include <array>
-#include <cstdlib>
 #include <cstring>
+#include <string_view>
 
 namespace orb::platform {
 namespace {
@@ -18,18 +18,20 @@ constexpr int kBlockBits = 24;
 constexpr std::int64_t kBlockLength = std::int64_t{1} << kBlockBits;
 // Three days. No zone of the tz database has changed its offset twice within less than 3.98 days
 // since 1900, so two probes that differ have one change between them and two that agree have none.
+// (A rule in TZ itself could: a summer time of less than three days may be missed.)
 constexpr std::int64_t kProbeDistance = std::int64_t{1} << 18;
 // More than any zone is ahead of or behind GMT, and less than half of the distance above.
 constexpr std::int64_t kFarthestOffset = 26 * 3600;
 
 constexpr std::int64_t kNoBlock = INT64_MIN;
-constexpr int kMostChanges = 4;
+constexpr std::int64_t kNoChange = INT64_MAX;
+constexpr std::size_t kMostChanges = 4;
 
 /// What to add to the instants of one block to get local time.
 struct Block {
   std::int64_t index = kNoBlock;
-  int changes = 0;  // More than kMostChanges: too many to keep, every instant is asked for.
-  std::array<std::int64_t, kMostChanges> at{};
+  std::size_t changes = 0;  // Above kMostChanges: too many to keep, every instant is asked for.
+  std::array<std::int64_t, kMostChanges> at{kNoChange, kNoChange, kNoChange, kNoChange};
   std::array<std::int32_t, kMostChanges + 1> offsets{};
 };
 
@@ -57,12 +59,10 @@ std::int64_t FindChange(std::int64_t begin, std::int64_t end, std::int32_t offse
 }
 
 void AddChange(Block* block, std::int64_t at, std::int32_t offset) {
-  if (block->changes < kMostChanges) {
-    const auto position = static_cast<std::size_t>(block->changes);
-    block->at[position] = at;
-    block->offsets[position + 1] = offset;
-  }
-  ++block->changes;
+  const std::size_t position = block->changes++;
+  if (position >= kMostChanges) return;
+  block->at[position] = at;
+  block->offsets[position + 1] = offset;
 }
 
 Block Survey(std::int64_t index) {
@@ -83,19 +83,58 @@ Block Survey(std::int64_t index) {
 
 std::int32_t OffsetIn(const Block& block, std::int64_t instant) {
   if (block.changes > kMostChanges) return AskOffset(instant);
-  std::size_t position = 0;
-  while (position < static_cast<std::size_t>(block.changes) && instant >= block.at[position]) {
-    ++position;
-  }
-  return block.offsets[position];
+  std::size_t passed = 0;  // Counted without a branch, which instants at random would mislead.
+  for (const std::int64_t at : block.at) passed += instant >= at ? 1 : 0;
+  return block.offsets[passed];
 }
+
+/// TZ in the environment. It remembers where TZ stands, because a search on every conversion would
+/// cost more than the conversion. Where there is no TZ it remembers the last entry: a new one comes
+/// behind it.
+class TzEntry {
+ public:
+  /// Null when TZ is not set.
+  const char* Value() {
+    if (!IsWhereItWas()) Find();
+    return isSet_ ? entry_ + kName.size() : nullptr;
+  }
+  void Forget() { environment_ = nullptr; }
+
+ private:
+  static constexpr std::string_view kName = "TZ=";
+
+  bool IsWhereItWas() const {
+    if (environment_ == nullptr || environ != environment_) return false;
+    return environ[position_] == entry_ && (entry_ == nullptr || environ[position_ + 1] == next_);
+  }
+
+  void Find() {
+    *this = TzEntry();
+    environment_ = environ;
+    if (environment_ == nullptr) return;
+    for (std::size_t i = 0; !isSet_ && environment_[i] != nullptr; ++i) Remember(i);
+  }
+
+  void Remember(std::size_t position) {
+    position_ = position;
+    entry_ = environment_[position];
+    next_ = environment_[position + 1];
+    isSet_ = std::string_view(entry_).starts_with(kName);
+  }
+
+  char** environment_ = nullptr;
+  std::size_t position_ = 0;
+  const char* entry_ = nullptr;
+  const char* next_ = nullptr;
+  bool isSet_ = false;
+};
 
 /// Tells whether the zone is still the one that it was.
 class ZoneWatch {
  public:
   /// True on the first call.
   bool Changed() {
-    const char* name = std::getenv("TZ");
+    const char* name = tz_.Value();
     return name == nullptr ? SystemZoneChanged() : NamedZoneChanged(name);
   }
 
@@ -115,6 +154,7 @@ class ZoneWatch {
     ::clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
     if (source_ == Source::kSystem && now.tv_sec == lookedAt_) return false;
     lookedAt_ = now.tv_sec;
+    tz_.Forget();
     return SystemZoneFileChanged();
   }
 
@@ -128,6 +168,7 @@ class ZoneWatch {
     return !same;
   }
 
+  TzEntry tz_;
   Source source_ = Source::kNone;
   std::array<char, 128> name_{};
   time_t lookedAt_ = 0;

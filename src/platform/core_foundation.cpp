@@ -3,7 +3,8 @@
 
 #include <atomic>
 #include <cstring>
-#include <new>
+#include <exception>
+#include <limits>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -17,6 +18,14 @@ using orb::platform::MacRomanFromUtf16;
 using orb::platform::Utf16FromUtf8;
 using orb::platform::Utf8FromMacRoman;
 using orb::platform::Utf8FromUtf16;
+
+/// What `make` gives, or null when memory runs out: no exception may leave a C function.
+template <typename Make>
+auto NullWithoutMemory(Make make) noexcept -> decltype(make()) try {
+  return make();
+} catch (const std::exception&) {
+  return nullptr;
+}
 
 }  // namespace
 
@@ -59,17 +68,21 @@ CFIndex CFGetRetainCount(CFTypeRef object) {
 
 CFStringRef CFStringCreateWithCString(CFAllocatorRef, const char* text, CFStringEncoding encoding) {
   if (text == nullptr) return nullptr;
-  std::optional<std::u16string> units;
-  if (encoding == kCFStringEncodingUTF8) units = Utf16FromUtf8(text);
-  if (encoding == kCFStringEncodingMacRoman) units = Utf16FromUtf8(Utf8FromMacRoman(text));
-  return units ? new (std::nothrow) __CFString(*std::move(units)) : nullptr;
+  return NullWithoutMemory([=]() -> CFStringRef {
+    std::optional<std::u16string> units;
+    if (encoding == kCFStringEncodingUTF8) units = Utf16FromUtf8(text);
+    if (encoding == kCFStringEncodingMacRoman) units = Utf16FromUtf8(Utf8FromMacRoman(text));
+    return units ? new __CFString(*std::move(units)) : nullptr;
+  });
 }
 
 CFStringRef CFStringCreateWithCharacters(CFAllocatorRef, const UniChar* characters, CFIndex count) {
   if ((characters == nullptr && count != 0) || count < 0) return nullptr;
-  std::u16string units(static_cast<std::size_t>(count), u'\0');
-  if (count != 0) std::memcpy(units.data(), characters, units.size() * sizeof(UniChar));
-  return new (std::nothrow) __CFString(std::move(units));
+  return NullWithoutMemory([=]() -> CFStringRef {
+    std::u16string units(static_cast<std::size_t>(count), u'\0');
+    if (count != 0) std::memcpy(units.data(), characters, units.size() * sizeof(UniChar));
+    return new __CFString(std::move(units));
+  });
 }
 
 CFStringRef CFStringCreateCopy(CFAllocatorRef, CFStringRef text) {
@@ -80,30 +93,49 @@ CFIndex CFStringGetLength(CFStringRef text) {
   return text == nullptr ? 0 : static_cast<CFIndex>(text->text.size());
 }
 
+namespace {
+
+struct Encoded {
+  std::string bytes;
+  bool isExact;
+};
+
+/// Nothing for an encoding that is not known, and without memory.
+std::optional<Encoded> Encode(std::u16string_view text, CFStringEncoding encoding) noexcept try {
+  if (encoding == kCFStringEncodingUTF8) return Encoded{Utf8FromUtf16(text), true};
+  if (encoding != kCFStringEncodingMacRoman) return std::nullopt;
+  orb::platform::MacRomanText made = MacRomanFromUtf16(text);
+  return Encoded{std::move(made.bytes), made.isExact};
+} catch (const std::exception&) {
+  return std::nullopt;
+}
+
+}  // namespace
+
 Boolean CFStringGetCString(CFStringRef text,
                            char* buffer,
                            CFIndex size,
                            CFStringEncoding encoding) {
   if (text == nullptr || buffer == nullptr || size <= 0) return 0;
-  if (encoding != kCFStringEncodingUTF8 && encoding != kCFStringEncodingMacRoman) return 0;
-  const std::string bytes =
-      encoding == kCFStringEncodingUTF8 ? Utf8FromUtf16(text->text) : MacRomanFromUtf16(text->text);
-  if (bytes.size() >= static_cast<std::size_t>(size)) return 0;
-  std::memcpy(buffer, bytes.c_str(), bytes.size() + 1);
-  return 1;
+  const std::optional<Encoded> encoded = Encode(text->text, encoding);
+  if (!encoded || encoded->bytes.size() >= static_cast<std::size_t>(size)) return 0;
+  std::memcpy(buffer, encoded->bytes.c_str(), encoded->bytes.size() + 1);
+  return encoded->isExact ? 1 : 0;
 }
 
 void CFStringGetCharacters(CFStringRef text, CFRange range, UniChar* buffer) {
-  if (text == nullptr || buffer == nullptr || range.length <= 0) return;
+  if (text == nullptr || buffer == nullptr || range.location < 0 || range.length <= 0) return;
+  if (range.location > CFStringGetLength(text) - range.length) return;
   std::memcpy(buffer,
               text->text.data() + range.location,
               static_cast<std::size_t>(range.length) * sizeof(UniChar));
 }
 
 CFIndex CFStringGetMaximumSizeForEncoding(CFIndex length, CFStringEncoding encoding) {
-  if (encoding == kCFStringEncodingUTF8) return length * 3;
+  if (length < 0) return -1;
   if (encoding == kCFStringEncodingMacRoman) return length;
-  return -1;
+  const bool fits = length <= std::numeric_limits<CFIndex>::max() / 3;
+  return encoding == kCFStringEncodingUTF8 && fits ? length * 3 : -1;
 }
 
 CFStringEncoding CFStringGetSystemEncoding() { return kCFStringEncodingMacRoman; }
@@ -113,12 +145,14 @@ CFURLRef CFURLCreateWithFileSystemPath(CFAllocatorRef,
                                        CFURLPathStyle style,
                                        Boolean) {
   if (path == nullptr || style != kCFURLPOSIXPathStyle) return nullptr;
-  return new (std::nothrow) __CFURL(path->text);
+  return NullWithoutMemory([=]() -> CFURLRef { return new __CFURL(path->text); });
 }
 
 CFStringRef CFURLCopyFileSystemPath(CFURLRef url, CFURLPathStyle style) {
   if (url == nullptr || style != kCFURLPOSIXPathStyle) return nullptr;
-  std::u16string path = url->path;
-  while (path.size() > 1 && path.back() == u'/') path.pop_back();
-  return new (std::nothrow) __CFString(std::move(path));
+  return NullWithoutMemory([=]() -> CFStringRef {
+    std::u16string path = url->path;
+    while (path.size() > 1 && path.back() == u'/') path.pop_back();
+    return new __CFString(std::move(path));
+  });
 }

@@ -58,7 +58,8 @@ OSStatus FSPathMakeRef(const UInt8* path, FSRef* ref, Boolean* isDirectory) {
 OSStatus FSRefMakePath(const FSRef* ref, UInt8* path, UInt32 maxPathSize) {
   if (ref == nullptr || path == nullptr) return kBadParameter;
   const std::string_view text = PathIn(*ref);
-  if (text.empty() || text.size() == sizeof(ref->hidden)) return kBadParameter;  // Never made.
+  const bool wasMade = text.starts_with('/') && text.size() < sizeof(ref->hidden);
+  if (!wasMade) return kBadParameter;
   if (text.size() >= maxPathSize) return kPathTooLong;
   std::memcpy(path, text.data(), text.size());
   path[text.size()] = 0;

@@ -60,6 +60,18 @@ bool MayWrite(const ItemRecord& item, std::uint32_t user, std::span<const std::u
 /// What CreateFolders() makes of a folder that is there already.
 enum class IfExists { kFail, kAccept };
 
+/// A path as the system takes it, zero-terminated. It lives as long as what it was made from.
+class PathText {
+ public:
+  PathText(const char* path) : path_(path) {}
+  PathText(const std::string& path) : path_(path.c_str()) {}
+
+  const char* Get() const { return path_; }
+
+ private:
+  const char* path_;
+};
+
 /// The service. Everything may be called from any thread.
 class Items {
  public:
@@ -69,26 +81,26 @@ class Items {
   virtual ~Items() = default;
 
   /// Whether something exists there, following links: a link that leads nowhere does not.
-  virtual bool Exists(const std::string& path) const = 0;
-  virtual Result<ItemInfo> Read(const std::string& path) const = 0;
-  virtual Result<ItemRecord> ReadRecord(const std::string& path) const = 0;
-  virtual Result<Timestamp> AccessTime(const std::string& path) const = 0;
+  virtual bool Exists(PathText path) const = 0;
+  virtual Result<ItemInfo> Read(PathText path) const = 0;
+  virtual Result<ItemRecord> ReadRecord(PathText path) const = 0;
+  virtual Result<Timestamp> AccessTime(PathText path) const = 0;
 
   /// Locking what is locked and unlocking what is not succeeds. Unlocking clears every form of the
   /// lock or fails. The owner needs no write permission.
-  virtual Status SetLocked(const std::string& path, bool locked) const = 0;
+  virtual Status SetLocked(PathText path, bool locked) const = 0;
   /// Refused for a locked item, and for a time that the volume cannot hold; the item then keeps its
   /// time.
-  virtual Status SetModified(const std::string& path, Timestamp time) const = 0;
-  virtual Status SetCreated(const std::string& path, Timestamp time) const = 0;
+  virtual Status SetModified(PathText path, Timestamp time) const = 0;
+  virtual Status SetCreated(PathText path, Timestamp time) const = 0;
 
   /// A new empty file takes the place of what is there in one step: a link is replaced and not
   /// written through. A locked item and a folder are refused.
-  virtual Status ReplaceByEmptyFile(const std::string& path) const = 0;
+  virtual Status ReplaceByEmptyFile(PathText path) const = 0;
   /// kItemExists when anything is there, also a link that leads nowhere.
-  virtual Status CreateEmptyFile(const std::string& path) const = 0;
+  virtual Status CreateEmptyFile(PathText path) const = 0;
   /// Makes missing folders on the way too. All with the usual mode, 0777 less the process's mask.
-  virtual Status CreateFolders(const std::string& path, IfExists ifExists) const = 0;
+  virtual Status CreateFolders(PathText path, IfExists ifExists) const = 0;
 };
 
 /// Puts other items in place of the current ones while it lives. For tests; not while another

@@ -51,12 +51,12 @@ bool Permits(const char* path, int access, int flags) {
   return Retry([&] { return ::faccessat(AT_FDCWD, path, access, AT_EACCESS | flags); }) == 0;
 }
 
-bool IsPackage(const std::string& path) {
+bool IsPackage(const char* path) {
   const std::string_view name = LastComponent(path);
   for (const std::string_view extension : kPackageExtensions) {
     if (HasExtension(name, extension)) return true;
   }
-  return Permits((path + kPackageMark).c_str(), F_OK, 0);
+  return Permits((std::string(path) + kPackageMark).c_str(), F_OK, 0);
 }
 
 std::vector<std::uint32_t> ReadGroups() {
@@ -125,8 +125,8 @@ void AskTheVolume(ItemInfo& info,
 // --- Changes
 
 /// Opens an item for a change of what a lock protects.
-Result<UniqueFd> OpenUnlocked(const std::string& path) {
-  UniqueFd item = OpenItem(path.c_str());
+Result<UniqueFd> OpenUnlocked(const char* path) {
+  UniqueFd item = OpenItem(path);
   if (!item) return LastError();
   if (const Status refused = RefuseLocked(item.Get()); !refused) return refused.Reason();
   return item;
@@ -232,9 +232,9 @@ std::size_t NextEnd(std::string_view path, std::size_t end) {
   return std::min(path.find('/', begin), path.size());
 }
 
-bool IsFolder(const std::string& path) {
+bool IsFolder(const char* path) {
   struct stat status;
-  return ::stat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode);
+  return ::stat(path, &status) == 0 && S_ISDIR(status.st_mode);
 }
 
 /// Creates the folders on the way to `path` that are missing, and then the last one.
@@ -254,14 +254,14 @@ Status CreateWithParents(const std::string& path) {
 
 class SystemItems final : public Items {
  public:
-  bool Exists(const std::string& path) const override {
+  bool Exists(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
-    return Permits(path.c_str(), F_OK, 0);
+    return Permits(path.Get(), F_OK, 0);
   }
 
-  Result<ItemRecord> ReadRecord(const std::string& path) const override {
+  Result<ItemRecord> ReadRecord(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
-    const ItemRef item(path.c_str());
+    const ItemRef item(path.Get());
     const Result<StatusRecord> status = ReadStatus(item);
     if (!status) return status.Reason();
     const Result<OwnAttributes> own = FindOwnAttributes(item);
@@ -269,14 +269,14 @@ class SystemItems final : public Items {
     ItemInfo info;
     FillRecord(info, item, status.Value(), own.Value());
     if (MayShowReadOnlyAttribute(status.Value())) {
-      AskTheVolume(info, path.c_str(), status.Value(), own.Value());
+      AskTheVolume(info, path.Get(), status.Value(), own.Value());
     }
     return ItemRecord(info);
   }
 
-  Result<ItemInfo> Read(const std::string& path) const override {
+  Result<ItemInfo> Read(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
-    const ItemRef item(path.c_str());
+    const ItemRef item(path.Get());
     const Result<StatusRecord> status = ReadStatus(item);
     if (!status) return status.Reason();
     const Result<OwnAttributes> own = FindOwnAttributes(item);
@@ -284,32 +284,32 @@ class SystemItems final : public Items {
     ItemInfo info;
     FillRecord(info, item, status.Value(), own.Value());
     info.mayWrite = CallerMayWrite(info);
-    info.readable = IsReadableOnWritableVolume(path.c_str(), info);
+    info.readable = IsReadableOnWritableVolume(path.Get(), info);
     if (!info.readable) {
-      info.readable = Permits(path.c_str(), R_OK, AT_SYMLINK_NOFOLLOW);
-      AskTheVolume(info, path.c_str(), status.Value(), own.Value());
+      info.readable = Permits(path.Get(), R_OK, AT_SYMLINK_NOFOLLOW);
+      AskTheVolume(info, path.Get(), status.Value(), own.Value());
     }
-    info.isPackage = info.kind == ItemKind::kFolder && IsPackage(path);
+    info.isPackage = info.kind == ItemKind::kFolder && IsPackage(path.Get());
     return info;
   }
 
-  Result<Timestamp> AccessTime(const std::string& path) const override {
+  Result<Timestamp> AccessTime(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
-    const Result<StatusRecord> status = ReadStatus(ItemRef(path.c_str()));
+    const Result<StatusRecord> status = ReadStatus(ItemRef(path.Get()));
     if (!status) return status.Reason();
     return LastAccessTime(status.Value());
   }
 
-  Status SetLocked(const std::string& path, bool locked) const override {
+  Status SetLocked(PathText path, bool locked) const override {
     const ErrnoKeeper errnoKeeper;
-    const UniqueFd item = OpenItem(path.c_str());
+    const UniqueFd item = OpenItem(path.Get());
     if (!item) return LastError();
     return platform::SetLocked(item.Get(), locked);
   }
 
-  Status SetModified(const std::string& path, Timestamp time) const override {
+  Status SetModified(PathText path, Timestamp time) const override {
     const ErrnoKeeper errnoKeeper;
-    const Result<UniqueFd> item = OpenUnlocked(path);
+    const Result<UniqueFd> item = OpenUnlocked(path.Get());
     if (!item) return item.Reason();
     const int fd = item.Value().Get();
     const Result<StatusRecord> before = ReadStatus(fd);
@@ -322,16 +322,16 @@ class SystemItems final : public Items {
     return kNotPermitted;
   }
 
-  Status SetCreated(const std::string& path, Timestamp time) const override {
+  Status SetCreated(PathText path, Timestamp time) const override {
     const ErrnoKeeper errnoKeeper;
-    const Result<UniqueFd> item = OpenUnlocked(path);
+    const Result<UniqueFd> item = OpenUnlocked(path.Get());
     if (!item) return item.Reason();
     return StoreCreationTime(item.Value().Get(), time);
   }
 
-  Status ReplaceByEmptyFile(const std::string& path) const override {
+  Status ReplaceByEmptyFile(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
-    const Result<Place> place = OpenPlace(path);
+    const Result<Place> place = OpenPlace(path.Get());
     if (!place) return place.Reason();
     const Status created = CreateFile(place.Value().folder, place.Value().name);
     if (created || created.Reason() != kItemExists) return created;
@@ -339,18 +339,18 @@ class SystemItems final : public Items {
     return refused ? ReplaceByNewFile(place.Value()) : refused;
   }
 
-  Status CreateEmptyFile(const std::string& path) const override {
+  Status CreateEmptyFile(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
-    const Result<Place> place = OpenPlace(path);
+    const Result<Place> place = OpenPlace(path.Get());
     if (!place) return place.Reason();
     return CreateFile(place.Value().folder, place.Value().name);
   }
 
-  Status CreateFolders(const std::string& path, IfExists ifExists) const override {
+  Status CreateFolders(PathText path, IfExists ifExists) const override {
     const ErrnoKeeper errnoKeeper;
-    const Status made = CreateWithParents(std::string(WithoutTrailingSeparators(path)));
+    const Status made = CreateWithParents(std::string(WithoutTrailingSeparators(path.Get())));
     if (made || made.Reason() != kItemExists || ifExists == IfExists::kFail) return made;
-    return IsFolder(path) ? Status() : made;
+    return IsFolder(path.Get()) ? Status() : made;
   }
 };
 

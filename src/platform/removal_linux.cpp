@@ -2,6 +2,9 @@
 #include "platform/removal.h"
 
 #include <fcntl.h>
+#include <limits.h>
+#include <stdio.h>
+#include <sys/xattr.h>
 
 #include <optional>
 #include <string>
@@ -20,6 +23,15 @@ constexpr std::size_t kOpenLevels = 32;
 /// How often a folder that is found not empty after everything in it was removed is gone through
 /// again, before it counts as one that somebody else is filling.
 constexpr int kMaxPasses = 32;
+
+/// The kernel itself refuses to remove or rename what has the immutable or the append-only flag.
+/// Where the attribute is not simply missing, all is looked at.
+bool HasNoLockAttribute(int folder, const char* name) {
+  char path[sizeof "/proc/self/fd/" + 12 + NAME_MAX + 1];
+  const int length = std::snprintf(path, sizeof path, "/proc/self/fd/%d/%s", folder, name);
+  if (length < 0 || static_cast<std::size_t>(length) >= sizeof path) return false;
+  return ::lgetxattr(path, kLockAttribute, nullptr, 0) < 0 && errno == ENODATA;
+}
 
 enum class Outcome { kGone, kNotEmpty };
 
@@ -129,6 +141,7 @@ class TreeRemover {
 }  // namespace
 
 Status RefuseLockedEntry(int folder, const char* name) {
+  if (HasNoLockAttribute(folder, name)) return {};
   const UniqueFd item(
       Retry([&] { return ::openat(folder, name, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
   return item ? RefuseLocked(item.Get()) : Status(LastError());

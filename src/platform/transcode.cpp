@@ -3,8 +3,12 @@
 
 #include <unicode/unorm2.h>
 
+#include <algorithm>
 #include <array>
 #include <cstdint>
+#include <cstring>
+
+#include "platform/transcode_sse.h"
 
 namespace orb::platform {
 namespace {
@@ -26,6 +30,18 @@ constexpr std::array<char16_t, 128> kMacRomanUpperHalf = {
 
 constexpr char32_t kReplacement = 0xFFFD;
 constexpr char32_t kInvalid = 0xFFFFFFFF;
+
+bool IsAscii(const char* eight) {
+  std::uint64_t bytes = 0;
+  std::memcpy(&bytes, eight, sizeof bytes);
+  return (bytes & 0x8080808080808080) == 0;
+}
+
+bool IsAscii(const char16_t* four) {
+  std::uint64_t units = 0;
+  std::memcpy(&units, four, sizeof units);
+  return (units & 0xFF80FF80FF80FF80) == 0;
+}
 
 /// Reads one character of UTF-8 at `at` and moves behind it; kInvalid where there is none.
 char32_t ReadUtf8(std::string_view text, std::size_t& at) {
@@ -52,8 +68,9 @@ char32_t ReadUtf8(std::string_view text, std::size_t& at) {
   return value;
 }
 
-void AppendUtf8(std::string& out, char32_t c) {
-  const auto put = [&](char32_t byte) { out.push_back(static_cast<char>(byte)); };
+/// Both writers return where the next character goes.
+char* PutUtf8(char* out, char32_t c) {
+  const auto put = [&](char32_t byte) { *out++ = static_cast<char>(byte); };
   if (c < 0x80) {
     put(c);
   } else if (c < 0x800) {
@@ -69,6 +86,17 @@ void AppendUtf8(std::string& out, char32_t c) {
     put(0x80 | (c >> 6 & 0x3F));
     put(0x80 | (c & 0x3F));
   }
+  return out;
+}
+
+char16_t* PutUtf16(char16_t* out, char32_t c) {
+  if (c < 0x10000) {
+    *out++ = static_cast<char16_t>(c);
+  } else {
+    *out++ = static_cast<char16_t>(0xD7C0 + (c >> 10));
+    *out++ = static_cast<char16_t>(0xDC00 + (c & 0x3FF));
+  }
+  return out;
 }
 
 /// Reads one character of UTF-16 at `at` and moves behind it; U+FFFD for an unpaired surrogate.
@@ -80,6 +108,11 @@ char32_t ReadUtf16(std::u16string_view text, std::size_t& at) {
   if (low < 0xDC00 || low >= 0xE000) return kReplacement;
   ++at;
   return 0x10000 + ((unit - 0xD800) << 10) + (low - 0xDC00);
+}
+
+/// Nothing below U+0300 composes with what stands before it.
+bool MayCompose(std::u16string_view text) {
+  return std::any_of(text.begin(), text.end(), [](char16_t unit) { return unit >= 0x0300; });
 }
 
 std::u16string Composed(std::u16string_view text) {
@@ -105,42 +138,103 @@ std::u16string Composed(std::u16string_view text) {
   return out;
 }
 
-char MacRomanFromCharacter(char32_t c) {
-  if (c < 0x80) return static_cast<char>(c);
-  for (std::size_t i = 0; i < kMacRomanUpperHalf.size(); ++i) {
-    if (kMacRomanUpperHalf[i] == c) return static_cast<char>(0x80 + i);
+struct MacRomanByte {
+  char16_t unit;
+  char byte;
+};
+
+/// The upper half in the order of its characters.
+constexpr auto kMacRomanByCharacter = [] {
+  std::array<MacRomanByte, kMacRomanUpperHalf.size()> table{};
+  for (std::size_t i = 0; i < table.size(); ++i) {
+    table[i] = {kMacRomanUpperHalf[i], static_cast<char>(0x80 + i)};
   }
-  return '?';
+  std::sort(table.begin(), table.end(), [](const MacRomanByte& a, const MacRomanByte& b) {
+    return a.unit < b.unit;
+  });
+  return table;
+}();
+
+/// The byte for a character that is not ASCII; nothing where there is none.
+std::optional<char> MacRomanFromCharacter(char32_t c) {
+  const auto* found = std::lower_bound(
+      kMacRomanByCharacter.begin(),
+      kMacRomanByCharacter.end(),
+      c,
+      [](const MacRomanByte& entry, char32_t wanted) { return entry.unit < wanted; });
+  if (found == kMacRomanByCharacter.end() || found->unit != c) return std::nullopt;
+  return found->byte;
 }
+
+/// ICU counts in 32 bits; beyond that a text stays as it is.
+constexpr std::size_t kMostUnitsToCompose = std::size_t{1} << 29;
 
 }  // namespace
 
-std::optional<std::u16string> Utf16FromUtf8(std::string_view text) {
-  std::u16string out;
-  out.reserve(text.size());
+namespace portable {
+
+std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
+  char16_t* const begin = out;
   for (std::size_t at = 0; at < text.size();) {
-    const char32_t c = ReadUtf8(text, at);
-    if (c == kInvalid) return std::nullopt;
-    if (c < 0x10000) {
-      out.push_back(static_cast<char16_t>(c));
-    } else {
-      out.push_back(static_cast<char16_t>(0xD7C0 + (c >> 10)));
-      out.push_back(static_cast<char16_t>(0xDC00 + (c & 0x3FF)));
+    if (text.size() - at >= 8 && IsAscii(text.data() + at)) {
+      for (std::size_t i = 0; i < 8; ++i) out[i] = static_cast<unsigned char>(text[at + i]);
+      at += 8;
+      out += 8;
+      continue;
     }
+    const char32_t c = ReadUtf8(text, at);
+    if (c == kInvalid) return kNotUtf8;
+    out = PutUtf16(out, c);
   }
+  return static_cast<std::size_t>(out - begin);
+}
+
+std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
+  char* const begin = out;
+  for (std::size_t at = 0; at < text.size();) {
+    if (text.size() - at >= 4 && IsAscii(text.data() + at)) {
+      for (std::size_t i = 0; i < 4; ++i) out[i] = static_cast<char>(text[at + i]);
+      at += 4;
+      out += 4;
+      continue;
+    }
+    out = PutUtf8(out, ReadUtf16(text, at));
+  }
+  return static_cast<std::size_t>(out - begin);
+}
+
+}  // namespace portable
+
+std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
+  return sse::IsSupported() ? sse::Utf16FromUtf8(text, out) : portable::Utf16FromUtf8(text, out);
+}
+
+std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
+  return sse::IsSupported() ? sse::Utf8FromUtf16(text, out) : portable::Utf8FromUtf16(text, out);
+}
+
+std::optional<std::u16string> Utf16FromUtf8(std::string_view text) {
+  std::u16string out(text.size() + kSlack, u'\0');
+  const std::size_t length = Utf16FromUtf8(text, out.data());
+  if (length == kNotUtf8) return std::nullopt;
+  out.resize(length);
   return out;
 }
 
 std::string Utf8FromUtf16(std::u16string_view text) {
-  std::string out;
-  out.reserve(text.size());
-  for (std::size_t at = 0; at < text.size();) AppendUtf8(out, ReadUtf16(text, at));
+  std::string out(3 * text.size() + kSlack, '\0');
+  out.resize(Utf8FromUtf16(text, out.data()));
   return out;
 }
 
 std::optional<std::size_t> Utf16LengthOfUtf8(std::string_view text) {
   std::size_t length = 0;
   for (std::size_t at = 0; at < text.size();) {
+    if (text.size() - at >= 8 && IsAscii(text.data() + at)) {
+      at += 8;
+      length += 8;
+      continue;
+    }
     const char32_t c = ReadUtf8(text, at);
     if (c == kInvalid) return std::nullopt;
     length += c < 0x10000 ? 1 : 2;
@@ -148,22 +242,34 @@ std::optional<std::size_t> Utf16LengthOfUtf8(std::string_view text) {
   return length;
 }
 
-std::string Utf8FromMacRoman(std::string_view text) {
-  std::string out;
-  out.reserve(text.size());
+std::size_t Utf8FromMacRoman(std::string_view text, char* out) {
+  char* const begin = out;
   for (const char byte : text) {
     const auto value = static_cast<unsigned char>(byte);
-    AppendUtf8(out, value < 0x80 ? value : kMacRomanUpperHalf[value - 0x80U]);
+    out = PutUtf8(out, value < 0x80 ? value : kMacRomanUpperHalf[value - 0x80U]);
   }
+  return static_cast<std::size_t>(out - begin);
+}
+
+std::string Utf8FromMacRoman(std::string_view text) {
+  std::string out(3 * text.size(), '\0');
+  out.resize(Utf8FromMacRoman(text, out.data()));
   return out;
 }
 
-std::string MacRomanFromUtf16(std::u16string_view text) {
-  const std::u16string composed = Composed(text);
-  std::string out;
-  out.reserve(composed.size());
-  for (std::size_t at = 0; at < composed.size();) {
-    out.push_back(MacRomanFromCharacter(ReadUtf16(composed, at)));
+MacRomanText MacRomanFromUtf16(std::u16string_view text) {
+  std::u16string composed;
+  if (text.size() <= kMostUnitsToCompose && MayCompose(text)) {
+    composed = Composed(text);
+    text = composed;
+  }
+  MacRomanText out;
+  out.bytes.reserve(text.size());
+  for (std::size_t at = 0; at < text.size();) {
+    const char32_t c = ReadUtf16(text, at);
+    const std::optional<char> byte = c < 0x80 ? static_cast<char>(c) : MacRomanFromCharacter(c);
+    out.isExact = out.isExact && byte.has_value();
+    out.bytes.push_back(byte.value_or('?'));
   }
   return out;
 }

@@ -1,26 +1,38 @@
 // SPDX-License-Identifier: MIT
 #include <orb/strings/string_data.h>
 
+#include <array>
 #include <cstdlib>
 #include <cstring>
-#include <mutex>
+#include <memory>
+#include <new>
 #include <optional>
 #include <string>
 #include <string_view>
-#include <utility>
 
 #include "platform/transcode.h"
 #include "strings/string_access.h"
 
 namespace {
 
+using orb::platform::kNotUtf8;
+using orb::platform::kSlack;
 using orb::platform::MacRomanFromUtf16;
 using orb::platform::Utf16FromUtf8;
-using orb::platform::Utf16LengthOfUtf8;
 using orb::platform::Utf8FromMacRoman;
 using orb::platform::Utf8FromUtf16;
 
 enum Master : std::uint32_t { kNone = 0, kSystem = 1, kUtf8 = 2, kUnicode = 3 };
+
+/// Up to here a text is converted on the stack and then copied at its size.
+constexpr std::size_t kShort = 256;
+
+/// Null without memory.
+void* BlockFor(std::size_t size) noexcept try {
+  return ::operator new(size);
+} catch (const std::bad_alloc&) {
+  return nullptr;
+}
 
 class Held {
  public:
@@ -33,40 +45,151 @@ class Held {
   const COrbCriticalSection& lock_;
 };
 
-char* Duplicate(std::string_view text) {
-  auto* copy = static_cast<char*>(std::malloc(text.size() + 1));
-  if (copy == nullptr) return nullptr;
-  if (!text.empty()) std::memcpy(copy, text.data(), text.size());
-  copy[text.size()] = '\0';
-  return copy;
-}
-
 std::size_t Length(const unsigned short* text) {
   std::size_t length = 0;
   while (text[length] != 0) ++length;
   return length;
 }
 
-std::u16string_view View(const unsigned short* text) {
-  return {reinterpret_cast<const char16_t*>(text), Length(text)};
+/// A text on its way to being stored; `text` is null when there was no memory.
+template <typename Unit>
+struct Copy {
+  Unit* text;
+  std::size_t length;
+};
+
+Copy<char> Duplicate(std::string_view text) {
+  auto* copy = static_cast<char*>(std::malloc(text.size() + 1));
+  if (copy == nullptr) return {nullptr, 0};
+  if (!text.empty()) std::memcpy(copy, text.data(), text.size());
+  copy[text.size()] = '\0';
+  return {copy, text.size()};
 }
 
-unsigned short* Duplicate(std::u16string_view text, std::size_t bytes) {
-  auto* copy = static_cast<unsigned short*>(std::calloc(bytes, 1));
-  if (copy != nullptr && !text.empty()) std::memcpy(copy, text.data(), text.size() * 2);
-  return copy;
+Copy<unsigned short> Duplicate(const unsigned short* text, std::size_t length) {
+  const std::size_t size = (length + 1) * sizeof(unsigned short);
+  auto* copy = static_cast<unsigned short*>(std::malloc(size));
+  if (copy != nullptr) std::memcpy(copy, text, size);
+  return {copy, length};
+}
+
+/// Gives back what a buffer has too much.
+template <typename Unit>
+Unit* Shrunk(Unit* buffer, std::size_t size) {
+  void* shrunk = std::realloc(buffer, size);
+  return shrunk == nullptr ? buffer : static_cast<Unit*>(shrunk);
+}
+
+/// `most` bounds what `write` writes, without its slack; it returns the length.
+template <typename Write>
+Copy<char> Written(std::size_t most, Write write) {
+  if (most <= 3 * kShort) {
+    std::array<char, 3 * kShort + kSlack> buffer;
+    return Duplicate({buffer.data(), write(buffer.data())});
+  }
+  auto* made = static_cast<char*>(std::malloc(most + kSlack));
+  if (made == nullptr) return {nullptr, 0};
+  const std::size_t length = write(made);
+  made[length] = '\0';
+  return {Shrunk(made, length + 1), length};
+}
+
+/// The UTF-16 copy has room for twice its units, all zero behind the text.
+constexpr std::size_t UnicodeSize(std::size_t length) { return (length + 1) * 4; }
+
+Copy<unsigned short> Terminated(unsigned short* text, std::size_t length) {
+  std::memset(text + length, 0, UnicodeSize(length) - length * sizeof *text);
+  return {text, length};
+}
+
+Copy<unsigned short> ShortUnicode(std::string_view utf8) {
+  std::array<char16_t, kShort + kSlack> units;
+  std::size_t length = Utf16FromUtf8(utf8, units.data());
+  if (length == kNotUtf8) length = 0;
+  auto* made = static_cast<unsigned short*>(std::malloc(UnicodeSize(length)));
+  if (made == nullptr) return {nullptr, 0};
+  std::memcpy(made, units.data(), length * sizeof *made);
+  return Terminated(made, length);
+}
+
+/// One pass over the text: the most that it can need is taken first and what is left given back.
+Copy<unsigned short> UnicodeFrom(std::string_view utf8) {
+  if (utf8.size() <= kShort) return ShortUnicode(utf8);
+  const std::size_t most = UnicodeSize(utf8.size());
+  auto* made = static_cast<unsigned short*>(std::malloc(most));
+  if (made == nullptr) return {nullptr, 0};
+  std::size_t length = Utf16FromUtf8(utf8, reinterpret_cast<char16_t*>(made));
+  if (length == kNotUtf8) length = 0;
+  if (length != utf8.size()) made = Shrunk(made, UnicodeSize(length));
+  return Terminated(made, length);
+}
+
+Copy<char> SystemFrom(std::string_view utf8) try {
+  const std::optional<std::u16string> units = Utf16FromUtf8(utf8);
+  return Duplicate(units ? MacRomanFromUtf16(*units).bytes : std::string());
+} catch (const std::bad_alloc&) {
+  return {nullptr, 0};
 }
 
 }  // namespace
 
-COrbStringData::COrbStringValue::~COrbStringValue() { Clear(); }
+// A value behind which its text lies: one allocation. Where there is no memory for both, the value
+// stands alone, its text missing.
+COrbStringData::COrbStringValue* COrbStringData::COrbStringValue::Make(std::uint32_t encoding,
+                                                                       const void* text,
+                                                                       std::size_t length) {
+  const std::size_t size = encoding == kUnicode ? length * sizeof(unsigned short) : length;
+  void* block = BlockFor(sizeof(COrbStringValue) + size + sizeof(unsigned short));
+  auto* made = block == nullptr ? new COrbStringValue : ::new (block) COrbStringValue;
+  made->master.store(encoding, std::memory_order_relaxed);
+  if (block == nullptr) return made;
+  made->inBlock = static_cast<std::uint8_t>(encoding);
+  auto* copy = reinterpret_cast<char*>(made + 1);
+  if (size != 0) std::memcpy(copy, text, size);
+  copy[size] = '\0';
+  copy[size + 1] = '\0';
+  if (encoding == kSystem) made->StoreSystem(copy, length);
+  if (encoding == kUtf8) made->StoreUtf8(copy, length);
+  if (encoding == kUnicode) made->StoreUnicode(reinterpret_cast<unsigned short*>(copy), length);
+  return made;
+}
+
+COrbStringData::COrbStringValue::~COrbStringValue() {
+  const auto drop = [this](const auto& copy, std::uint32_t encoding) {
+    void* text = copy.load(std::memory_order_relaxed);
+    if (text != nullptr && inBlock != encoding) std::free(text);
+  };
+  drop(systemText, kSystem);
+  drop(utf8Text, kUtf8);
+  drop(unicodeText, kUnicode);
+}
 
 void COrbStringData::COrbStringValue::Clear() {
-  master = kNone;
+  // Only strings make values that share a block, and they never clear them.
   std::free(systemText.exchange(nullptr));
   std::free(utf8Text.exchange(nullptr));
   std::free(unicodeText.exchange(nullptr));
+  master = kNone;
   scan = 0;
+}
+
+const char* COrbStringData::COrbStringValue::StoreSystem(char* text, std::size_t length) {
+  systemLength = length;
+  systemText.store(text, std::memory_order_release);
+  return text;
+}
+
+const char* COrbStringData::COrbStringValue::StoreUtf8(char* text, std::size_t length) {
+  utf8Length = length;
+  utf8Text.store(text, std::memory_order_release);
+  return text;
+}
+
+const unsigned short* COrbStringData::COrbStringValue::StoreUnicode(unsigned short* text,
+                                                                    std::size_t length) {
+  unicodeLength = length;
+  unicodeText.store(text, std::memory_order_release);
+  return text;
 }
 
 OrbResult COrbStringData::COrbStringValue::InitWithSystemEncoding(const char* text) {
@@ -74,7 +197,8 @@ OrbResult COrbStringData::COrbStringValue::InitWithSystemEncoding(const char* te
   if (master != kNone) return kOrbNoErr;
   const Held held(lock);
   if (master != kNone) return kOrbNoErr;
-  systemText.store(Duplicate(text), std::memory_order_release);
+  const Copy<char> copy = Duplicate(text);
+  StoreSystem(copy.text, copy.length);
   master = kSystem;
   return kOrbNoErr;
 }
@@ -84,7 +208,8 @@ OrbResult COrbStringData::COrbStringValue::InitWithUtf8(const char* text) {
   if (master != kNone) return kOrbNoErr;
   const Held held(lock);
   if (master != kNone) return kOrbNoErr;
-  utf8Text.store(Duplicate(text), std::memory_order_release);
+  const Copy<char> copy = Duplicate(text);
+  StoreUtf8(copy.text, copy.length);
   master = kUtf8;
   return kOrbNoErr;
 }
@@ -94,90 +219,99 @@ OrbResult COrbStringData::COrbStringValue::InitWithUnicode(const unsigned short*
   if (master != kNone) return kOrbNoErr;
   const Held held(lock);
   if (master != kNone) return kOrbNoErr;
-  const std::u16string_view view = View(text);
-  unicodeText.store(Duplicate(view, (view.size() + 1) * 2), std::memory_order_release);
+  const Copy<unsigned short> copy = Duplicate(text, Length(text));
+  StoreUnicode(copy.text, copy.length);
   master = kUnicode;
   return kOrbNoErr;
 }
 
-const char* COrbStringData::COrbStringValue::GetPtrUtf8() {
-  if (const char* made = utf8Text.load(std::memory_order_acquire)) return made;
-  const Held held(lock);
-  if (const char* made = utf8Text.load(std::memory_order_acquire)) return made;
-  char* made = nullptr;
-  const unsigned short* unicode = unicodeText.load();
-  const char* system = systemText.load();
-  if (master == kUnicode && unicode != nullptr) {
-    made = Duplicate(Utf8FromUtf16(View(unicode)));
-  } else if (master == kSystem && system != nullptr) {
-    made = Duplicate(Utf8FromMacRoman(system));
-  } else {
-    made = Duplicate(std::string_view());
-    master = kUtf8;
-  }
-  utf8Text.store(made, std::memory_order_release);
-  return made;
+const char* COrbStringData::COrbStringValue::GetPtrSystemEncoding() {
+  const char* made = systemText.load(std::memory_order_acquire);
+  return made != nullptr ? made : DeriveSystem();
 }
 
-const char* COrbStringData::COrbStringValue::GetPtrSystemEncoding() {
-  if (const char* made = systemText.load(std::memory_order_acquire)) return made;
+const char* COrbStringData::COrbStringValue::GetPtrUtf8() {
+  const char* made = utf8Text.load(std::memory_order_acquire);
+  return made != nullptr ? made : DeriveUtf8();
+}
+
+const unsigned short* COrbStringData::COrbStringValue::GetPtrUnicode() {
+  const unsigned short* made = unicodeText.load(std::memory_order_acquire);
+  return made != nullptr ? made : DeriveUnicode();
+}
+
+const char* COrbStringData::COrbStringValue::DeriveUtf8() {
+  const Held held(lock);
+  if (const char* made = utf8Text.load(std::memory_order_acquire)) return made;
+  Copy<char> copy{};
+  const auto* unicode = reinterpret_cast<const char16_t*>(unicodeText.load());
+  const char* system = systemText.load();
+  if (master == kUnicode && unicode != nullptr) {
+    copy = Written(3 * unicodeLength, [&](char* out) {
+      return Utf8FromUtf16({unicode, unicodeLength}, out);
+    });
+  } else if (master == kSystem && system != nullptr) {
+    copy = Written(3 * systemLength, [&](char* out) {
+      return Utf8FromMacRoman({system, systemLength}, out);
+    });
+  } else {
+    copy = Duplicate(std::string_view());
+    master = kUtf8;
+  }
+  return StoreUtf8(copy.text, copy.length);
+}
+
+const char* COrbStringData::COrbStringValue::DeriveSystem() {
   const Held held(lock);
   if (const char* made = systemText.load(std::memory_order_acquire)) return made;
-  char* made = nullptr;
+  Copy<char> copy{};
   if (master == kNone || master == kSystem) {
-    made = Duplicate(std::string_view());
+    copy = Duplicate(std::string_view());
     master = kSystem;
   } else {
     const char* utf8 = GetPtrUtf8();
     if (utf8 == nullptr) return nullptr;
-    const std::optional<std::u16string> text = Utf16FromUtf8(utf8);
-    made = Duplicate(text ? MacRomanFromUtf16(*text) : std::string());
+    copy = SystemFrom({utf8, utf8Length});
   }
-  systemText.store(made, std::memory_order_release);
-  return made;
+  return StoreSystem(copy.text, copy.length);
 }
 
-const unsigned short* COrbStringData::COrbStringValue::GetPtrUnicode() {
-  if (const unsigned short* made = unicodeText.load(std::memory_order_acquire)) return made;
+const unsigned short* COrbStringData::COrbStringValue::DeriveUnicode() {
   const Held held(lock);
   if (const unsigned short* made = unicodeText.load(std::memory_order_acquire)) return made;
-  unsigned short* made = nullptr;
+  Copy<unsigned short> copy{};
   if (master == kNone || master == kUnicode) {
-    made = Duplicate(std::u16string_view(), 2);
+    constexpr unsigned short kEmpty = 0;
+    copy = Duplicate(&kEmpty, 0);
     master = kUnicode;
   } else {
     const char* utf8 = GetPtrUtf8();
     if (utf8 == nullptr) return nullptr;
-    const std::u16string text = Utf16FromUtf8(utf8).value_or(std::u16string());
-    made = Duplicate(text, (text.size() + 1) * 4);
+    copy = UnicodeFrom({utf8, utf8Length});
   }
-  unicodeText.store(made, std::memory_order_release);
-  return made;
+  return StoreUnicode(copy.text, copy.length);
 }
 
 unsigned long COrbStringData::COrbStringValue::GetLengthByteSystemEncoding() {
-  const char* text = GetPtrSystemEncoding();
-  return text == nullptr ? 0 : std::strlen(text);
+  return GetPtrSystemEncoding() == nullptr ? 0 : systemLength;
 }
 
 unsigned long COrbStringData::COrbStringValue::GetLengthByteUtf8() {
-  const char* text = GetPtrUtf8();
-  return text == nullptr ? 0 : std::strlen(text);
+  return GetPtrUtf8() == nullptr ? 0 : utf8Length;
 }
 
 unsigned long COrbStringData::COrbStringValue::GetLengthByteUnicode() {
-  const unsigned short* text = GetPtrUnicode();
-  return text == nullptr ? 0 : 2 * Length(text);
+  return GetPtrUnicode() == nullptr ? 0 : 2 * unicodeLength;
 }
 
 unsigned long COrbStringData::COrbStringValue::GetLengthChar() {
-  switch (master.load()) {
+  switch (master.load(std::memory_order_acquire)) {
     case kUnicode:
-      return GetLengthByteUnicode() / 2;
+      return HasValueUnicode() ? unicodeLength : 0;
     case kUtf8:
-      return GetPtrUtf8() == nullptr ? 0 : Utf16LengthOfUtf8(GetPtrUtf8()).value_or(0);
+      return HasValueUtf8() ? orb::StringAccess::Read(*this).scan.charLength : 0;
     case kSystem:
-      return GetLengthByteSystemEncoding();
+      return HasValueSystemEncoding() ? systemLength : 0;  // Each of its bytes is one unit.
     default:
       return 0;
   }
@@ -196,19 +330,13 @@ bool COrbStringData::COrbStringValue::HasValueUnicode() const {
 }
 
 bool COrbStringData::COrbStringValue::IsEmpty() {
-  switch (master.load()) {
-    case kUnicode: {
-      const unsigned short* text = unicodeText.load(std::memory_order_acquire);
-      return text == nullptr || text[0] == 0;
-    }
-    case kUtf8: {
-      const char* text = utf8Text.load(std::memory_order_acquire);
-      return text == nullptr || text[0] == 0;
-    }
-    case kSystem: {
-      const char* text = systemText.load(std::memory_order_acquire);
-      return text == nullptr || text[0] == 0;
-    }
+  switch (master.load(std::memory_order_acquire)) {
+    case kUnicode:
+      return !HasValueUnicode() || unicodeLength == 0;
+    case kUtf8:
+      return !HasValueUtf8() || utf8Length == 0;  // Valid or not.
+    case kSystem:
+      return !HasValueSystemEncoding() || systemLength == 0;
     default:
       return true;
   }
@@ -216,30 +344,27 @@ bool COrbStringData::COrbStringValue::IsEmpty() {
 
 namespace orb {
 
-Utf8Text StringAccess::Read(const COrbStringData& s) {
-  COrbStringData::COrbStringValue* value = s.EnsureValue();
-  const char* bytes = value->GetPtrUtf8();
+Utf8Text StringAccess::Read(const COrbStringData& s) { return Read(*s.EnsureValue()); }
+
+Utf8Text StringAccess::Read(COrbStringData::COrbStringValue& value) {
+  const char* bytes = value.GetPtrUtf8();
   if (bytes == nullptr) return {};
-  std::uint64_t packed = value->scan.load(std::memory_order_relaxed);
-  const std::string_view text(bytes);
+  const std::string_view text(bytes, value.utf8Length);
+  std::uint64_t packed = value.scan.load(std::memory_order_relaxed);
   if (packed == 0) {
     packed = ScanUtf8(text).Pack();
-    value->scan.store(packed, std::memory_order_relaxed);
+    value.scan.store(packed, std::memory_order_relaxed);
   }
   return {text, TextScan::Unpack(packed)};
 }
 
 COrbStringData StringAccess::FromUtf8(std::string_view text) {
   COrbStringData made;
-  made.InitWithUtf8(std::string(text).c_str());
+  made.value = COrbStringData::COrbStringValue::Make(kUtf8, text.data(), text.size());
   return made;
 }
 
 }  // namespace orb
-
-COrbStringData::COrbStringData(const COrbStringData& other) { Share(other); }
-
-COrbStringData::COrbStringData(COrbStringData&& other) noexcept { TakePlaceOf(other); }
 
 COrbStringData::COrbStringData(const OrbCharSystem& text) { InitWithSystemEncoding(text); }
 
@@ -265,40 +390,28 @@ COrbStringData& COrbStringData::operator=(COrbStringData&& other) noexcept {
 
 COrbStringData::~COrbStringData() { Clear(); }
 
-void COrbStringData::Share(const COrbStringData& other) {
-  if (other.value == nullptr) return;
-  const Held held(other.value->lock);
-  value = other.value;
-  prev = const_cast<COrbStringData*>(&other);
-  next = other.next;
-  if (next != nullptr) next->prev = this;
-  other.next = this;
-}
-
-void COrbStringData::TakePlaceOf(COrbStringData& other) noexcept {
-  if (other.value == nullptr) return;
-  const Held held(other.value->lock);
-  value = std::exchange(other.value, nullptr);
-  prev = std::exchange(other.prev, nullptr);
-  next = std::exchange(other.next, nullptr);
-  if (prev != nullptr) prev->next = this;
-  if (next != nullptr) next->prev = this;
-}
-
 void COrbStringData::Clear() {
-  COrbStringValue* old = value;
-  if (old == nullptr) return;
-  bool last = false;
-  {
-    const Held held(old->lock);
-    last = prev == nullptr && next == nullptr;
+  COrbStringValue* const left = value;
+  if (left == nullptr) return;
+  value = nullptr;
+  if (left->shared.load(std::memory_order_relaxed)) {
+    left->lock.Enter();
+    const bool last = prev == nullptr && next == nullptr;
     if (prev != nullptr) prev->next = next;
     if (next != nullptr) next->prev = prev;
+    left->lock.Leave();
     prev = nullptr;
     next = nullptr;
-    value = nullptr;
+    // From here on the others may end the value: it is ours to touch only if there are none.
+    if (!last) return;
   }
-  if (last) delete old;
+  delete left;
+}
+
+/// The new value is complete before the old one goes, so its text may come from there.
+void COrbStringData::Replace(COrbStringValue* made) {
+  Clear();
+  value = made;
 }
 
 COrbStringData::COrbStringValue* COrbStringData::EnsureValue() const {
@@ -307,27 +420,21 @@ COrbStringData::COrbStringValue* COrbStringData::EnsureValue() const {
 }
 
 OrbResult COrbStringData::InitWithSystemEncoding(const char* text) {
-  auto* made = new COrbStringValue;
-  const OrbResult result = made->InitWithSystemEncoding(text);
-  Clear();
-  value = made;
-  return result;
+  const bool isText = text != nullptr;
+  Replace(isText ? COrbStringValue::Make(kSystem, text, std::strlen(text)) : new COrbStringValue);
+  return isText ? kOrbNoErr : kOrbErrUnknown;
 }
 
 OrbResult COrbStringData::InitWithUtf8(const char* text) {
-  auto* made = new COrbStringValue;
-  const OrbResult result = made->InitWithUtf8(text);
-  Clear();
-  value = made;
-  return result;
+  const bool isText = text != nullptr;
+  Replace(isText ? COrbStringValue::Make(kUtf8, text, std::strlen(text)) : new COrbStringValue);
+  return isText ? kOrbNoErr : kOrbErrUnknown;
 }
 
 OrbResult COrbStringData::InitWithUnicode(const unsigned short* text) {
-  auto* made = new COrbStringValue;
-  const OrbResult result = made->InitWithUnicode(text);
-  Clear();
-  value = made;
-  return result;
+  const bool isText = text != nullptr;
+  Replace(isText ? COrbStringValue::Make(kUnicode, text, Length(text)) : new COrbStringValue);
+  return isText ? kOrbNoErr : kOrbErrUnknown;
 }
 
 OrbResult COrbStringData::InitWithChar(const OrbCharSystem& text) {
@@ -347,9 +454,10 @@ OrbResult COrbStringData::InitWithCFString(const __CFString* text) {
   }
   const CFIndex size =
       CFStringGetMaximumSizeForEncoding(CFStringGetLength(text) + 1, kCFStringEncodingUTF8);
-  std::string buffer(static_cast<std::size_t>(size), '\0');
-  CFStringGetCString(text, buffer.data(), size, kCFStringEncodingUTF8);
-  return InitWithUtf8(buffer.c_str());
+  const std::unique_ptr<char[]> buffer(new char[static_cast<std::size_t>(size)]);
+  buffer[0] = '\0';
+  CFStringGetCString(text, buffer.get(), size, kCFStringEncodingUTF8);
+  return InitWithUtf8(buffer.get());
 }
 
 const char* COrbStringData::GetPtrSystemEncoding() const {
@@ -402,6 +510,9 @@ CFStringRef COrbStringData::CreateCopyCFString() const {
   const char* text = GetPtrUtf8();
   CFStringRef made = CFStringCreateWithCString(
       kCFAllocatorDefault, text == nullptr ? "" : text, kCFStringEncodingUTF8);
-  if (made != nullptr) return made;
-  return CFStringCreateWithCString(kCFAllocatorDefault, "", kCFStringEncodingUTF8);
+  if (made == nullptr) {
+    made = CFStringCreateWithCString(kCFAllocatorDefault, "", kCFStringEncodingUTF8);
+  }
+  if (made == nullptr) throw std::bad_alloc();
+  return made;
 }

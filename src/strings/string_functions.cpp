@@ -1,15 +1,7 @@
 // SPDX-License-Identifier: MIT
-// A "%n" in a caller's format must not end the host program, as the checked printf would.
-#undef _FORTIFY_SOURCE
 #include <orb/strings/string_functions.h>
 
 #include <algorithm>
-#include <cstdarg>
-#include <cstdio>
-#include <cstdlib>
-#include <cwchar>
-#include <memory>
-#include <optional>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -17,108 +9,69 @@
 #include "platform/transcode.h"
 #include "platform/unicode.h"
 #include "strings/string_access.h"
+#include "strings/text_compare.h"
+#include "strings/text_edit.h"
+#include "strings/text_search.h"
 
 namespace {
 
 using orb::StringAccess;
-using orb::platform::Utf16FromUtf8;
-using orb::platform::Utf8FromUtf16;
+using orb::TextKind;
+using orb::Utf8Text;
 
-/// The UTF-16 text; nothing when it is not valid UTF-8.
-std::optional<std::u16string> Units(const COrbStringData& s) {
-  return Utf16FromUtf8(StringAccess::Read(s).bytes);
+bool IsValid(const Utf8Text& text) { return text.scan.kind != TextKind::kInvalid; }
+
+COrbStringData TailFrom(const Utf8Text& text, std::size_t at) {
+  if (at == orb::kNotFound) return {};
+  return StringAccess::FromUtf8(text.bytes.substr(at));
 }
-
-std::u16string Readable(const COrbStringData& s) { return Units(s).value_or(std::u16string()); }
-
-COrbStringData Made(std::u16string_view text) {
-  return StringAccess::FromUtf8(Utf8FromUtf16(text));
-}
-
-bool Starts(const std::u16string& text, std::size_t at) {
-  if (at == 0 || at >= text.size()) return true;
-  char32_t c = text[at];
-  if (c >= 0xDC00 && c < 0xE000) return false;
-  if (c >= 0xD800 && c < 0xDC00) c = 0x10000 + ((c - 0xD800) << 10) + (text[at + 1] - 0xDC00U);
-  return orb::platform::StartsSegment(c);
-}
-
-template <typename Form>
-std::size_t FindEquivalent(const std::u16string& text, const std::u16string& find, Form form) {
-  if (find.empty()) return std::u16string::npos;
-  const std::u16string wanted = form(find);
-  for (std::size_t from = 0; from < text.size(); ++from) {
-    if (!Starts(text, from)) continue;
-    std::u16string seen;
-    for (std::size_t to = from; to < text.size() && seen.size() < wanted.size();) {
-      const std::size_t piece = to++;
-      while (!Starts(text, to)) ++to;
-      seen += form(std::u16string_view(text).substr(piece, to - piece));
-    }
-    if (seen == wanted) return from;
-  }
-  return std::u16string::npos;
-}
-
-COrbStringData TailFrom(const std::u16string& text, std::size_t at) {
-  if (at == std::u16string::npos) return {};
-  return Made(std::u16string_view(text).substr(at));
-}
-
-int Sign(int order) { return order < 0 ? -1 : order > 0 ? 1 : 0; }
-
-template <typename Compare>
-int Compared(const COrbStringData& a,
-             const COrbStringData& b,
-             unsigned long count,
-             Compare compare) {
-  const std::optional<std::u16string> left = Units(a);
-  const std::optional<std::u16string> right = Units(b);
-  if (!left || !right) return 0;
-  return Sign(compare(std::u16string_view(*left).substr(0, count),
-                      std::u16string_view(*right).substr(0, count)));
-}
-
-constexpr unsigned long kAll = static_cast<unsigned long>(-1);
-
-int CompareUnits(std::u16string_view a, std::u16string_view b) { return a.compare(b); }
 
 std::string Joined(const COrbStringData& a, const COrbStringData& b) {
-  std::string text(StringAccess::Read(a).bytes);
-  text += StringAccess::Read(b).bytes;
+  // Reading comes first: it gives a string without value one, whose length can then be asked.
+  const char* first = a.GetPtrUtf8();
+  const char* second = b.GetPtrUtf8();
+  std::string text;
+  text.reserve(a.GetLengthByteUtf8() + b.GetLengthByteUtf8());
+  text.append(first, a.GetLengthByteUtf8());
+  text.append(second, b.GetLengthByteUtf8());
   return text;
 }
 
-COrbStringData Formatted(const char* format, std::va_list arguments) {
-  char* text = nullptr;
-  if (::vasprintf(&text, format, arguments) < 0) return {};
-  COrbStringData result;
-  result.InitWithUtf8(text);
-  std::free(text);
-  return result;
+/// Calls `compare(a, b)` on the two texts; 0 when either is not UTF-8.
+template <typename Compare>
+int Compared(const COrbStringData& a, const COrbStringData& b, Compare compare) {
+  const Utf8Text left = StringAccess::Read(a);
+  const Utf8Text right = StringAccess::Read(b);
+  return IsValid(left) && IsValid(right) ? compare(left.bytes, right.bytes) : 0;
 }
 
-std::u16string Utf16FromWide(const wchar_t* text) {
-  std::u16string units;
-  for (; *text != 0; ++text) {
-    const auto c = static_cast<char32_t>(*text);
-    if (c < 0x10000) {
-      units.push_back(static_cast<char16_t>(c));
-    } else {
-      units.push_back(static_cast<char16_t>(0xD7C0 + (c >> 10)));
-      units.push_back(static_cast<char16_t>(0xDC00 + (c & 0x3FF)));
-    }
+/// A piece of text that becomes a string where it is put, without a move in between.
+struct Piece {
+  std::string_view text;
+  operator COrbStringData() const { return StringAccess::FromUtf8(text); }
+};
+
+COrbStringData Mapped(const COrbStringData& s,
+                      char first,
+                      char last,
+                      std::u16string (*map)(std::u16string_view)) {
+  const Utf8Text text = StringAccess::Read(s);
+  if (text.scan.kind != TextKind::kAscii) {
+    const std::u16string units = orb::platform::Utf16FromUtf8(text.bytes).value_or(u"");
+    return StringAccess::FromUtf8(orb::platform::Utf8FromUtf16(map(units)));
   }
-  return units;
+  std::string mapped(text.bytes);
+  for (char& c : mapped) {
+    if (c >= first && c <= last) c = static_cast<char>(c ^ 0x20);
+  }
+  return StringAccess::FromUtf8(mapped);
 }
-
-constexpr std::size_t kWideLimit = 2048;
 
 }  // namespace
 
 COrbStringData COrbStringData::Mid(unsigned long start, unsigned long count) const {
   if (start >= GetLengthChar() || IsEmpty()) return {};
-  return Made(std::u16string_view(Readable(*this)).substr(start, count));
+  return StringAccess::FromUtf8(orb::Middle(StringAccess::Read(*this).Readable(), start, count));
 }
 
 COrbStringData COrbStringData::operator+(const COrbStringData& other) const {
@@ -135,73 +88,72 @@ COrbStringData OrbStringDataCat(const COrbStringData& a, const COrbStringData& b
 }
 
 COrbStringData OrbStringDataInc(const COrbStringData& s, unsigned long m) {
-  if (s.GetLengthChar() < m) return {};
-  return Made(std::u16string_view(Readable(s)).substr(m));
+  const unsigned long length = s.GetLengthChar();
+  if (length < m) return {};
+  return StringAccess::FromUtf8(orb::Middle(StringAccess::Read(s).Readable(), m, length - m));
 }
 
 COrbStringData OrbStringDataStr(const COrbStringData& s, const COrbStringData& find) {
-  const std::u16string text = Readable(s);
-  return TailFrom(text, FindEquivalent(text, Readable(find), orb::platform::Decomposed));
+  const Utf8Text text = StringAccess::Read(s);
+  return TailFrom(text, orb::FindEquivalent(text, StringAccess::Read(find)));
 }
 
 COrbStringData OrbStringDataStrNoCase(const COrbStringData& s, const COrbStringData& find) {
-  const std::u16string text = Readable(s);
-  return TailFrom(text, FindEquivalent(text, Readable(find), orb::platform::FoldedDecomposed));
+  const Utf8Text text = StringAccess::Read(s);
+  return TailFrom(text, orb::FindFolded(text, StringAccess::Read(find)));
 }
 
 COrbStringData OrbStringDataStrReverse(const COrbStringData& s, const COrbStringData& find) {
-  const std::u16string text = Readable(s);
-  const std::u16string wanted = Readable(find);
-  return wanted.empty() ? COrbStringData() : TailFrom(text, text.rfind(wanted));
+  const Utf8Text text = StringAccess::Read(s);
+  const std::string_view wanted = StringAccess::Read(find).Readable();
+  if (wanted.empty()) return {};
+  return TailFrom(text, orb::FindLastLiteral(text.Readable(), wanted));
 }
 
 int OrbStringDataCmp(const COrbStringData& a, const COrbStringData& b) {
-  return Compared(a, b, kAll, CompareUnits);
+  return Compared(
+      a, b, [](std::string_view x, std::string_view y) { return orb::CompareUnits({x}, {y}); });
 }
 
 int OrbStringDataCmpi(const COrbStringData& a, const COrbStringData& b) {
-  return Compared(a, b, kAll, orb::platform::CompareFoldedEquivalent);
+  return Compared(a, b, orb::CompareFoldedEquivalent);
 }
 
 int OrbStringDataCmpn(const COrbStringData& a, const COrbStringData& b, unsigned long n) {
-  return Compared(a, b, n, CompareUnits);
+  return Compared(a, b, [n](std::string_view x, std::string_view y) {
+    return orb::CompareUnits(orb::PrefixOf(x, n), orb::PrefixOf(y, n));
+  });
 }
 
 int OrbStringDataCmpni(const COrbStringData& a, const COrbStringData& b, unsigned long n) {
-  return Compared(a, b, n, orb::platform::CompareFolded);
+  return Compared(a, b, [n](std::string_view x, std::string_view y) {
+    return orb::CompareFolded(orb::PrefixOf(x, n), orb::PrefixOf(y, n));
+  });
 }
 
 COrbStringData OrbStringDataReplace(const COrbStringData& s,
                                     const COrbStringData& find,
                                     const COrbStringData& with) {
-  COrbStringData result;
-  COrbStringData rest = s;
-  for (;;) {
-    const COrbStringData tail = OrbStringDataStr(rest, find);
-    if (tail.IsEmpty()) return OrbStringDataCat(result, rest);
-    const unsigned long before = rest.GetLengthChar() - tail.GetLengthChar();
-    result = OrbStringDataCat(OrbStringDataCat(result, rest.Mid(0, before)), with);
-    rest = tail.Mid(find.GetLengthChar(), tail.GetLengthChar() - find.GetLengthChar());
+  const COrbStringData source = s;  // Reading it gives `s`, if it has no value, none.
+  const Utf8Text text = StringAccess::Read(source);
+  const Utf8Text wanted = StringAccess::Read(find);
+  if (orb::FindEquivalent(text, wanted) == orb::kNotFound) {
+    return StringAccess::FromUtf8(text.bytes);
   }
+  return StringAccess::FromUtf8(orb::Replaced(text, wanted, StringAccess::Read(with).bytes));
 }
 
 void OrbStringDataSplit(const COrbStringData& s,
                         const COrbStringData& sep,
                         std::vector<COrbStringData>* out) {
   if (out == nullptr) return;
-  std::vector<COrbStringData> pieces;
-  COrbStringData rest = s;
-  bool found = false;
-  for (;;) {
-    const COrbStringData tail = OrbStringDataStr(rest, sep);
-    if (tail.IsEmpty()) break;
-    const COrbStringData piece = rest.Mid(0, rest.GetLengthChar() - tail.GetLengthChar());
-    if (!piece.IsEmpty()) pieces.push_back(piece);
-    rest = tail.Mid(sep.GetLengthChar(), tail.GetLengthChar() - sep.GetLengthChar());
-    found = true;
-  }
-  if (found && !rest.IsEmpty()) pieces.push_back(rest);
-  *out = std::move(pieces);
+  const COrbStringData source = s;  // Either may be in the list that is about to be emptied.
+  const Utf8Text separator = StringAccess::Read(sep);
+  const COrbStringData keptSeparator = sep;
+  const orb::Pieces pieces(StringAccess::Read(source), separator);
+  out->clear();
+  out->reserve(pieces.Views().size());
+  for (const std::string_view piece : pieces.Views()) out->emplace_back(Piece{piece});
 }
 
 COrbStringData OrbString::Trim(const COrbStringData& s,
@@ -209,25 +161,11 @@ COrbStringData OrbString::Trim(const COrbStringData& s,
                                bool left,
                                bool right) {
   if (set.IsEmpty() || (!left && !right)) return s;
-  const COrbStringData first = set.Mid(0, 1);
-  COrbStringData marked = s;
-  for (unsigned long i = 1; i < set.GetLengthChar(); ++i) {
-    marked = OrbStringDataReplace(marked, set.Mid(i, 1), first);
-  }
-  std::vector<COrbStringData> pieces;
-  OrbStringDataSplit(marked, first, &pieces);
-  if (pieces.empty()) {
-    const COrbStringData rest = OrbStringDataReplace(marked, first, OrbCharUtf8(""));
-    return rest.IsEmpty() ? COrbStringData() : s;
-  }
-  const unsigned long head = OrbStringDataStr(s, pieces.front()).GetLengthChar();
-  const unsigned long back = OrbStringDataStrReverse(s, pieces.back()).GetLengthChar();
-  unsigned long count = s.GetLengthChar();
-  const unsigned long start = left ? count - head : 0;
-  count -= start;
-  if (right && pieces.size() == 1) count = count - head + pieces.front().GetLengthChar();
-  if (right && pieces.size() != 1) count = count - back + pieces.back().GetLengthChar();
-  return s.Mid(start, count);
+  const COrbStringData source = s;  // Reading it gives `s`, if it has no value, none.
+  const orb::Trimmed trimmed =
+      orb::Trim(StringAccess::Read(source), StringAccess::Read(set), left, right);
+  if (trimmed.extent == orb::Trimming::kNothing) return s;
+  return trimmed.text ? StringAccess::FromUtf8(*trimmed.text) : COrbStringData();
 }
 
 COrbStringData OrbStringDataTrim(const COrbStringData& s, const COrbStringData& set) {
@@ -243,51 +181,9 @@ COrbStringData OrbStringDataTrimRight(const COrbStringData& s, const COrbStringD
 }
 
 COrbStringData OrbStringDataLower(const COrbStringData& s) {
-  return Made(orb::platform::Lower(Readable(s)));
+  return Mapped(s, 'A', 'Z', orb::platform::Lower);
 }
 
 COrbStringData OrbStringDataUpper(const COrbStringData& s) {
-  return Made(orb::platform::Upper(Readable(s)));
-}
-
-int OrbStringDataToNumber(const OrbCharPlatform& text) {
-  const char* digits = text;
-  return digits == nullptr ? 0 : std::atoi(digits);
-}
-
-double OrbStringDataToFloat(const OrbCharPlatform& text) {
-  const char* digits = text;
-  return digits == nullptr ? 0 : std::atof(digits);
-}
-
-COrbStringData OrbStringDataFormat(const COrbStringData* format, ...) {
-  if (format == nullptr || format->GetPtrSystemEncoding() == nullptr) return {};
-  std::va_list arguments;
-  va_start(arguments, format);
-  COrbStringData result = Formatted(format->GetPtrUtf8(), arguments);
-  va_end(arguments);
-  return result;
-}
-
-COrbStringData OrbStringDataFormat(const OrbCharPlatform* format, ...) {
-  if (format == nullptr || static_cast<const char*>(*format) == nullptr) return {};
-  std::va_list arguments;
-  va_start(arguments, format);
-  COrbStringData result = Formatted(*format, arguments);
-  va_end(arguments);
-  return result;
-}
-
-COrbStringData OrbStringDataFormatW(const OrbCharUnicode* format, ...) {
-  if (format == nullptr || static_cast<const wchar_t*>(*format) == nullptr) return {};
-  const auto buffer = std::make_unique<wchar_t[]>(kWideLimit);
-  std::va_list arguments;
-  va_start(arguments, format);
-  const int length = std::vswprintf(buffer.get(), kWideLimit, *format, arguments);
-  va_end(arguments);
-  if (length < 0) return {};
-  COrbStringData result;
-  result.InitWithUnicode(
-      reinterpret_cast<const unsigned short*>(Utf16FromWide(buffer.get()).c_str()));
-  return result;
+  return Mapped(s, 'a', 'z', orb::platform::Upper);
 }

@@ -19,8 +19,6 @@ constexpr std::uint64_t kTicksPerMicrosecond = 10;
 constexpr std::uint64_t kFractionsPerSecond = 65536;
 /// From 1904-01-01 to 1970-01-01, both 00:00:00 GMT.
 constexpr std::int64_t kSecondsTo1970 = 2'082'844'800;
-/// The last whole second that a tick count holds, in the year 60359.
-constexpr std::uint64_t kLastSecond = UINT64_MAX / kTicksPerSecond;
 
 std::uint64_t WholeSeconds(const UTCDateTime& record) {
   return std::uint64_t{record.highSeconds} << 32 | record.lowSeconds;
@@ -42,12 +40,13 @@ unsigned int DaysInMonth(unsigned int year, unsigned int month) {
   return month == 2 && IsLeapYear(year) ? 29 : kDays[month - 1];
 }
 
-/// The tick count of a second since 1904 and the ticks within it, held to what a tick count can
-/// hold: an instant before 1904 is its beginning, one after its end is its last.
+/// The ticks of a second since 1904 and those within it, held to what a tick count can hold: an
+/// instant before 1904 is its beginning, one after its end is its last tick.
 std::uint64_t TicksAt(std::int64_t second, std::uint64_t within) {
   if (second < 0) return 0;
-  if (static_cast<std::uint64_t>(second) >= kLastSecond) return UINT64_MAX;
-  return static_cast<std::uint64_t>(second) * kTicksPerSecond + within;
+  const auto seconds = static_cast<std::uint64_t>(second);
+  const bool fits = seconds <= (UINT64_MAX - within) / kTicksPerSecond;
+  return fits ? seconds * kTicksPerSecond + within : UINT64_MAX;
 }
 
 /// Digits of a text, `position` and `count` as in the compact form; 0 beyond their end.
@@ -73,44 +72,48 @@ std::string DigitsOf(const COrbStringData& text) {
 /// Writes the few characters of a time.
 class TimeText {
  public:
-  TimeText& Digits(std::uint64_t number, int atLeast) {
-    std::array<char, 20> reversed;
-    int count = 0;
-    for (; number != 0 || count < atLeast; number /= 10) {
-      reversed[static_cast<std::size_t>(count++)] = static_cast<char>('0' + number % 10);
+  void Digits(std::uint64_t number, std::size_t count) {
+    for (std::size_t i = count; i-- > 0; number /= 10) {
+      text_[length_ + i] = static_cast<char>('0' + number % 10);
     }
-    while (count > 0) text_[length_++] = reversed[static_cast<std::size_t>(--count)];
-    return *this;
+    length_ += count;
   }
-  TimeText& Put(char character) {
-    text_[length_++] = character;
-    return *this;
-  }
-  COrbStringData Text() const {
-    return orb::StringAccess::FromUtf8(std::string_view(text_.data(), length_));
-  }
+  void Year(std::int64_t year) { Digits(static_cast<std::uint64_t>(year), year > 9999 ? 5 : 4); }
+  void Separator(char character) { text_[length_++] = character; }
+  COrbStringData Text() const { return orb::StringAccess::FromUtf8({text_.data(), length_}); }
 
  private:
-  std::array<char, 64> text_;
+  std::array<char, 24> text_;
   std::size_t length_ = 0;
 };
 
 COrbStringData CompactText(std::uint64_t ticks) {
   const CivilTime local = LocalFields(ticks);
   TimeText text;
-  text.Digits(static_cast<std::uint64_t>(local.year), 4).Digits(local.month, 2);
-  text.Digits(local.day, 2).Digits(local.hour, 2).Digits(local.minute, 2).Digits(local.second, 2);
-  return text.Digits(ticks % kTicksPerSecond / kTicksPerMillisecond, 3).Text();
+  text.Year(local.year);
+  for (const unsigned field : {local.month, local.day, local.hour, local.minute, local.second}) {
+    text.Digits(field, 2);
+  }
+  text.Digits(ticks % kTicksPerSecond / kTicksPerMillisecond, 3);
+  return text.Text();
+}
+
+void AddField(TimeText* text, char separator, unsigned field) {
+  text->Separator(separator);
+  text->Digits(field, 2);
 }
 
 COrbStringData DisplayText(std::uint64_t ticks, bool dateOnly) {
   const CivilTime local = LocalFields(ticks);
   TimeText text;
-  text.Digits(static_cast<std::uint64_t>(local.year), 4).Put('/');
-  text.Digits(local.month, 2).Put('/').Digits(local.day, 2);
+  text.Year(local.year);
+  AddField(&text, '/', local.month);
+  AddField(&text, '/', local.day);
   if (dateOnly) return text.Text();
-  text.Put(' ').Digits(local.hour, 2).Put(':').Digits(local.minute, 2);
-  return text.Put(':').Digits(local.second, 2).Text();
+  AddField(&text, ' ', local.hour);
+  AddField(&text, ':', local.minute);
+  AddField(&text, ':', local.second);
+  return text.Text();
 }
 
 }  // namespace

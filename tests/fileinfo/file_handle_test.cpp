@@ -20,6 +20,7 @@ namespace {
 namespace fs = std::filesystem;
 using orb::platform::ItemInfo;
 using orb::platform::Items;
+using orb::platform::PathText;
 using orb::platform::Result;
 using orb::platform::Timestamp;
 using orb::test::TempFolder;
@@ -44,7 +45,7 @@ std::uint64_t Seconds(const UTCDateTime& time) {
 
 /// Answers for the real item, with a change that a test makes.
 struct AlteredItems : orb::test::ForwardingItems {
-  Result<ItemInfo> Read(const std::string& path) const override {
+  Result<ItemInfo> Read(PathText path) const override {
     if (failure) return *failure;
     Result<ItemInfo> info = ForwardingItems::Read(path);
     if (volumeFailure) info.Value().volumeReadOnly = *volumeFailure;
@@ -89,21 +90,27 @@ TEST(GetAttribute, TellsFilesFoldersAndPackages) {
 TEST(GetAttribute, AsksForTheCallerAndTheVolume) {
   const TempFolder folder;
   fs::permissions(folder.Path(), fs::perms(0755));
-  for (const int mode : {0666, 0664}) {
-    const std::string file = folder.Write(std::to_string(mode), "");
-    fs::permissions(file, fs::perms(mode));
-    if (::chown(file.c_str(), 0, kNobodysGroup) != 0) GTEST_SKIP() << "needs root";
+  const std::string open = folder.Write("open", "");
+  const std::string closed = folder.Write("closed", "");
+  fs::create_symlink("open", folder / "link");
+  fs::permissions(open, fs::perms(0666));
+  fs::permissions(closed, fs::perms(0664));
+  for (const std::string& path : {open, closed}) {
+    if (::chown(path.c_str(), 0, kNobodysGroup) != 0) GTEST_SKIP() << "needs root";
   }
   ORB_IN_CHILD(orb::test::RunAsUser(kStranger, [&] {
-    EXPECT_EQ(AttributesOf(folder / std::to_string(0666)), kUsual);
-    EXPECT_EQ(AttributesOf(folder / std::to_string(0664)), 0x0CU);
+    EXPECT_EQ(AttributesOf(open), kUsual);
+    COrbFileHandle handle = HandleOf(closed);
+    EXPECT_EQ(handle.GetAttribute(), 0x0CU);
+    EXPECT_EQ(handle.SetAttribute(kOrbFileAttrLocked), kOrbErrAccessDenied);
+    EXPECT_EQ(handle.SetUpdateTime(COrbTime(1ULL)), kOrbErrAccessDenied);
   }));
   ORB_IN_CHILD(orb::test::RunWithPrivateMounts([&] {
     ASSERT_TRUE(orb::test::MakeReadOnlyVolume(folder.Path()));
-    EXPECT_EQ(AttributesOf(folder / std::to_string(0666)), kOrbFileAttrReadable);
+    EXPECT_EQ(AttributesOf(open), kOrbFileAttrReadable);
+    EXPECT_EQ(AttributesOf(folder / "link"), kOrbFileAttrReadable);
     EXPECT_EQ(AttributesOf(folder.Path()), kOrbFileAttrReadable | kOrbFileAttrFolder);
-    COrbFileHandle handle = HandleOf(folder / std::to_string(0666));
-    EXPECT_EQ(handle.SetUpdateTime(COrbTime(1ULL)), kOrbErrAccessDenied);
+    EXPECT_EQ(HandleOf(open).SetUpdateTime(COrbTime(1ULL)), kOrbErrAccessDenied);
   }));
 }
 
@@ -220,10 +227,15 @@ TEST(Collect, LeavesWhatAFailedPassHadFound) {
   EXPECT_EQ(old.GetFileType(), eOrbFileType_Jpeg);
 }
 
-TEST(Collect, OfAnotherPathFillsTheSameCache) {
+TEST(Collect, TakesReferencesAndTexts) {
   const TempFolder folder;
   const COrbStringData file = S(folder.Write("a.mov", "123"));
   const CFStringRef text = file.CreateCopyCFString();
+  FSRef reference;
+  ASSERT_EQ(HandleOf(Text(file)).GetFSRef(&reference), kOrbNoErr);
+  EXPECT_EQ(COrbFileHandle(&reference).GetFileSize(), 3U);
+  EXPECT_EQ(COrbFileHandle(&text).GetFileSize(), 3U);
+  EXPECT_TRUE(COrbFileHandle(static_cast<const FSRef*>(nullptr)).IsEmpty());
   const COrbFileHandle handle;
   EXPECT_EQ(handle.SetCatalogInfo(text), kOrbNoErr);
   EXPECT_EQ(handle.GetFileType(), eOrbFileType_Mov);
@@ -266,18 +278,6 @@ TEST(Assignment, CopiesOrForgetsWhatWasCollected) {
   EXPECT_EQ(collected.GetFileSize(), 0U);
   collected.Free();
   EXPECT_TRUE(collected.IsEmpty());
-}
-
-TEST(Construction, TakesReferencesAndTexts) {
-  const TempFolder folder;
-  const std::string file = folder.Write("a.jpg", "123");
-  FSRef reference;
-  ASSERT_EQ(HandleOf(file).GetFSRef(&reference), kOrbNoErr);
-  EXPECT_EQ(COrbFileHandle(&reference).GetFileSize(), 3U);
-  const CFStringRef text = S(file).CreateCopyCFString();
-  EXPECT_EQ(COrbFileHandle(&text).GetFileSize(), 3U);
-  CFRelease(text);
-  EXPECT_TRUE(COrbFileHandle(static_cast<const FSRef*>(nullptr)).IsEmpty());
 }
 
 TEST(SetAttribute, AdjustsTheLockAlone) {
@@ -411,16 +411,15 @@ TEST(Times, OfTheLastAccessAreReadNow) {
 
 TEST(Times, FailWithTheReason) {
   const TempFolder folder;
-  COrbTime time;
-  COrbFileHandle missing = HandleOf(folder / "missing");
-  EXPECT_EQ(missing.GetAccessTime(&time), kOrbErrNotFound);
-  EXPECT_EQ(missing.SetCreateTime(time), kOrbErrNotFound);
-  EXPECT_EQ(missing.SetUpdateTime(time), kOrbErrNotFound);
-  for (const std::string& path : {std::string(), folder / "\xFF"}) {
+  const std::pair<std::string, OrbResult> kCases[] = {{folder / "missing", kOrbErrNotFound},
+                                                      {"", kOrbErrNoSuchFile},
+                                                      {folder / "\xFF", kOrbErrNoSuchFile}};
+  for (const auto& [path, result] : kCases) {
+    COrbTime time;
     COrbFileHandle handle = HandleOf(path);
-    EXPECT_EQ(handle.GetAccessTime(&time), kOrbErrNoSuchFile);
-    EXPECT_EQ(handle.SetCreateTime(time), kOrbErrNoSuchFile);
-    EXPECT_EQ(handle.SetUpdateTime(time), kOrbErrNoSuchFile);
+    EXPECT_EQ(handle.GetAccessTime(&time), result);
+    EXPECT_EQ(handle.SetCreateTime(time), result);
+    EXPECT_EQ(handle.SetUpdateTime(time), result);
   }
 }
 

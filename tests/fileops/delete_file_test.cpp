@@ -10,8 +10,8 @@
 #include <vector>
 
 #include "support/faults.h"
+#include "support/paths.h"
 #include "support/temp_folder.h"
-#include "support/texts.h"
 
 namespace {
 
@@ -20,13 +20,6 @@ using orb::test::RunAsUser;
 using orb::test::RunWithPrivateMounts;
 using orb::test::TempFolder;
 using Clock = std::chrono::steady_clock;
-
-COrbFilePath PathOf(const std::string& text) {
-  const COrbStringData data = S(text);
-  COrbFilePath path;
-  path.Initialize(&data);
-  return path;
-}
 
 TEST(DeleteFile, RemovesWhatIsWritableAndNotLocked) {
   const TempFolder folder;

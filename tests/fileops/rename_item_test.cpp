@@ -14,11 +14,12 @@
 namespace {
 
 namespace fs = std::filesystem;
-using orb::test::IsLocked;
-using orb::test::Lock;
-using orb::test::PathOf;
 using orb::test::ReadAll;
 using orb::test::TempFolder;
+
+bool IsLocked(const std::string& path) {
+  return (COrbFileHandle(PathOf(path)).GetAttribute() & kOrbFileAttrLocked) != 0;
+}
 
 TEST(RenameFile, KeepsTheLockWhateverHappens) {
   const TempFolder folder;

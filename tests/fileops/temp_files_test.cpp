@@ -19,7 +19,6 @@ namespace {
 
 namespace fs = std::filesystem;
 using orb::test::ChildOutcome;
-using orb::test::PathOf;
 using orb::test::ReadAll;
 using orb::test::RunInChild;
 using orb::test::TempFolder;
@@ -88,7 +87,7 @@ TEST(CreateTempFile, TriesEveryNumberOnceAndEmptiesNobodysFile) {
 TEST(CreateTempFile, SaysWhyItCannot) {
   const TempFolder folder;
   fs::create_directory(folder / "locked");
-  ASSERT_TRUE(orb::test::Lock(folder / "locked"));
+  ASSERT_TRUE(Lock(folder / "locked"));
   const struct {
     std::string folder;
     std::string suffix;

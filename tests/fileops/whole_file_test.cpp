@@ -13,7 +13,6 @@
 namespace {
 
 namespace fs = std::filesystem;
-using orb::test::PathOf;
 using orb::test::ReadAll;
 using orb::test::TempFolder;
 
@@ -53,7 +52,7 @@ TEST(WriteFile, WritesOverTheStartOnly) {
 TEST(WholeFile, SaysWhatCannotBeOpened) {
   const TempFolder folder;
   folder.Write("locked", "photo");
-  ASSERT_TRUE(orb::test::Lock(folder / "locked"));
+  ASSERT_TRUE(Lock(folder / "locked"));
   fs::create_symlink("locked", folder / "link");
   ASSERT_EQ(::mkfifo((folder / "pipe").c_str(), 0666), 0);
   const struct {

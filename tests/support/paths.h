@@ -8,25 +8,14 @@
 
 #include "support/texts.h"
 
-namespace orb::test {
-
-inline COrbFilePath PathOf(const std::string& text) {
-  const COrbStringData data = S(text);
+inline COrbFilePath PathOf(const std::string& utf8) {
+  const COrbStringData text = S(utf8);
   COrbFilePath path;
-  path.Initialize(&data);
+  path.Initialize(&text);
   return path;
 }
 
-inline unsigned int AttributesOf(const std::string& path) {
-  return COrbFileHandle(PathOf(path)).GetAttribute();
+/// Whether the item could be locked.
+inline bool Lock(const std::string& utf8) {
+  return COrbFileHandle(PathOf(utf8)).SetAttribute(kOrbFileAttrLocked) == kOrbNoErr;
 }
-
-inline bool IsLocked(const std::string& path) {
-  return (AttributesOf(path) & kOrbFileAttrLocked) != 0;
-}
-
-inline bool Lock(const std::string& path) {
-  return COrbFileHandle(PathOf(path)).SetAttribute(kOrbFileAttrLocked) == kOrbNoErr;
-}
-
-}  // namespace orb::test

@@ -111,7 +111,6 @@ class ORB_EXPORT COrbFileHandle : public COrbFilePath {
   void CopyCollected(const COrbFileHandle& other);
 
   mutable COrbStringData actualName;
-  mutable COrbStringData displayName;
   mutable bool collected = false;
   mutable unsigned int attributes = 0;
   mutable eOrbFileType fileType = eOrbFileType_Unknown;

@@ -15,8 +15,8 @@ class ORB_EXPORT COrbFilePath {
   COrbFilePath(const COrbFilePath& other);
   /// Leaves the other path empty, through its Free().
   COrbFilePath(COrbFilePath&& other) noexcept;
-  virtual ~COrbFilePath();  // The virtual operations keep their order: callers are compiled against
-                            // it.
+  // The virtual operations keep their order: callers are compiled against it.
+  virtual ~COrbFilePath();
 
   /// Goes through Initialize(), so that a derived class forgets what it knew of the old path.
   virtual COrbFilePath& operator=(const COrbFilePath& other);
@@ -29,13 +29,15 @@ class ORB_EXPORT COrbFilePath {
   /// The path of a referenced item. kOrbErrNoSuchFile when it does not fit into 2047 bytes; the
   /// path is then empty.
   OrbResult Initialize(const FSRef* reference);
-  /// A text that has no UTF-8 form gives an empty path. Always 0.
+  /// A null string and one that has no UTF-8 form give an empty path; an unpaired surrogate becomes
+  /// U+FFFD. Always 0.
   OrbResult Initialize(const CFStringRef* fullPath);
   OrbResult Initialize(const CFURLRef& url);
 
   COrbStringData GetFullPath() const;
-  /// kOrbErrNotFound when nothing exists there, also for an empty path; `reference` is then
-  /// untouched.
+  /// A reference holds the absolute path without separators at its end, links in it as they are.
+  /// kOrbErrNotFound when nothing exists there (a link that leads nowhere does not exist), also for
+  /// an empty path; `reference` is then untouched.
   OrbResult GetFSRef(FSRef* reference) const;
   /// A new CFURL that the caller releases.
   CFURLRef CreateCopyCFURL() const;
@@ -47,6 +49,8 @@ class ORB_EXPORT COrbFilePath {
   OrbResult GetParent(COrbFilePath* parent) const;
 
  private:
+  friend class COrbFileHandle;
+
   COrbStringData path;
 };
 

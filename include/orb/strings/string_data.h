@@ -8,7 +8,9 @@
 #include <orb/thread/critical_section.h>
 
 #include <atomic>
+#include <cstddef>
 #include <cstdint>
+#include <new>
 
 namespace orb {
 struct StringAccess;
@@ -49,8 +51,8 @@ class ORB_EXPORT COrbStringData {
 
   /// The initialisers copy the text up to its terminating zero into a new value; they do not check
   /// that it is valid in its encoding. The text may be one that this string handed out.
-  /// A null pointer gives kOrbErrUnknown and a value without text. std::bad_alloc when there is no
-  /// memory for a value.
+  /// A null pointer gives kOrbErrUnknown and a value without text. std::bad_alloc, and the string
+  /// as it was, when there is no memory for a value.
   OrbResult InitWithSystemEncoding(const char* text);
   OrbResult InitWithUtf8(const char* text);
   OrbResult InitWithUnicode(const unsigned short* text);
@@ -90,7 +92,8 @@ class ORB_EXPORT COrbStringData {
   /// read. A UTF-8 text that is not valid is not empty.
   bool IsEmpty() const;
 
-  /// A new CFString that the caller releases; empty for a text that is not UTF-8. Never null.
+  /// A new CFString that the caller releases; empty for a text that is not UTF-8. Never null:
+  /// std::bad_alloc when there is no memory for it.
   CFStringRef CreateCopyCFString() const;
 
   /// The `count` characters from `start`, fewer where the text ends. No value when `start` is not
@@ -105,6 +108,7 @@ class ORB_EXPORT COrbStringData {
 
   void Share(const COrbStringData& other);
   void TakePlaceOf(COrbStringData& other) noexcept;
+  void Replace(COrbStringValue* made);
   COrbStringValue* EnsureValue() const;
 
   // Every owner of one value stands in a chain, changed under the value's lock alone.
@@ -114,13 +118,15 @@ class ORB_EXPORT COrbStringData {
 };
 
 /// The text that copies of a string share. A copy once stored never changes until Clear(), so its
-/// pointer is published with release and read without the lock.
+/// pointer is published with release, behind its length, and read without the lock.
 class ORB_EXPORT COrbStringData::COrbStringValue {
  public:
   COrbStringValue() = default;
   COrbStringValue(const COrbStringValue&) = delete;
   COrbStringValue& operator=(const COrbStringValue&) = delete;
   virtual ~COrbStringValue();
+  // A value may share its block with its text, so the block's size is not the class's.
+  static void operator delete(void* block) { ::operator delete(block); }
 
   /// Drops all copies; the next initialiser counts again. No other thread may use the value.
   void Clear();
@@ -147,10 +153,64 @@ class ORB_EXPORT COrbStringData::COrbStringValue {
   friend class COrbStringData;
   friend struct orb::StringAccess;
 
+  static COrbStringValue* Make(std::uint32_t encoding, const void* text, std::size_t length);
+
+  const char* StoreSystem(char* text, std::size_t length);
+  const char* StoreUtf8(char* text, std::size_t length);
+  const unsigned short* StoreUnicode(unsigned short* text, std::size_t length);
+  const char* DeriveSystem();
+  const char* DeriveUtf8();
+  const unsigned short* DeriveUnicode();
+
   COrbCriticalSection lock;
   std::atomic<std::uint32_t> master{0};
+  // Whether the value ever had a second owner. Set under the lock by the one that made the second;
+  // read without it by owners, who all came to be after that. False therefore means: mine alone.
+  std::atomic<bool> shared{false};
+  std::uint8_t inBlock = 0;  // The encoding whose copy lies behind the value; 0 for none.
   std::atomic<char*> systemText{nullptr};
   std::atomic<char*> utf8Text{nullptr};
   std::atomic<unsigned short*> unicodeText{nullptr};
+  // In units of each copy, set before its pointer.
+  std::size_t systemLength = 0;
+  std::size_t utf8Length = 0;
+  std::size_t unicodeLength = 0;
   std::atomic<std::uint64_t> scan{0};  // What a scan of the UTF-8 text found, packed; 0 before it.
 };
+
+// Strings are passed by value everywhere: what happens then stands here, so that no call is spent
+// on it beyond those of the lock.
+
+inline COrbStringData::COrbStringData(const COrbStringData& other) { Share(other); }
+
+inline COrbStringData::COrbStringData(COrbStringData&& other) noexcept { TakePlaceOf(other); }
+
+// Nobody may change `other` meanwhile, so its value stays the same and alive.
+inline void COrbStringData::Share(const COrbStringData& other) {
+  COrbStringValue* const theirs = other.value;
+  if (theirs == nullptr) return;
+  theirs->lock.Enter();
+  theirs->shared.store(true, std::memory_order_relaxed);
+  value = theirs;
+  prev = const_cast<COrbStringData*>(&other);
+  next = other.next;
+  if (next != nullptr) next->prev = this;
+  other.next = this;
+  theirs->lock.Leave();
+}
+
+inline void COrbStringData::TakePlaceOf(COrbStringData& other) noexcept {
+  COrbStringValue* const theirs = other.value;
+  if (theirs == nullptr) return;
+  value = theirs;
+  other.value = nullptr;
+  if (!theirs->shared.load(std::memory_order_relaxed)) return;  // No neighbours.
+  theirs->lock.Enter();
+  prev = other.prev;
+  next = other.next;
+  other.prev = nullptr;
+  other.next = nullptr;
+  if (prev != nullptr) prev->next = this;
+  if (next != nullptr) next->prev = this;
+  theirs->lock.Leave();
+}

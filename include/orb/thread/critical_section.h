@@ -8,7 +8,7 @@
 /// entered. Unlocked when made; must be unlocked when destroyed.
 class ORB_EXPORT COrbCriticalSection {
  public:
-  COrbCriticalSection();
+  COrbCriticalSection() = default;
   COrbCriticalSection(const COrbCriticalSection&) = delete;
   COrbCriticalSection& operator=(const COrbCriticalSection&) = delete;
   virtual ~COrbCriticalSection();
@@ -18,5 +18,6 @@ class ORB_EXPORT COrbCriticalSection {
   void Leave() const { pthread_mutex_unlock(&mutex_); }
 
  private:
-  mutable pthread_mutex_t mutex_;
+  // Every text carries a lock: a constant saves making an attribute and calling pthread_mutex_init.
+  mutable pthread_mutex_t mutex_ = PTHREAD_RECURSIVE_MUTEX_INITIALIZER_NP;
 };

@@ -4,6 +4,8 @@
 #include <fcntl.h>
 #include <sys/xattr.h>
 
+#include <algorithm>
+#include <array>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -68,16 +70,21 @@ Result<std::optional<std::string>> ReadSized(Read read) {
 
 using Names = std::vector<std::string>;
 
-Result<Names> ListAttributes(int from) {
-  const auto list =
-      ReadSized([&](char* buffer, std::size_t size) { return ::flistxattr(from, buffer, size); });
-  if (!list) return list.Reason();
+Names SplitNames(std::string_view list) {
   Names names;
-  if (!list.Value()) return names;
-  const std::string_view text = *list.Value();
-  for (std::size_t at = 0; at < text.size(); at += names.back().size() + 1)
-    names.emplace_back(text.substr(at, text.find('\0', at) - at));
+  for (std::size_t at = 0; at < list.size(); at += names.back().size() + 1)
+    names.emplace_back(list.substr(at, list.find('\0', at) - at));
   return names;
+}
+
+Result<Names> ListAttributes(int from) {
+  std::array<char, 1024> few;  // Enough for almost every item, and one call instead of two.
+  const ssize_t size = ::flistxattr(from, few.data(), few.size());
+  if (size >= 0) return SplitNames({few.data(), static_cast<std::size_t>(size)});
+  const auto list =
+      ReadSized([&](char* buffer, std::size_t room) { return ::flistxattr(from, buffer, room); });
+  if (!list) return list.Reason();
+  return list.Value() ? SplitNames(*list.Value()) : Names();
 }
 
 Status CarryOne(int from, int to, const char* name) {
@@ -114,13 +121,16 @@ void CarryModeAndTimes(int to, const struct stat& source) {
   (void)::futimens(to, times);
 }
 
-void CarryCreationTime(int from, int to) {
-  if (const auto created = CreationTime(from)) (void)StoreCreationTime(to, created.Value());
+OwnAttributes OwnOf(const Names& names) {
+  const auto has = [&](const char* name) { return std::ranges::find(names, name) != names.end(); };
+  return {.lock = has(kLockAttribute), .created = has(kCreatedAttribute)};
 }
 
-void CarryLock(int from, int to) {
+bool IsLockedBy(int from, const StatusRecord& status, const OwnAttributes& own) {
+  if (own.lock || HasLockFlag(status)) return true;
+  if (!MayShowReadOnlyAttribute(status)) return false;
   const auto locked = IsLocked(from);
-  if (locked && locked.Value()) (void)SetLocked(to, true);
+  return locked && locked.Value();
 }
 
 }  // namespace
@@ -128,13 +138,16 @@ void CarryLock(int from, int to) {
 Status CarryAttributes(int from, int to, const struct stat& source) {
   const auto names = ListAttributes(from);
   if (!names) return names.Reason();
+  const auto status = ReadStatus(from);
+  if (!status) return status.Reason();
+  const OwnAttributes own = OwnOf(names.Value());
   // An owner without write permission cannot set attributes any more: lists and mode come later.
-  CarryCreationTime(from, to);
+  (void)StoreCreationTime(to, CreationTime(from, status.Value(), own));
   for (const auto chosen : {IsUserAttribute, IsAccessList}) {
     if (Status carried = CarryThose(from, to, names.Value(), chosen); !carried) return carried;
   }
   CarryModeAndTimes(to, source);
-  CarryLock(from, to);
+  if (IsLockedBy(from, status.Value(), own)) (void)SetLocked(to, true);
   return {};
 }
 

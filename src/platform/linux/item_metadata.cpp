@@ -30,8 +30,20 @@ constexpr unsigned kStatusFields = STATX_BASIC_STATS | STATX_BTIME;
 constexpr __u64 kLockFlags = STATX_ATTR_IMMUTABLE | STATX_ATTR_APPEND;
 
 /// A path to what a descriptor stands for, for calls that do not take an O_PATH descriptor. The
-/// kernel does not follow a link that the descriptor itself stands for.
-std::string PathOf(int descriptor) { return "/proc/self/fd/" + std::to_string(descriptor); }
+/// kernel does not follow a link that the descriptor itself stands for. It takes no memory, which
+/// might not be there while a permission is granted for the moment.
+class PathOf {
+ public:
+  explicit PathOf(int descriptor) {
+    char* const digits = std::ranges::copy(kFolder, text_.data()).out;
+    *std::to_chars(digits, text_.data() + text_.size() - 1, descriptor).ptr = '\0';
+  }
+  const char* Text() const { return text_.data(); }
+
+ private:
+  static constexpr std::string_view kFolder = "/proc/self/fd/";
+  std::array<char, 32> text_;
+};
 
 Timestamp FromKernel(const struct statx_timestamp& time) { return {time.tv_sec, time.tv_nsec}; }
 
@@ -57,18 +69,18 @@ Status Ask(int result) { return result == 0 ? Status() : Status(LastError()); }
 
 int ChangeMode(int item, mode_t mode) {
   const int result = ::fchmod(item, mode);
-  return result != 0 && errno == EBADF ? ::chmod(PathOf(item).c_str(), mode) : result;
+  return result != 0 && errno == EBADF ? ::chmod(PathOf(item).Text(), mode) : result;
 }
 
 int SetAttribute(int item, const char* name, std::string_view value) {
   const int result = ::fsetxattr(item, name, value.data(), value.size(), 0);
   if (result == 0 || errno != EBADF) return result;
-  return ::setxattr(PathOf(item).c_str(), name, value.data(), value.size(), 0);
+  return ::setxattr(PathOf(item).Text(), name, value.data(), value.size(), 0);
 }
 
 int RemoveAttribute(int item, const char* name) {
   const int result = ::fremovexattr(item, name);
-  return result != 0 && errno == EBADF ? ::removexattr(PathOf(item).c_str(), name) : result;
+  return result != 0 && errno == EBADF ? ::removexattr(PathOf(item).Text(), name) : result;
 }
 
 /// Only the owner's missing permission can be granted.
@@ -129,7 +141,7 @@ Status SetReadOnlyAttribute(int item, bool locked) {
 Status ClearLockFlags(int item, const StatusRecord& status) {
   if (!S_ISREG(status.stx_mode) && !S_ISDIR(status.stx_mode)) return kNotPermitted;
   const int access = O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
-  const UniqueFd open(Retry([&] { return ::open(PathOf(item).c_str(), access); }));
+  const UniqueFd open(Retry([&] { return ::open(PathOf(item).Text(), access); }));
   if (!open) return LastError();
   int flags = 0;
   if (::ioctl(open.Get(), FS_IOC_GETFLAGS, &flags) != 0) return kNotPermitted;
@@ -214,14 +226,14 @@ ssize_t ItemRef::ListAttributes(char* names, std::size_t size) const {
   if (path_ != nullptr) return ::llistxattr(path_, names, size);
   const ssize_t result = ::flistxattr(descriptor_, names, size);
   if (result >= 0 || errno != EBADF) return result;
-  return ::listxattr(PathOf(descriptor_).c_str(), names, size);
+  return ::listxattr(PathOf(descriptor_).Text(), names, size);
 }
 
 ssize_t ItemRef::GetAttribute(const char* name, char* value, std::size_t size) const {
   if (path_ != nullptr) return ::lgetxattr(path_, name, value, size);
   const ssize_t result = ::fgetxattr(descriptor_, name, value, size);
   if (result >= 0 || errno != EBADF) return result;
-  return ::getxattr(PathOf(descriptor_).c_str(), name, value, size);
+  return ::getxattr(PathOf(descriptor_).Text(), name, value, size);
 }
 
 Result<StatusRecord> ReadStatus(const ItemRef& item) {
@@ -241,7 +253,7 @@ Timestamp ModificationTime(const StatusRecord& status) { return FromKernel(statu
 Timestamp LastAccessTime(const StatusRecord& status) { return FromKernel(status.stx_atime); }
 
 Result<OwnAttributes> FindOwnAttributes(const ItemRef& item) {
-  std::array<char, 1024> names;
+  std::array<char, 256> names;
   const ssize_t size = item.ListAttributes(names.data(), names.size());
   if (size >= 0) return ScanNames({names.data(), static_cast<std::size_t>(size)});
   if (errno != ERANGE) return WithoutNames();

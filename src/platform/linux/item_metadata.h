@@ -13,7 +13,7 @@
 
 /// \file
 /// What this library keeps beside an item's content, its lock and its creation time, and what the
-/// file system records of it.
+/// file system records of it. Descriptors opened with O_PATH need /proc to be mounted.
 
 namespace orb::platform {
 

@@ -1,0 +1,199 @@
+// SPDX-License-Identifier: MIT
+#include <gtest/gtest.h>
+#include <orb/path/file_path.h>
+
+#include <filesystem>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "support/temp_folder.h"
+#include "support/texts.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+using orb::test::TempFolder;
+
+COrbFilePath Path(const std::string& text) {
+  COrbFilePath path;
+  const COrbStringData full = S(text);
+  path.Initialize(&full);
+  return path;
+}
+
+std::string Text(const COrbFilePath& path) { return Text(path.GetFullPath()); }
+
+/// Sees every change of its path, as a class with a cache must, and answers with a code of its own.
+class WatchedPath : public COrbFilePath {
+ public:
+  using COrbFilePath::Initialize;
+  using COrbFilePath::operator=;
+  void Free() override {
+    ++freed;
+    COrbFilePath::Free();
+  }
+  OrbResult Initialize(const COrbStringData* text) override {
+    COrbFilePath::Initialize(text);
+    return 0x77;
+  }
+  int freed = 0;
+};
+
+TEST(FilePath, IsEmptyUntilSetAndKeepsItsText) {
+  COrbFilePath path;
+  EXPECT_TRUE(path.IsEmpty());
+  EXPECT_TRUE(HasNoValue(path.GetFullPath()));
+  const COrbStringData text = S("/a//b/");
+  EXPECT_EQ(path.Initialize(&text), kOrbNoErr);
+  EXPECT_EQ(Text(path), "/a//b/");
+  path = *&path;
+  const COrbFilePath copy = path;
+  EXPECT_EQ(Text(copy), "/a//b/");
+  const COrbFilePath moved = std::move(path);
+  EXPECT_EQ(Text(moved), "/a//b/");
+  EXPECT_TRUE(path.IsEmpty());  // NOLINT(bugprone-use-after-move): the rule under test.
+  path = copy;
+  OrbClearPath(&path);
+  EXPECT_TRUE(OrbIsPathEmpty(path));
+}
+
+TEST(FilePath, EveryChangePassesTheVirtualFree) {
+  const TempFolder folder;
+  FSRef reference;
+  ASSERT_EQ(Path(folder.Path()).GetFSRef(&reference), kOrbNoErr);
+  const CFStringRef text = S("/a").CreateCopyCFString();
+  const CFURLRef url = Path("/b").CreateCopyCFURL();
+  const COrbStringData full = S("/c");
+  WatchedPath path;
+  path.Initialize(&full);
+  path = Path("/d");
+  path.Initialize(&text);
+  path.Initialize(url);
+  EXPECT_EQ(path.freed, 4);
+  path.Initialize(&reference);
+  EXPECT_EQ(Text(path), folder.Path());
+  EXPECT_EQ(path.freed, 5);
+  path = std::as_const(path);
+  EXPECT_EQ(path.freed, 5);
+  const COrbFilePath moved = std::move(static_cast<COrbFilePath&>(path));
+  OrbClearPath(&path);
+  EXPECT_EQ(path.freed, 7);
+  CFRelease(text);
+  CFRelease(url);
+}
+
+TEST(FilePath, TakesPlatformTexts) {
+  COrbFilePath path = Path("/old");
+  const UniChar units[] = {'/', 0xD800, 0xE9};
+  CFStringRef text = CFStringCreateWithCharacters(kCFAllocatorDefault, units, 3);
+  EXPECT_EQ(path.Initialize(&text), kOrbNoErr);
+  EXPECT_EQ(Text(path), "/\xEF\xBF\xBD\xC3\xA9");
+  CFRelease(text);
+  text = nullptr;
+  EXPECT_EQ(path.Initialize(&text), kOrbNoErr);
+  EXPECT_TRUE(path.IsEmpty());
+
+  const CFURLRef url = Path("/a/b/").CreateCopyCFURL();
+  EXPECT_EQ(path.Initialize(url), kOrbNoErr);
+  EXPECT_EQ(Text(path), "/a/b");
+  CFRelease(url);
+  EXPECT_EQ(path.Initialize(CFURLRef{nullptr}), kOrbNoErr);
+  EXPECT_TRUE(path.IsEmpty());
+}
+
+TEST(GetParent, IsTheTextUpToTheLastSeparator) {
+  const std::vector<std::pair<const char*, const char*>> kParents = {
+      {"/a/b", "/a"},
+      {"/a/b/", "/a"},
+      {"/a/b//", "/a/b"},
+      {"/a", "/"},
+      {"/a/", "/"},
+      {"//", "/"},
+      {"a/b", "a"},
+      {"/a/\xFF", "/a"},
+  };
+  for (const auto& [path, parent] : kParents) {
+    COrbFilePath found;
+    EXPECT_EQ(Path(path).GetParent(&found), kOrbNoErr) << path;
+    EXPECT_EQ(Text(found), parent) << path;
+  }
+  COrbFilePath found = Path("old");
+  for (const char* path : {"/", "a", "a/"}) {
+    EXPECT_EQ(Path(path).GetParent(&found), kOrbErrNoSuchFile) << path;
+  }
+  EXPECT_EQ(COrbFilePath().GetParent(&found), kOrbErrEmptyPath);
+  EXPECT_EQ(Text(found), "old");
+}
+
+TEST(GetParent, GoesThroughTheReceiver) {
+  COrbFilePath path = Path("/a/b/c");
+  EXPECT_EQ(path.GetParent(&path), kOrbNoErr);
+  EXPECT_EQ(Text(path), "/a/b");
+  WatchedPath parent;
+  EXPECT_EQ(path.GetParent(&parent), 0x77u);
+  EXPECT_EQ(Text(parent), "/a");
+}
+
+TEST(FileReference, HoldsTheAbsolutePathOfAnExistingItem) {
+  const TempFolder folder;
+  const std::string file = folder.Write("\xC3\xA9 %s", "x");
+  fs::create_symlink("\xC3\xA9 %s", folder / "link");
+  const fs::path old = fs::current_path();
+  fs::current_path(folder.Path());
+  const struct {
+    std::string path;
+    std::string held;
+  } kCases[] = {{file, file},
+                {"\xC3\xA9 %s", fs::current_path().string() + "/\xC3\xA9 %s"},
+                {folder / "link", folder / "link"},
+                {folder.Path() + "//", folder.Path()},
+                {"/", "/"}};
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.path);
+    FSRef reference;
+    EXPECT_EQ(Path(c.path).GetFSRef(&reference), kOrbNoErr);
+    COrbFilePath back;
+    EXPECT_EQ(back.Initialize(&reference), kOrbNoErr);
+    EXPECT_EQ(Text(back), c.held);
+  }
+  fs::current_path(old);
+}
+
+TEST(FileReference, NeedsSomethingAtThePath) {
+  const TempFolder folder;
+  fs::create_symlink("nothing", folder / "dangling");
+  folder.Write("\xFF", "not UTF-8");
+  folder.Write("file", "");
+  for (const std::string& path :
+       {std::string(), folder / "none", folder / "dangling", folder / "\xFF", folder / "file/"}) {
+    FSRef reference{};
+    EXPECT_EQ(Path(path).GetFSRef(&reference), kOrbErrNotFound) << path;
+    EXPECT_EQ(reference.hidden[0], 0);
+    COrbFilePath back = Path("/old");
+    EXPECT_EQ(back.Initialize(&reference), kOrbErrNoSuchFile);
+    EXPECT_TRUE(back.IsEmpty());
+  }
+}
+
+TEST(FileReference, GivesPathsOfUpTo2047Bytes) {
+  const TempFolder folder;
+  std::string deep = folder.Path();
+  while (deep.size() + 201 < 2046) deep += "/" + std::string(200, 'd');
+  fs::create_directories(deep);
+  for (const std::size_t length : {std::size_t{2047}, std::size_t{2048}}) {
+    const std::string path = deep + "/" + std::string(length - deep.size() - 1, 'f');
+    std::ofstream(path) << 'x';
+    FSRef reference;
+    ASSERT_EQ(Path(path).GetFSRef(&reference), kOrbNoErr);
+    COrbStringData text = S("old");
+    COrbFilePath back;
+    const bool fits = length == 2047;
+    EXPECT_EQ(OrbFSRefToFullPath(reference, &text), fits ? kOrbNoErr : kOrbErrNoSuchFile);
+    EXPECT_EQ(Text(text), fits ? path : "old");
+    EXPECT_EQ(back.Initialize(&reference), fits ? kOrbNoErr : kOrbErrNoSuchFile);
+    EXPECT_EQ(Text(back), fits ? path : "");
+  }
+}
+
+}  // namespace

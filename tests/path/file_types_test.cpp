@@ -1,0 +1,87 @@
+// SPDX-License-Identifier: MIT
+#include "path/file_types.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+#include "support/texts.h"
+
+namespace {
+
+eOrbFileType TypeOf(const std::string& extension) {
+  return OrbPathConvertExtensionToType(S(extension));
+}
+
+const struct {
+  std::uint32_t type;
+  std::vector<std::string> extensions;
+} kTypes[] = {
+    {0x01100001, {".jpeg", ".jpg"}}, {0x01100002, {".tif", ".tiff"}},
+    {0x01100003, {".rwq"}},          {0x01100004, {".rwc"}},
+    {0x01100005, {".mpo"}},          {0x01200001, {".pct", ".pict"}},
+    {0x01200002, {".png"}},          {0x01200003, {".bmp"}},
+    {0x01200004, {".crw"}},          {0x01200005, {".cr2"}},
+    {0x02000001, {".mov"}},          {0x02000002, {".mpeg", ".mpg"}},
+    {0x02000003, {".mp4"}},          {0x02000004, {".wmv"}},
+    {0x02000005, {".avi"}},          {0x02000006, {".rwv"}},
+    {0x08000001, {".wav"}},          {0x08000002, {".txt"}},
+    {0x08000003, {".csv"}},          {0x08000004, {".dsq"}},
+    {0x08000005, {".xmp"}},          {0x08000006, {".pqf"}},
+    {0x08000007, {".log"}},          {0x08000008, {".lga"}},
+    {0x08000009, {".lgb"}},          {0x08000010, {".sdcq"}},
+};
+
+TEST(FileType, GoesBothWays) {
+  for (const auto& c : kTypes) {
+    const auto type = static_cast<eOrbFileType>(c.type);
+    std::vector<COrbStringData> found{S("old")};
+    EXPECT_EQ(OrbPathFindTypeExtension(type, found), kOrbNoErr);
+    ASSERT_EQ(found.size(), c.extensions.size());
+    for (std::size_t i = 0; i < found.size(); ++i) {
+      EXPECT_EQ(Text(found[i]), c.extensions[i]);
+      std::string upper = c.extensions[i];
+      for (char& letter : upper) letter = static_cast<char>(std::toupper(letter));
+      EXPECT_EQ(TypeOf(c.extensions[i]), type) << upper;
+      EXPECT_EQ(TypeOf(upper), type) << upper;
+      EXPECT_EQ(orb::FileTypeOfName(S("a.b" + upper)), type) << upper;
+    }
+  }
+}
+
+TEST(FileType, UnknownTypesHaveNoExtension) {
+  for (const int value : {0, 1, 0x0800000A, -1}) {
+    std::vector<COrbStringData> found{S("old")};
+    EXPECT_EQ(OrbPathFindTypeExtension(static_cast<eOrbFileType>(value), found), kOrbErrNotFound);
+    ASSERT_EQ(found.size(), 1u);
+    EXPECT_EQ(Text(found[0]), "old");
+  }
+}
+
+TEST(FileType, OfOtherTextsIsUnknown) {
+  EXPECT_EQ(OrbPathConvertExtensionToType(COrbStringData()), eOrbFileType_Unknown);
+  for (const char* text : {"", ".", "jpg", "..jpg", ".jp", ".jpgx", ".jpegs", ".d/b", ".jpgjpg"}) {
+    EXPECT_EQ(TypeOf(text), eOrbFileType_Unknown) << text;
+  }
+  for (const char* text : {".JP\xC7\xA6", ".jpg\xFF", "\xFF", ".jpg\xCC\x81", "\xEF\xBC\x8Ejpg"}) {
+    EXPECT_EQ(TypeOf(text), eOrbFileType_Unknown) << text;
+  }
+}
+
+TEST(FileType, FollowsFullCaseFolding) {
+  EXPECT_EQ(TypeOf(".c\xC5\xBFv"), eOrbFileType_Csv);       // The long s.
+  EXPECT_EQ(TypeOf(".TI\xEF\xAC\x80"), eOrbFileType_Tiff);  // The ligature ff.
+  EXPECT_EQ(orb::FileTypeOfName(S("x.D\xC5\xBFQ")), eOrbFileType_Dsq);
+}
+
+TEST(FileType, OfANameIsThatOfItsLastPart) {
+  EXPECT_EQ(orb::FileTypeOfName(S("a.tif.JPG")), eOrbFileType_Jpeg);
+  EXPECT_EQ(orb::FileTypeOfName(S("\xC3\xA9t\xC3\xA9.mov")), eOrbFileType_Mov);
+  EXPECT_EQ(orb::FileTypeOfName(S(".png")), eOrbFileType_Png);
+  for (const char* name : {"", "jpg", "a.jpg.", "a.jpg/b", "\xFF.jpg"}) {
+    EXPECT_EQ(orb::FileTypeOfName(S(name)), eOrbFileType_Unknown) << name;
+  }
+}
+
+}  // namespace

@@ -1,0 +1,173 @@
+// SPDX-License-Identifier: MIT
+#include <gtest/gtest.h>
+#include <orb/path/path_text.h>
+
+#include <string>
+#include <vector>
+
+#include "support/texts.h"
+
+namespace {
+
+using Texts = std::vector<std::string>;
+
+/// Asks both forms of a function, which agree on all but the empty path.
+template <typename Function, typename... Rest>
+std::string Both(Function function, const std::string& path, const Rest&... rest) {
+  const std::string text = Text(function(S(path), rest...));
+  COrbFilePath filePath;
+  const COrbStringData full = S(path);
+  filePath.Initialize(&full);
+  const std::string ofPath = Text(function(filePath, rest...));
+  EXPECT_EQ(ofPath, path.empty() ? "" : text);
+  return text;
+}
+
+#define ORB_BOTH(function, ...) \
+  Both([](const auto&... arguments) { return function(arguments...); }, __VA_ARGS__)
+
+Texts Pieces(const COrbStringData& path) {
+  std::vector<COrbStringData> pieces{S("old")};
+  OrbSplitFilePath(path, &pieces);
+  Texts texts;
+  for (const COrbStringData& piece : pieces) texts.push_back(Text(piece));
+  return texts;
+}
+
+TEST(PathText, FindsExtensionAndFileName) {
+  const struct {
+    const char *path, *dotted, *extension, *name, *withoutExtension;
+  } kCases[] = {
+      {"/a/b.tar.gz", ".gz", "gz", "b.tar.gz", "b.tar"},
+      {"/a/b", "", "", "b", "b"},
+      {"/a.d/b", ".d/b", "d/b", "b", "b"},
+      {"/a/b.", ".", "", "b.", "b"},
+      {"/a/.profile", ".profile", "profile", ".profile", ""},
+      {"/a/b/", "", "", "", ""},
+      {"b.c", ".c", "c", "b.c", "b"},
+      {"", "", "", "", ""},
+      {"/a.\xCC\x81x", ".\xCC\x81x", "\xCC\x81x", "a.\xCC\x81x", "a"},  // Found literally.
+      {"/\xFF.c", "", "", "/\xFF.c", "/\xFF.c"},  // Not UTF-8: nothing is found.
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.path);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, c.path, true), c.dotted);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, c.path, false), c.extension);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindFileName, c.path, false), c.name);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindFileName, c.path, true), c.withoutExtension);
+  }
+}
+
+TEST(PathText, TellsNoValueFromTheEmptyText) {
+  EXPECT_TRUE(HasNoValue(OrbPathFindExtension(S("/a"), true)));
+  EXPECT_TRUE(HasNoValue(OrbPathFindFileName(S("/a/"), false)));
+  EXPECT_FALSE(HasNoValue(OrbPathFindFileName(S("/a/.b"), true)));
+  EXPECT_FALSE(HasNoValue(OrbPathRemoveBackslash(S("/"))));
+  EXPECT_TRUE(HasNoValue(OrbPathAddBackslash(COrbFilePath())));
+  EXPECT_FALSE(OrbPathIsEndofInvalidCharactor(S("/a.")));
+}
+
+TEST(PathText, SplitsIntoThePiecesThatAreNotEmpty) {
+  EXPECT_EQ(Pieces(S("/a//b.c/")), (Texts{"a", "b.c"}));
+  EXPECT_EQ(Pieces(S("b.c")), Texts{"b.c"});
+  EXPECT_EQ(Pieces(S("//")), Texts{});
+  EXPECT_EQ(Pieces(S("")), Texts{});
+  EXPECT_EQ(Pieces(S("/\xFF/b")), Texts{});
+  OrbSplitFilePath(S("/a"), nullptr);
+
+  std::vector<COrbStringData> pieces{S("old")};
+  OrbSplitFilePath(COrbFilePath(), &pieces);
+  EXPECT_EQ(pieces.size(), 1u);
+  pieces[0] = S("x/y");
+  OrbSplitFilePath(pieces[0], &pieces);  // The path is one of the old pieces.
+  ASSERT_EQ(pieces.size(), 2u);
+  EXPECT_EQ(Text(pieces[1]), "y");
+}
+
+TEST(PathText, RenamesFromThePieces) {
+  const struct {
+    const char *path, *given, *extensionRenamed, *nameRenamed;
+  } kCases[] = {
+      {"/a/b.jpg", ".tif", "/a/b.tif", "/a/.tif.jpg"},
+      {"/a/b.jpg", "c", "/a/b.c", "/a/c.jpg"},
+      {"/a/b.jpg", "", "/a/b", "/a/.jpg"},
+      {"/a/b.jpg", ".", "/a/b", "/a/..jpg"},
+      {"/a//b.jpg/", "c", "/a/b.c", "/a/c.jpg/"},
+      {"/a.d/b", "c", "/a.d/b.c", "/a.d/c.d/b"},
+      {"b.jpg", "c.x", "/b.c.x", "/c.x.jpg"},
+      {"/.b", "..x", "/..x", "/..x.b"},
+      {"//", "x", ".x", "x"},
+      {"", "x", ".x", "x"},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(testing::Message() << c.path << " with " << c.given);
+    EXPECT_EQ(ORB_BOTH(OrbPathRenameExtension, c.path, S(c.given)), c.extensionRenamed);
+    EXPECT_EQ(ORB_BOTH(OrbPathRenameFileName, c.path, S(c.given)), c.nameRenamed);
+  }
+}
+
+TEST(PathText, TakesAndAddsOneSeparator) {
+  const struct {
+    const char *path, *without, *with;
+  } kCases[] = {
+      {"/a/", "/a", "/a/"},
+      {"/a", "/a", "/a/"},
+      {"/", "", "/"},
+      {"", "", "/"},
+      {"/a//", "/a/", "/a//"},
+      {"\xFF/", "\xFF", "\xFF/"},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.path);
+    EXPECT_EQ(ORB_BOTH(OrbPathRemoveBackslash, c.path), c.without);
+    EXPECT_EQ(ORB_BOTH(OrbPathAddBackslash, c.path), c.with);
+  }
+}
+
+TEST(ComparePath, OrdersByLengthFirst) {
+  const struct {
+    const char *a, *b;
+    int exact, noCase;
+  } kCases[] = {
+      {"/a", "/a/", 0, 0},
+      {"/ab", "/a", 1, 1},
+      {"/b", "/abcd", -3, -3},
+      {"/a/B", "/a/b", -1, 0},
+      {"/A/b/", "/a/B", -1, 0},
+      {"/", "", 0, 0},
+      {"/a//", "/a", 1, 1},
+      {"/\xC3\xA9", "/ab", 1, 1},
+      {"/\xC3\xA9", "/\xC3\x89", 1, 0},
+      {"/\xFF", "/a", 0, 0},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(testing::Message() << c.a << " and " << c.b);
+    EXPECT_EQ(OrbPathCompare(S(c.a), S(c.b)), c.exact);
+    EXPECT_EQ(OrbPathCompare(S(c.b), S(c.a)), -c.exact);
+    EXPECT_EQ(OrbPathCompareNoCase(S(c.a), S(c.b)), c.noCase);
+  }
+}
+
+TEST(EqualOrRoot, IsThePathOrAnAncestor) {
+  const struct {
+    const char *a, *b;
+    bool plain, withSeparator;
+  } kCases[] = {
+      {"/a/b", "/A/B/c", true, true},
+      {"/a/b", "/a/bc", true, false},
+      {"/a/b/", "/a/b", true, true},
+      {"/a/b", "/a/b/", true, true},
+      {"/a/b/c", "/a/b", false, false},
+      {"", "/a", false, false},
+      {"/a", "", false, false},
+      {"/", "/a", true, true},
+      {"/\xC3\x89", "/\xC3\xA9/x", true, true},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(testing::Message() << c.a << " and " << c.b);
+    EXPECT_EQ(OrbPathIsEqualOrRootActually(S(c.a), S(c.b), false), c.plain);
+    EXPECT_EQ(OrbPathIsEqualOrRootActually(S(c.a), S(c.b), true), c.withSeparator);
+  }
+}
+
+}  // namespace

@@ -1,0 +1,126 @@
+// SPDX-License-Identifier: MIT
+#include "platform/calendar.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <ctime>
+#include <random>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "support/time_zone.h"
+
+namespace orb::platform {
+
+namespace {
+
+using orb::test::TimeZone;
+
+constexpr std::int64_t k1904 = -2'082'844'800;
+constexpr std::int64_t k2200 = 7'258'118'400;
+
+CivilTime SystemFields(std::time_t instant) {
+  std::tm fields{};
+  EXPECT_NE(::localtime_r(&instant, &fields), nullptr);
+  const auto field = [](int number) { return static_cast<unsigned>(number); };
+  return {fields.tm_year + std::int64_t{1900},
+          field(fields.tm_mon + 1),
+          field(fields.tm_mday),
+          field(fields.tm_hour),
+          field(fields.tm_min),
+          field(fields.tm_sec)};
+}
+
+void ExpectAgreement(std::int64_t instant) {
+  const CivilTime fields = SystemFields(instant);
+  ASSERT_EQ(LocalFromInstant(instant), fields) << instant;
+  // In an overlap it is the other instant of the same fields.
+  ASSERT_EQ(SystemFields(InstantFromLocal(fields)), fields) << instant;
+}
+
+TEST(Calendar, AgreesWithTheSystemInEveryZone) {
+  std::mt19937_64 random(1904);
+  std::uniform_int_distribution<std::int64_t> anyInstant(k1904, k2200);
+  const char* const kZones[] = {
+      "UTC",
+      "Europe/Paris",
+      "America/St_Johns",
+      "America/Sao_Paulo",
+      "America/Boa_Vista",
+      "Australia/Lord_Howe",
+      "Asia/Kathmandu",
+      "Africa/Casablanca",
+      "Pacific/Apia",
+      "EST5EDT,M3.2.0,M11.1.0",
+      "no such zone",
+  };
+  for (const char* name : kZones) {
+    SCOPED_TRACE(name);
+    const TimeZone zone(name);
+    for (int i = 0; i < 3000; ++i) ExpectAgreement(anyInstant(random));
+    for (std::int64_t at = 1'700'000'000; at < 1'732'000'000; at += 1799) ExpectAgreement(at);
+  }
+}
+
+TEST(Calendar, SkippedAndRepeatedTimesHaveOneInstant) {
+  const struct {
+    const char* zone;
+    CivilTime local;
+    std::int64_t instant;
+  } kCases[] = {
+      {"Europe/Paris", {2024, 3, 31, 2, 30, 0}, 1'711'848'600},   // Skipped.
+      {"Europe/Paris", {2024, 10, 27, 2, 30, 0}, 1'729'989'000},  // Repeated.
+      {"Pacific/Apia", {2011, 12, 30, 12, 0, 0}, 1'325'282'400},  // A whole day skipped.
+      {"Pacific/Apia", {2011, 12, 31, 12, 0, 0}, 1'325'282'400},  // The same instant by right.
+      {"Australia/Lord_Howe", {2024, 4, 7, 1, 45, 0}, 1'712'414'700},
+      {"America/Sao_Paulo", {2018, 11, 4, 0, 15, 0}, 1'541'301'300},
+  };
+  for (const auto& c : kCases) {
+    const TimeZone zone(c.zone);
+    SCOPED_TRACE(testing::Message() << c.zone << ' ' << c.instant);
+    EXPECT_EQ(InstantFromLocal(c.local), c.instant);
+    for (const int daylight : {1, 0}) {  // mktime remembers which it was.
+      std::tm other{};
+      other.tm_year = 124;
+      other.tm_isdst = daylight;
+      std::mktime(&other);
+      EXPECT_EQ(InstantFromLocal(c.local), c.instant);
+    }
+  }
+}
+
+TEST(Calendar, NoticesAnotherZoneWhereverItStands) {
+  const TimeZone paris("Europe/Paris");
+  const std::string longName = "/usr/share/zoneinfo" + std::string(200, '/') + "Asia/Kathmandu";
+  EXPECT_EQ(LocalFromInstant(0).hour, 1u);
+  ::unsetenv("TZ");
+  ::tzset();
+  ExpectAgreement(0);
+  std::vector<std::string> names;
+  for (int i = 0; i < 50; ++i) {  // Until the environment has been moved.
+    ::setenv(names.emplace_back("ORB_TEST_" + std::to_string(i)).c_str(), "x", 1);
+    ExpectAgreement(i);
+  }
+  ::setenv("TZ", longName.c_str(), 1);  // Nobody calls tzset() here.
+  EXPECT_EQ(LocalFromInstant(0), (CivilTime{1970, 1, 1, 5, 30, 0}));
+  for (const std::string& name : names) ::unsetenv(name.c_str());
+  EXPECT_EQ(LocalFromInstant(0).minute, 30u);
+  ::setenv("TZ", "Asia/Tokyo", 1);
+  EXPECT_EQ(LocalFromInstant(0).hour, 9u);
+  EXPECT_EQ(LocalFromInstant(1'000'000'000).hour, 10u);  // Not asked for before.
+  std::thread([] { EXPECT_EQ(LocalFromInstant(0).hour, 9u); }).join();
+}
+
+TEST(Calendar, ReachesFarYears) {
+  const TimeZone zone("Europe/Paris");
+  for (const std::int64_t year : {0, 1, 1599, 1900, 60359, 1'000'000}) {
+    const CivilTime local{year, 2, 28, 23, 59, 59};
+    EXPECT_EQ(LocalFromInstant(InstantFromLocal(local)), local);
+  }
+  EXPECT_GT(InstantFromLocal({0xFFFFFFFF, 12, 31, 23, 59, 59}), InstantFromLocal({1'000'000}));
+}
+
+}  // namespace
+}  // namespace orb::platform

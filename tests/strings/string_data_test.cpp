@@ -1,0 +1,294 @@
+// SPDX-License-Identifier: MIT
+#include <gtest/gtest.h>
+#include <orb/strings/string_data.h>
+#include <sys/resource.h>
+
+#include <array>
+#include <atomic>
+#include <string>
+#include <thread>
+#include <utility>
+#include <vector>
+
+#include "strings/string_access.h"
+#include "support/texts.h"
+
+namespace {
+
+using Value = COrbStringData::COrbStringValue;
+
+const unsigned short* Units(const char16_t* text) {
+  return reinterpret_cast<const unsigned short*>(text);
+}
+
+std::u16string UnitsOf(const COrbStringData& text) {
+  return reinterpret_cast<const char16_t*>(text.GetPtrUnicode());
+}
+
+TEST(StringData, WithoutValueGetsOneFromAPointerAccessor) {
+  COrbStringData text;
+  EXPECT_TRUE(text.IsEmpty());
+  EXPECT_EQ(text.GetLengthChar(), 0U);
+  EXPECT_EQ(text.GetLengthByteSystemEncoding(), 0U);
+  EXPECT_EQ(text.GetLengthByteUtf8(), 0U);
+  EXPECT_EQ(text.GetLengthByteUnicode(), 0U);
+  EXPECT_EQ(text.GetLengthBytePlatform(), 0U);
+  EXPECT_TRUE(HasNoValue(text));
+  EXPECT_TRUE(HasNoValue(COrbStringData(text)));
+  EXPECT_STREQ(text.GetPtrPlatform(), "");
+  EXPECT_TRUE(text.HasValueUtf8());
+  EXPECT_TRUE(text.IsEmpty());
+  EXPECT_STREQ(COrbStringData().GetPtrSystemEncoding(), "");
+  EXPECT_EQ(UnitsOf(COrbStringData()), u"");
+}
+
+TEST(StringData, FromANullPointerHasNoText) {
+  COrbStringData text = S("old");
+  EXPECT_EQ(text.InitWithUtf8(nullptr), 0x1008U);
+  EXPECT_TRUE(text.IsEmpty());
+  EXPECT_STREQ(text.GetPtrUtf8(), "");
+  EXPECT_EQ(text.InitWithSystemEncoding(nullptr), 0x1008U);
+  EXPECT_TRUE(HasNoValue(text));
+  EXPECT_EQ(text.GetLengthByteUnicode(), 0U);
+  EXPECT_TRUE(text.HasValueUnicode());  // A length in bytes is one of a copy.
+  EXPECT_EQ(text.InitWithUnicode(nullptr), 0x1008U);
+  EXPECT_EQ(text.GetLengthChar(), 0U);
+  EXPECT_TRUE(HasNoValue(text));
+  text = S("old");
+  EXPECT_EQ(text.InitWithCFString(nullptr), 0x1008U);
+  EXPECT_TRUE(HasNoValue(text));
+}
+
+TEST(StringData, ReadsTheSameInEachEncoding) {
+  const struct {
+    const char* utf8;
+    std::u16string units;
+    const char* system;
+  } kCases[] = {
+      {"", u"", ""},
+      {" ", u" ", " "},
+      {"photo.jpg", u"photo.jpg", "photo.jpg"},
+      {"\xC3\xA9", u"\u00E9", "\x8E"},
+      {"\xE2\x82\xAC 5", u"\u20AC 5", "\xDB 5"},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.utf8);
+    const COrbStringData texts[] = {
+        OrbCharUtf8(c.utf8), OrbCharSystem(c.system), OrbCharUnicode(Units(c.units.c_str()))};
+    for (const COrbStringData& text : texts) {
+      EXPECT_EQ(text.GetLengthChar(), c.units.size());
+      EXPECT_EQ(text.IsEmpty(), c.units.empty());
+      EXPECT_EQ(text.GetLengthByteUtf8(), std::string(c.utf8).size());
+      EXPECT_STREQ(text.GetPtrUtf8(), c.utf8);
+      EXPECT_STREQ(text.GetPtrSystemEncoding(), c.system);
+      EXPECT_EQ(text.GetLengthByteSystemEncoding(), std::string(c.system).size());
+      EXPECT_EQ(UnitsOf(text), c.units);
+      EXPECT_EQ(text.GetLengthByteUnicode(), 2 * c.units.size());
+      EXPECT_EQ(text.GetPtrUtf8(), text.GetPtrUtf8());
+    }
+  }
+  EXPECT_EQ(S("\U0001F600").GetLengthChar(), 2U);
+  EXPECT_EQ(S("\U0001F600").GetLengthByteUnicode(), 4U);
+}
+
+TEST(StringData, DerivesThroughUtf8) {
+  COrbStringData text{OrbCharSystem("\x8E")};
+  EXPECT_EQ(UnitsOf(text), u"\u00E9");
+  EXPECT_TRUE(text.HasValueUtf8());
+  text.InitWithUnicode(Units(u"\u65E5\xD800"));
+  EXPECT_FALSE(text.HasValueUtf8());
+  EXPECT_STREQ(text.GetPtrSystemEncoding(), "??");
+  EXPECT_STREQ(text.GetPtrUtf8(), "\xE6\x97\xA5\xEF\xBF\xBD");
+  EXPECT_EQ(text.GetLengthChar(), 2U);
+}
+
+TEST(StringData, LongTextsReadAsShortOnesDo) {
+  for (const std::size_t count : {84U, 85U, 86U, 256U, 257U, 5000U}) {
+    std::string utf8;
+    std::u16string units;
+    for (std::size_t i = 0; i < count; ++i) {
+      utf8 += "\xE6\x97\xA5";
+      units += u"\u65E5";
+    }
+    const COrbStringData fromUtf8 = S(utf8);
+    EXPECT_EQ(UnitsOf(fromUtf8), units);
+    for (std::size_t i = count; i < 2 * (count + 1); ++i) {
+      ASSERT_EQ(fromUtf8.GetPtrUnicode()[i], 0) << i;  // Room for twice the units, all zero.
+    }
+    EXPECT_EQ(Text(COrbStringData(OrbCharUnicode(Units(units.c_str())))), utf8);
+  }
+}
+
+TEST(StringData, ThatIsNoUtf8IsEmptyInTheOthersButNotItself) {
+  for (const std::string& bad : {std::string("\xFF"), std::string(1000, 'x') + "\xC3"}) {
+    const COrbStringData text = S(bad);
+    EXPECT_EQ(text.GetLengthChar(), 0U);
+    EXPECT_FALSE(text.IsEmpty());
+    EXPECT_EQ(text.GetLengthByteUtf8(), bad.size());
+    EXPECT_EQ(UnitsOf(text), u"");
+    EXPECT_EQ(text.GetLengthByteUnicode(), 0U);
+    EXPECT_STREQ(text.GetPtrSystemEncoding(), "");
+    CFStringRef copy = text.CreateCopyCFString();
+    ASSERT_NE(copy, nullptr);
+    EXPECT_EQ(CFStringGetLength(copy), 0);
+    CFRelease(copy);
+  }
+}
+
+TEST(StringData, GoesThroughCFStringAndBack) {
+  const COrbStringData text = S("\xC3\xA9\xF0\x9F\x98\x80");
+  CFStringRef copy = text.CreateCopyCFString();
+  EXPECT_EQ(CFGetRetainCount(copy), 1);
+  COrbStringData back;
+  EXPECT_EQ(back.InitWithCFString(copy), 0U);
+  EXPECT_EQ(Text(back), Text(text));
+  CFRelease(copy);
+  copy = COrbStringData().CreateCopyCFString();
+  ASSERT_NE(copy, nullptr);
+  EXPECT_EQ(back.InitWithCFString(copy), 0U);
+  EXPECT_TRUE(back.HasValueUtf8());
+  CFRelease(copy);
+}
+
+TEST(StringData, CopiesShareOneValueAndKeepIt) {
+  COrbStringData a = S("old");
+  COrbStringData b = a;
+  COrbStringData c(a);
+  const char* old = a.GetPtrUtf8();
+  EXPECT_EQ(b.GetPtrUtf8(), old);
+  const unsigned short* units = c.GetPtrUnicode();
+  EXPECT_TRUE(b.HasValueUnicode());
+  a.InitWithUtf8("new");
+  EXPECT_EQ(b.GetPtrUnicode(), units);
+  b = a;
+  EXPECT_STREQ(c.GetPtrUtf8(), "old");
+  EXPECT_EQ(c.GetPtrUtf8(), old);
+  b = *&b;
+  EXPECT_STREQ(b.GetPtrUtf8(), "new");
+  b = COrbStringData(b);
+  b = COrbStringData();
+  EXPECT_TRUE(HasNoValue(b));
+}
+
+TEST(StringData, MovesTakeThePlaceOfTheirSource) {
+  for (const int owners : {1, 2, 3}) {
+    COrbStringData source = S("text");
+    std::vector<COrbStringData> others(static_cast<std::size_t>(owners - 1), source);
+    COrbStringData moved(std::move(source));
+    EXPECT_TRUE(HasNoValue(source));  // NOLINT(bugprone-use-after-move): a promise.
+    source = std::move(moved);
+    EXPECT_TRUE(HasNoValue(moved));  // NOLINT(bugprone-use-after-move)
+    others.clear();
+    EXPECT_STREQ(source.GetPtrUtf8(), "text");
+  }
+}
+
+TEST(StringData, MayBeInitialisedFromItsOwnText) {
+  COrbStringData text = S("a longer text than any small buffer would hold");
+  const std::string before = Text(text);
+  EXPECT_EQ(text.InitWithUtf8(text.GetPtrUtf8()), 0U);
+  EXPECT_EQ(Text(text), before);
+  EXPECT_EQ(text.InitWithUnicode(text.GetPtrUnicode()), 0U);
+  EXPECT_EQ(Text(text), before);
+  EXPECT_EQ(text.InitWithSystemEncoding(text.GetPtrSystemEncoding() + 2), 0U);
+  EXPECT_EQ(Text(text), before.substr(2));
+}
+
+TEST(StringValue, KeepsItsFirstTextUntilCleared) {
+  Value value;
+  EXPECT_EQ(value.InitWithUtf8(nullptr), 0x1008U);
+  EXPECT_TRUE(value.IsEmpty());
+  EXPECT_EQ(value.InitWithUtf8("first"), 0U);
+  EXPECT_EQ(value.InitWithUtf8("second"), 0U);
+  EXPECT_EQ(value.InitWithSystemEncoding("second"), 0U);
+  EXPECT_EQ(value.InitWithUnicode(Units(u"second")), 0U);
+  EXPECT_STREQ(value.GetPtrSystemEncoding(), "first");
+  EXPECT_EQ(value.GetLengthByteUnicode(), 10U);
+  value.Clear();
+  EXPECT_FALSE(value.HasValueUtf8() || value.HasValueSystemEncoding() || value.HasValueUnicode());
+  EXPECT_EQ(value.InitWithUnicode(Units(u"third")), 0U);
+  EXPECT_EQ(value.GetLengthChar(), 5U);
+  EXPECT_STREQ(value.GetPtrUtf8(), "third");
+  delete new Value;
+}
+
+TEST(StringAccess, MakesAndReadsAPartOfAText) {
+  const COrbStringData text =
+      orb::StringAccess::FromUtf8(std::string_view("d\xC3\xA9j\xC3\xA0").substr(0, 4));
+  EXPECT_STREQ(text.GetPtrUtf8(), "d\xC3\xA9j");
+  EXPECT_EQ(orb::StringAccess::Read(text).scan.charLength, 3U);
+  EXPECT_EQ(orb::StringAccess::Read(text).bytes.size(), 4U);
+}
+
+#if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+/// While it lives, no block of this size is to be had.
+class ScarceMemory {
+ public:
+  explicit ScarceMemory(rlim_t most) {
+    getrlimit(RLIMIT_AS, &before_);
+    const rlimit scarce = {most, before_.rlim_max};
+    setrlimit(RLIMIT_AS, &scarce);
+  }
+  ~ScarceMemory() { setrlimit(RLIMIT_AS, &before_); }
+  ScarceMemory(const ScarceMemory&) = delete;
+  ScarceMemory& operator=(const ScarceMemory&) = delete;
+
+ private:
+  rlimit before_ = {};
+};
+
+TEST(StringData, WithoutMemoryForACopyHasNone) {
+  const std::string huge(std::size_t{64} << 20, 'x');
+  const COrbStringData text = S(huge);
+  COrbStringData late;
+  {
+    const ScarceMemory scarce(1);
+    EXPECT_EQ(text.GetPtrUnicode(), nullptr);
+    EXPECT_EQ(text.GetLengthByteUnicode(), 0U);
+    EXPECT_EQ(text.GetPtrSystemEncoding(), nullptr);
+    EXPECT_EQ(late.InitWithUtf8(huge.c_str()), 0U);
+  }
+  EXPECT_NE(text.GetPtrUnicode(), nullptr);
+  // The text that found no room counts as none.
+  EXPECT_TRUE(late.IsEmpty());
+  EXPECT_FALSE(late.HasValueUtf8());
+  EXPECT_EQ(late.GetLengthChar(), 0U);
+  EXPECT_STREQ(late.GetPtrUtf8(), "");
+}
+#endif
+
+/// Each thread works on strings of its own; what they share is the value, and the neighbours in its
+/// chain.
+TEST(StringData, OfOneValueMayBeUsedOnManyThreads) {
+  constexpr int kTurns = 100;
+  const COrbStringData source{OrbCharUnicode(Units(u"na\u00EFve \u20AC 5"))};
+  std::atomic<int> wrong = 0;
+  const auto check = [&wrong](const COrbStringData& text) {
+    if (text.GetLengthByteUtf8() != 12 || Text(text) != "na\xC3\xAFve \xE2\x82\xAC 5") ++wrong;
+    if (std::string(text.GetPtrSystemEncoding()) != "na\x95ve \xDB 5") ++wrong;
+    if (UnitsOf(text) != u"na\u00EFve \u20AC 5") ++wrong;
+  };
+  const auto work = [&](COrbStringData own) {
+    for (int i = 0; i < kTurns; ++i) {
+      std::vector<COrbStringData> copies(3, i % 8 == 0 ? source : own);
+      copies.push_back(std::move(copies[0]));
+      copies[1] = source;
+      copies[2].Clear();
+      check(copies[3]);
+      copies[0] = copies[1];
+      own = std::move(copies[0]);
+      check(own);
+    }
+  };
+  for (int round = 0; round < 100; ++round) {
+    // Nothing is derived yet, so the threads run into each other there as well.
+    COrbStringData fresh{OrbCharUnicode(source.GetCharUnicode())};
+    std::vector<std::thread> threads;
+    for (int i = 0; i < 4; ++i) threads.emplace_back(work, fresh);
+    fresh.Clear();
+    for (std::thread& thread : threads) thread.join();
+  }
+  EXPECT_EQ(wrong, 0);
+}
+
+}  // namespace
