@@ -24,7 +24,8 @@ constexpr std::size_t kRoomyName = 200;
 bool DifferInCaseOnly(std::string_view a, std::string_view b) {
   const auto unitsA = Utf16FromUtf8(a);
   const auto unitsB = Utf16FromUtf8(b);
-  return a != b && unitsA && unitsB && CompareFolded(*unitsA, *unitsB) == 0;
+  if (a == b || !unitsA || !unitsB) return false;
+  return FormOfRun(Form::kFolded, *unitsA) == FormOfRun(Form::kFolded, *unitsB);
 }
 
 Result<bool> Lists(int folder, std::string_view name) {
