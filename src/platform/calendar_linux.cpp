@@ -21,7 +21,7 @@ constexpr std::int64_t kBlockLength = std::int64_t{1} << kBlockBits;
 // (A rule in TZ itself could: a summer time of less than three days may be missed.)
 constexpr std::int64_t kProbeDistance = std::int64_t{1} << 18;
 // More than any zone is ahead of or behind GMT, and less than half of the distance above.
-constexpr std::int64_t kFarthestOffset = 26 * 3600;
+constexpr std::int64_t kFarthestOffset = std::int64_t{26} * 3600;
 
 constexpr std::int64_t kNoBlock = INT64_MIN;
 constexpr std::int64_t kNoChange = INT64_MAX;

@@ -9,6 +9,8 @@
 /// The full path of a file or folder, "/"-separated and kept exactly as it was set. Nothing is
 /// normalised and nothing is looked up until it is asked for. An empty path means no file.
 /// Different objects may be used on different threads; sharing one needs the caller's own lock.
+// Assignment is virtual, so there is one alone.
+// NOLINTNEXTLINE(cppcoreguidelines-special-member-functions)
 class ORB_EXPORT COrbFilePath {
  public:
   COrbFilePath() = default;
