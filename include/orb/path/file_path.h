@@ -47,7 +47,7 @@ class ORB_EXPORT COrbFilePath {
   /// Puts the folder that holds this item into `parent`, ignoring one trailing "/". `parent` may be
   /// this path. It stays as it was on failure: kOrbErrEmptyPath for an empty path,
   /// kOrbErrNoSuchFile for the root and for a bare name, neither of which has a parent,
-  /// kOrbErrNotFound when the text has no UTF-8 form.
+  /// kOrbErrNotFound when the text has no UTF-8 form, and for a null `parent`.
   OrbResult GetParent(COrbFilePath* parent) const;
 
  private:
