@@ -135,6 +135,7 @@ TEST(PathText, ComparesPathsAndTellsAncestors) {
       {"/\xC3\xA9", "/ab", 1, 1, false, false},  // By bytes.
       {"/\xC3\xA9", "/\xC3\x89", 1, 0, true, true},
       {"/\xC3\x89", "/\xC3\xA9/x", -2, -2, true, true},
+      {"/ff", "/\xEF\xAC\x80", -1, -1, false, false},  // The ligature ff.
       {"/\xFF", "/a", 0, 0, true, true},
   };
   for (const auto& c : kCases) {

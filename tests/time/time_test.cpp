@@ -57,8 +57,11 @@ TEST(TimeValue, IsTicksAndFraction) {
     EXPECT_EQ(time.fraction, 0);
     time.fraction = c.fraction;
     EXPECT_FALSE(time.IsEmpty());
-    EXPECT_EQ(time, COrbTime(c.value));
-    EXPECT_LT(time, COrbTime(c.value + 1));
+    const COrbTime same = c.value;
+    const COrbTime next = c.value + 1;
+    EXPECT_TRUE(time == same && time <= same && time >= same && time != next);
+    EXPECT_TRUE(time < next && time <= next && next > time && next >= time);
+    EXPECT_FALSE(time != same || time < same || time > same || next <= time || time >= next);
     const UTCDateTime record = time;
     EXPECT_EQ(std::memcmp(&record, &c.record, sizeof(record)), 0);
     time = 0;
