@@ -6,6 +6,7 @@
 #include <limits>
 #include <string>
 #include <string_view>
+#include <utility>
 
 #include "strings/string_access.h"
 
@@ -33,32 +34,30 @@ COrbStringData CutAtEnd(std::string_view rest) {
   return rest.empty() ? COrbStringData() : StringAccess::FromUtf8(rest);
 }
 
-COrbStringData WithoutExtension(const COrbStringData& name) {
-  const std::string_view text = Readable(name);
-  const std::size_t dot = text.rfind(kDot);
-  return dot == std::string_view::npos ? name : StringAccess::FromUtf8(text.substr(0, dot));
+/// All but the last "." and what follows it.
+std::string_view WithoutExtension(std::string_view name) {
+  return name.substr(0, name.rfind(kDot));
 }
 
-bool HasSeparator(const COrbStringData& path, const COrbStringData& separator) {
-  return !OrbStringDataStr(path, separator).IsEmpty();
+/// What stands between separators and is not empty.
+std::vector<std::string_view> PiecesOf(std::string_view path) {
+  std::vector<std::string_view> pieces;
+  while (!path.empty()) {
+    const std::size_t end = std::min(path.find(kSeparator), path.size());
+    if (end != 0) pieces.push_back(path.substr(0, end));
+    path.remove_prefix(std::min(end + 1, path.size()));
+  }
+  return pieces;
 }
 
 /// The folders of a path that is rebuilt from its pieces: "/" and all pieces but the last, each
 /// with its separator. Empty when there are no pieces.
-std::string FoldersOf(const std::vector<COrbStringData>& pieces) {
+std::string FoldersOf(const std::vector<std::string_view>& pieces) {
   std::string folders;
   if (pieces.empty()) return folders;
   folders += kSeparator;
-  for (std::size_t i = 0; i + 1 < pieces.size(); ++i) {
-    folders.append(Bytes(pieces[i])) += kSeparator;
-  }
+  for (std::size_t i = 0; i + 1 < pieces.size(); ++i) folders.append(pieces[i]) += kSeparator;
   return folders;
-}
-
-std::vector<COrbStringData> PiecesOf(const COrbStringData& path) {
-  std::vector<COrbStringData> pieces;
-  OrbSplitFilePath(path, &pieces);
-  return pieces;
 }
 
 /// The length that counts when paths are ordered.
@@ -88,10 +87,12 @@ COrbStringData OrbPathFindExtension(const COrbFilePath& path, bool includeDot) {
 
 COrbStringData OrbPathFindFileName(const COrbStringData& path, bool removeExtension) {
   const std::string_view text = Readable(path);
-  const std::size_t separator = text.rfind(kSeparator);
-  const bool isBare = separator == std::string_view::npos;
-  const COrbStringData name = isBare ? path : CutAtEnd(text.substr(separator + 1));
-  return removeExtension ? WithoutExtension(name) : name;
+  const std::size_t begin = text.rfind(kSeparator) + 1;  // 0 where there is none.
+  const std::string_view name = text.substr(begin);
+  const bool isCut = removeExtension && name.find(kDot) != std::string_view::npos;
+  if (isCut) return StringAccess::FromUtf8(WithoutExtension(name));
+  if (begin == 0) return path;
+  return CutAtEnd(name);
 }
 
 COrbStringData OrbPathFindFileName(const COrbFilePath& path, bool removeExtension) {
@@ -100,12 +101,11 @@ COrbStringData OrbPathFindFileName(const COrbFilePath& path, bool removeExtensio
 
 void OrbSplitFilePath(const COrbStringData& path, std::vector<COrbStringData>* out) {
   if (out == nullptr) return;
-  const COrbStringData whole = path;  // It may be one of the old pieces.
-  const COrbStringData separator = OrbCharUtf8("/");
-  OrbStringDataSplit(whole, separator, out);
-  const bool isOnePiece =
-      out->empty() && !Readable(whole).empty() && !HasSeparator(whole, separator);
-  if (isOnePiece) out->push_back(whole);
+  std::vector<COrbStringData> pieces;  // The path may be one of the old pieces.
+  for (const std::string_view piece : PiecesOf(Readable(path))) {
+    pieces.push_back(StringAccess::FromUtf8(piece));
+  }
+  *out = std::move(pieces);
 }
 
 void OrbSplitFilePath(const COrbFilePath& path, std::vector<COrbStringData>* out) {
@@ -114,10 +114,10 @@ void OrbSplitFilePath(const COrbFilePath& path, std::vector<COrbStringData>* out
 
 COrbStringData OrbPathRenameExtension(const COrbStringData& path,
                                       const COrbStringData& newExtension) {
-  const std::vector<COrbStringData> pieces = PiecesOf(path);
-  const COrbStringData& last = pieces.empty() ? path : pieces.back();
+  const std::vector<std::string_view> pieces = PiecesOf(Readable(path));
   std::string renamed = FoldersOf(pieces);
-  renamed += Bytes(OrbPathFindFileName(last, true));
+  renamed +=
+      pieces.empty() ? Bytes(OrbPathFindFileName(path, true)) : WithoutExtension(pieces.back());
   std::string_view extension = Bytes(newExtension);
   if (Readable(newExtension).starts_with(kDot)) extension.remove_prefix(1);
   if (!extension.empty()) (renamed += kDot).append(extension);
@@ -131,7 +131,7 @@ COrbStringData OrbPathRenameExtension(const COrbFilePath& path,
 }
 
 COrbStringData OrbPathRenameFileName(const COrbStringData& path, const COrbStringData& newName) {
-  std::string renamed = FoldersOf(PiecesOf(path));
+  std::string renamed = FoldersOf(PiecesOf(Readable(path)));
   renamed += Bytes(newName);
   const COrbStringData extension = OrbPathFindExtension(path, false);
   if (!extension.IsEmpty()) (renamed += kDot).append(Bytes(extension));

@@ -5,6 +5,7 @@
 #include <time.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <cstring>
 #include <string_view>
@@ -21,7 +22,7 @@ constexpr std::int64_t kBlockLength = std::int64_t{1} << kBlockBits;
 // (A rule in TZ itself could: a summer time of less than three days may be missed.)
 constexpr std::int64_t kProbeDistance = std::int64_t{1} << 18;
 // More than any zone is ahead of or behind GMT, and less than half of the distance above.
-constexpr std::int64_t kFarthestOffset = 26 * 3600;
+constexpr std::int64_t kFarthestOffset = std::int64_t{26} * 3600;
 
 constexpr std::int64_t kNoBlock = INT64_MIN;
 constexpr std::int64_t kNoChange = INT64_MAX;
@@ -88,8 +89,8 @@ std::int32_t OffsetIn(const Block& block, std::int64_t instant) {
   return block.offsets[passed];
 }
 
-/// TZ in the environment. It remembers where TZ stands, because a search on every conversion would
-/// cost more than the conversion. Where there is no TZ it remembers the last entry: a new one comes
+/// TZ in the environment. It remembers where TZ stands, because looking into every entry would cost
+/// more than the conversion. Where there is no TZ it remembers the last entry: a new one comes
 /// behind it.
 class TzEntry {
  public:
@@ -105,6 +106,9 @@ class TzEntry {
 
   bool IsWhereItWas() const {
     if (environment_ == nullptr || environ != environment_) return false;
+    // An environment that was emptied and filled again may be a shorter one in the same place.
+    char** const end = environment_ + position_;
+    if (std::find(environment_, end, nullptr) != end) return false;
     return environ[position_] == entry_ && (entry_ == nullptr || environ[position_ + 1] == next_);
   }
 

@@ -31,8 +31,9 @@ constexpr std::int64_t DaysFromCivil(std::int64_t year, unsigned month, unsigned
 
 /// Seconds from 1970-01-01 00:00:00 to the fields, as if every day had 86400.
 constexpr std::int64_t SecondsFromCivil(const CivilTime& civil) {
-  return DaysFromCivil(civil.year, civil.month, civil.day) * kSecondsPerDay + civil.hour * 3600 +
-         civil.minute * 60 + civil.second;
+  const std::int64_t minuteOfDay = std::int64_t{civil.hour} * 60 + civil.minute;
+  return DaysFromCivil(civil.year, civil.month, civil.day) * kSecondsPerDay + minuteOfDay * 60 +
+         civil.second;
 }
 
 constexpr CivilTime CivilFromSeconds(std::int64_t seconds) {

@@ -40,13 +40,9 @@ unsigned int DaysInMonth(unsigned int year, unsigned int month) {
   return month == 2 && IsLeapYear(year) ? 29 : kDays[month - 1];
 }
 
-/// The ticks of a second since 1904 and those within it, held to what a tick count can hold: an
-/// instant before 1904 is its beginning, one after its end is its last tick.
+/// The ticks of a second since 1904 and those within it.
 std::uint64_t TicksAt(std::int64_t second, std::uint64_t within) {
-  if (second < 0) return 0;
-  const auto seconds = static_cast<std::uint64_t>(second);
-  const bool fits = seconds <= (UINT64_MAX - within) / kTicksPerSecond;
-  return fits ? seconds * kTicksPerSecond + within : UINT64_MAX;
+  return second < 0 ? 0 : static_cast<std::uint64_t>(second) * kTicksPerSecond + within;
 }
 
 /// Digits of a text, `position` and `count` as in the compact form; 0 beyond their end.

@@ -2,12 +2,14 @@
 #include "platform/calendar.h"
 
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <cstdlib>
 #include <ctime>
 #include <random>
 #include <string>
 #include <thread>
+#include <utility>
 #include <vector>
 
 #include "support/time_zone.h"
@@ -43,19 +45,17 @@ void ExpectAgreement(std::int64_t instant) {
 TEST(Calendar, AgreesWithTheSystemInEveryZone) {
   std::mt19937_64 random(1904);
   std::uniform_int_distribution<std::int64_t> anyInstant(k1904, k2200);
-  const char* const kZones[] = {
-      "UTC",
-      "Europe/Paris",
-      "America/St_Johns",
-      "America/Sao_Paulo",
-      "America/Boa_Vista",
-      "Australia/Lord_Howe",
-      "Asia/Kathmandu",
-      "Africa/Casablanca",
-      "Pacific/Apia",
-      "EST5EDT,M3.2.0,M11.1.0",
-      "no such zone",
-  };
+  const char* const kZones[] = {"UTC",
+                                "Europe/Paris",
+                                "America/St_Johns",
+                                "America/Sao_Paulo",
+                                "America/Boa_Vista",
+                                "Australia/Lord_Howe",
+                                "Asia/Kathmandu",
+                                "Africa/Casablanca",
+                                "Pacific/Apia",
+                                "EST5EDT,M3.2.0,M11.1.0",
+                                "no such zone"};
   for (const char* name : kZones) {
     SCOPED_TRACE(name);
     const TimeZone zone(name);
@@ -111,6 +111,15 @@ TEST(Calendar, NoticesAnotherZoneWhereverItStands) {
   EXPECT_EQ(LocalFromInstant(0).hour, 9u);
   EXPECT_EQ(LocalFromInstant(1'000'000'000).hour, 10u);  // Not asked for before.
   std::thread([] { EXPECT_EQ(LocalFromInstant(0).hour, 9u); }).join();
+
+  char other[] = "ORB_TEST=x", utc[] = "TZ=UTC", tokyo[] = "TZ=Asia/Tokyo";
+  char* entries[] = {other, other, utc, nullptr};
+  char** const old = std::exchange(environ, entries);
+  EXPECT_EQ(LocalFromInstant(0).hour, 0u);
+  entries[0] = tokyo;  // Emptied and filled again in the same place, TZ=UTC behind its end.
+  entries[1] = nullptr;
+  EXPECT_EQ(LocalFromInstant(0).hour, 9u);
+  environ = old;
 }
 
 TEST(Calendar, ReachesFarYears) {

@@ -9,6 +9,8 @@
 /// The full path of a file or folder, "/"-separated and kept exactly as it was set. Nothing is
 /// normalised and nothing is looked up until it is asked for. An empty path means no file.
 /// Different objects may be used on different threads; sharing one needs the caller's own lock.
+// Assignment is virtual, so there is one alone.
+// NOLINTNEXTLINE(cppcoreguidelines-special-member-functions)
 class ORB_EXPORT COrbFilePath {
  public:
   COrbFilePath() = default;
@@ -45,7 +47,7 @@ class ORB_EXPORT COrbFilePath {
   /// Puts the folder that holds this item into `parent`, ignoring one trailing "/". `parent` may be
   /// this path. It stays as it was on failure: kOrbErrEmptyPath for an empty path,
   /// kOrbErrNoSuchFile for the root and for a bare name, neither of which has a parent,
-  /// kOrbErrNotFound when the text has no UTF-8 form.
+  /// kOrbErrNotFound when the text has no UTF-8 form, and for a null `parent`.
   OrbResult GetParent(COrbFilePath* parent) const;
 
  private:

@@ -63,7 +63,7 @@ class ORB_EXPORT COrbTime {
   /// Sets the time from the fields of GetTime(). kOrbErrInvalidTime for a field out of range (the
   /// year is not tested), and the time stays as it was. A local time that a clock change skips or
   /// repeats gives one of the two instants, always the same. An instant before 1904 gives the empty
-  /// time, one beyond what `ticks` can count (in the year 60359) gives the last that it can.
+  /// time; one beyond what `ticks` can count (in the year 60359) wraps, as with a UTCDateTime.
   OrbResult Initialize(unsigned int year,
                        unsigned int month,
                        unsigned int day,
