@@ -73,7 +73,7 @@ Copy<unsigned short> Duplicate(const unsigned short* text, std::size_t length) {
 /// learns to keep them only when they are freed as large as they were asked for, and would map the
 /// next one anew.
 char* Shrunk(char* buffer, std::size_t size, std::size_t before) {
-  constexpr std::size_t kLarge = 64 * 1024;
+  constexpr std::size_t kLarge = std::size_t{64} * 1024;
   void* exact = before < kLarge ? std::realloc(buffer, size) : std::malloc(size);
   if (exact == nullptr) return buffer;
   if (before >= kLarge) {
