@@ -108,8 +108,8 @@ class ORB_EXPORT COrbStringData {
 
   void Share(const COrbStringData& other);
   void TakePlaceOf(COrbStringData& other) noexcept;
-  OrbResult Init(std::uint32_t encoding, const void* text, std::size_t length);
-  COrbStringValue* EnsureValue() const;
+  ORB_LOCAL OrbResult Init(std::uint32_t encoding, const void* text, std::size_t length);
+  ORB_LOCAL COrbStringValue* EnsureValue() const;
 
   // Every owner of one value stands in a chain, changed under the value's lock alone.
   mutable COrbStringData* prev = nullptr;
@@ -154,13 +154,15 @@ class ORB_EXPORT COrbStringData::COrbStringValue {
   friend class COrbStringData;
   friend struct orb::StringAccess;
 
-  static COrbStringValue* Make(std::uint32_t encoding, const void* text, std::size_t length);
-  const char* StoreSystem(char* text, std::size_t length) const;
-  const char* StoreUtf8(char* text, std::size_t length) const;
-  const unsigned short* StoreUnicode(unsigned short* text, std::size_t length) const;
-  const char* DeriveSystem() const;
-  const char* DeriveUtf8() const;
-  const unsigned short* DeriveUnicode() const;
+  ORB_LOCAL static COrbStringValue* Make(std::uint32_t encoding,
+                                         const void* text,
+                                         std::size_t length);
+  ORB_LOCAL const char* StoreSystem(char* text, std::size_t length) const;
+  ORB_LOCAL const char* StoreUtf8(char* text, std::size_t length) const;
+  ORB_LOCAL const unsigned short* StoreUnicode(unsigned short* text, std::size_t length) const;
+  ORB_LOCAL const char* DeriveSystem() const;
+  ORB_LOCAL const char* DeriveUtf8() const;
+  ORB_LOCAL const unsigned short* DeriveUnicode() const;
 
   COrbCriticalSection lock;
   mutable std::atomic<std::uint32_t> master{0};
