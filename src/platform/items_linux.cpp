@@ -5,6 +5,7 @@
 #include <sys/random.h>
 #include <sys/stat.h>
 #include <sys/statvfs.h>
+#include <sys/syscall.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -92,11 +93,14 @@ void FillRecord(ItemRecord& record,
   record.created = CreationTime(item, status, own);
 }
 
-/// One question that settles two: who may read and write the item can read it, and its volume is
-/// writable. Special files may be written on a read-only volume.
+/// One question that settles two: who may read and write the item can read it, and neither its
+/// mount nor its file system is read-only. Special files may be written on a read-only volume. The
+/// kernel itself has to say so: where it does not know the call, the C library judges by the mode
+/// alone.
 bool IsReadableOnWritableVolume(const char* path, const ItemInfo& info) {
   if (!info.mayWrite || info.locked || info.kind == ItemKind::kOther) return false;
-  return Permits(path, R_OK | W_OK, AT_SYMLINK_NOFOLLOW);
+  constexpr int kFlags = AT_EACCESS | AT_SYMLINK_NOFOLLOW;
+  return ::syscall(SYS_faccessat2, AT_FDCWD, path, R_OK | W_OK, kFlags) == 0;
 }
 
 UniqueFd OpenItem(const char* path) {

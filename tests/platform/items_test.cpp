@@ -3,11 +3,16 @@
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <linux/filter.h>
+#include <linux/seccomp.h>
+#include <sys/prctl.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <sys/xattr.h>
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstddef>
 #include <cstdlib>
 #include <filesystem>
 #include <string>
@@ -70,6 +75,31 @@ TEST(Read, TellsKindsAndSizesOfTheEntryItself) {
   errno = 1234;
   EXPECT_EQ(Subject().Read(folder / "missing").Reason(), kNoSuchItem);
   EXPECT_EQ(errno, 1234);  // The host's own is left alone.
+}
+
+/// From now on the kernel does not know the system call.
+bool Forget(int call) {
+  struct sock_filter rules[] = {
+      BPF_STMT(BPF_LD | BPF_W | BPF_ABS, offsetof(struct seccomp_data, nr)),
+      BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, static_cast<unsigned>(call), 0, 1),
+      BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ERRNO | ENOSYS),
+      BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ALLOW),
+  };
+  const struct sock_fprog program = {std::size(rules), rules};
+  return ::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) == 0 &&
+         ::prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &program) == 0;
+}
+
+TEST(Read, SeesAReadOnlyVolumeWhateverTheKernelKnows) {
+  const TempFolder folder;
+  const std::string file = folder.Write("file", "");
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    ASSERT_TRUE(test::MakeReadOnlyVolume(folder.Path()));
+    EXPECT_TRUE(Subject().Read(file).Value().volumeReadOnly.Value());
+    ASSERT_TRUE(Forget(SYS_faccessat2));
+    EXPECT_TRUE(Subject().Read(file).Value().volumeReadOnly.Value());
+    EXPECT_TRUE(Subject().Read(file).Value().readable);
+  }));
 }
 
 TEST(Read, TellsPackages) {
