@@ -86,7 +86,7 @@ OrbResult SetTime(const COrbFileHandle& handle,
 bool IsFolder(const COrbStringData& path) {
   COrbFileHandle handle;
   handle.Initialize(&path);
-  return handle.IsExist() && (handle.GetAttribute() & kOrbFileAttrFolder) != 0;
+  return (handle.GetAttribute() & kOrbFileAttrFolder) != 0;
 }
 
 std::string_view WithoutOneSeparator(std::string_view path) {
