@@ -5,16 +5,25 @@
 /// The whole public interface.
 
 #include <orb/export.h>
+#include <orb/fileinfo/drive_type.h>
 #include <orb/fileinfo/file_handle.h>
 #include <orb/fileops/copy.h>
 #include <orb/fileops/create.h>
 #include <orb/fileops/path_relations.h>
 #include <orb/fileops/progress.h>
 #include <orb/fileops/remove.h>
+#include <orb/fileops/trash.h>
 #include <orb/path/file_path.h>
 #include <orb/path/file_type.h>
 #include <orb/path/path_text.h>
 #include <orb/platform/core_foundation.h>
+#include <orb/records/geometry.h>
+#include <orb/records/geotag.h>
+#include <orb/records/image_property.h>
+#include <orb/records/metadata.h>
+#include <orb/records/output.h>
+#include <orb/records/upload.h>
+#include <orb/records/workspace.h>
 #include <orb/result.h>
 #include <orb/strings/char_types.h>
 #include <orb/strings/string_data.h>

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "platform/transcode.h"
 
-#include <unicode/unorm2.h>
 
 #include <algorithm>
 #include <array>
@@ -9,6 +8,7 @@
 #include <cstdint>
 #include <cstring>
 
+#include "platform/icu.h"
 #include "platform/transcode_sse.h"
 
 #if defined(__SSE2__)
@@ -122,10 +122,10 @@ bool MayCompose(std::u16string_view text) {
 
 std::u16string Composed(std::u16string_view text) {
   UErrorCode status = U_ZERO_ERROR;
-  const UNormalizer2* nfc = unorm2_getNFCInstance(&status);
+  const UNormalizer2* nfc = Icu().unorm2_getNFCInstance(&status);
   std::u16string out(text.size() + 16, u'\0');
   const auto normalize = [&] {
-    return unorm2_normalize(nfc,
+    return Icu().unorm2_normalize(nfc,
                             text.data(),
                             static_cast<std::int32_t>(text.size()),
                             out.data(),

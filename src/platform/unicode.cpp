@@ -1,14 +1,14 @@
 // SPDX-License-Identifier: MIT
 #include "platform/unicode.h"
 
-#include <unicode/uchar.h>
-#include <unicode/unorm2.h>
-#include <unicode/ustring.h>
 #include <unicode/utf16.h>
 
 #include <algorithm>
+#include <limits>
 #include <memory>
 #include <vector>
+
+#include "platform/icu.h"
 
 namespace orb::platform {
 namespace {
@@ -17,27 +17,14 @@ using detail::CharPage;
 
 std::int32_t Size(std::u16string_view text) { return static_cast<std::int32_t>(text.size()); }
 
-/// Calls `fill(buffer, capacity, status)`, again with a larger buffer when the first is too small.
-template <typename Fill>
-std::u16string Filled(std::size_t guess, Fill fill) {
-  std::u16string out(guess, u'\0');
-  for (;;) {
-    UErrorCode status = U_ZERO_ERROR;
-    const std::int32_t length = fill(out.data(), static_cast<std::int32_t>(out.size()), &status);
-    if (U_FAILURE(status) && status != U_BUFFER_OVERFLOW_ERROR) return {};
-    out.resize(static_cast<std::size_t>(length));
-    if (U_SUCCESS(status)) return out;
-  }
-}
-
 const UNormalizer2* Nfd() {
   UErrorCode status = U_ZERO_ERROR;
-  return unorm2_getNFDInstance(&status);
+  return Icu().unorm2_getNFDInstance(&status);
 }
 
 const UNormalizer2* Nfc() {
   UErrorCode status = U_ZERO_ERROR;
-  return unorm2_getNFCInstance(&status);
+  return Icu().unorm2_getNFCInstance(&status);
 }
 
 UChar32 Point(char32_t c) { return static_cast<UChar32>(c); }
@@ -56,7 +43,7 @@ void AppendDecomposed(std::u16string& out, char32_t c) {
   std::array<char16_t, kLongest> units;
   UErrorCode status = U_ZERO_ERROR;
   const std::int32_t length =
-      unorm2_getDecomposition(Nfd(), Point(c), units.data(), kLongest, &status);
+      Icu().unorm2_getDecomposition(Nfd(), Point(c), units.data(), kLongest, &status);
   if (length < 0 || U_FAILURE(status)) return Append(out, c);
   out.append(units.data(), static_cast<std::size_t>(length));
 }
@@ -75,7 +62,7 @@ void AppendFolded(std::u16string& out, char32_t c) {
   Append(self, c);
   UErrorCode status = U_ZERO_ERROR;
   const std::int32_t length =
-      u_strFoldCase(units.data(), kLongest, self.data(), Size(self), U_FOLD_CASE_DEFAULT, &status);
+      Icu().u_strFoldCase(units.data(), kLongest, self.data(), Size(self), U_FOLD_CASE_DEFAULT, &status);
   if (U_FAILURE(status)) return Append(out, c);
   out.append(units.data(), static_cast<std::size_t>(length));
 }
@@ -87,7 +74,7 @@ std::u16string Folded(std::u16string_view text) {
   return out;
 }
 
-std::uint8_t CombiningClass(char32_t c) { return u_getCombiningClass(Point(c)); }
+std::uint8_t CombiningClass(char32_t c) { return Icu().u_getCombiningClass(Point(c)); }
 
 std::u16string DecomposedInOrder(std::u16string_view text) {
   std::u16string units;
@@ -120,10 +107,10 @@ std::u16string DecomposedInOrder(std::u16string_view text) {
   return out;
 }
 
-bool IsMark(char32_t c) { return (U_GET_GC_MASK(Point(c)) & U_GC_M_MASK) != 0; }
+bool IsMark(char32_t c) { return (U_MASK(Icu().u_charType(Point(c))) & U_GC_M_MASK) != 0; }
 
 bool IsComposed(char32_t c) {
-  return u_getIntPropertyValue(Point(c), UCHAR_NFC_QUICK_CHECK) == UNORM_YES;
+  return Icu().u_getIntPropertyValue(Point(c), UCHAR_NFC_QUICK_CHECK) == UNORM_YES;
 }
 
 CharForm Made(Form form, char32_t c) {
@@ -135,13 +122,28 @@ CharForm Made(Form form, char32_t c) {
     std::copy(units.begin(), units.end(), made.units.begin());
     made.length = static_cast<std::uint8_t>(units.size());
   }
-  made.startsSegment = unorm2_hasBoundaryBefore(Nfc(), Point(c)) && !IsMark(c);
+  made.startsSegment = Icu().unorm2_hasBoundaryBefore(Nfc(), Point(c)) && !IsMark(c);
   made.isPlain = made.startsSegment && IsComposed(c);
   made.leadsWithStarter =
-      u_getIntPropertyValue(Point(c), UCHAR_LEAD_CANONICAL_COMBINING_CLASS) == 0;
+      Icu().u_getIntPropertyValue(Point(c), UCHAR_LEAD_CANONICAL_COMBINING_CLASS) == 0;
   made.endsWithStarter =
-      u_getIntPropertyValue(Point(c), UCHAR_TRAIL_CANONICAL_COMBINING_CLASS) == 0;
+      Icu().u_getIntPropertyValue(Point(c), UCHAR_TRAIL_CANONICAL_COMBINING_CLASS) == 0;
   return made;
+}
+
+/// ICU counts in 32 bits, and mapping may triple a text.
+constexpr std::size_t kMostUnits = std::numeric_limits<std::int32_t>::max() / 4;
+
+std::u16string Mapped(std::u16string_view text, decltype(IcuFunctions::u_strToLower) map) {
+  std::u16string out(text);
+  if (text.empty() || text.size() > kMostUnits) return out;
+  for (;;) {
+    UErrorCode status = U_ZERO_ERROR;
+    const std::int32_t length = map(out.data(), Size(out), text.data(), Size(text), "", &status);
+    if (U_FAILURE(status) && status != U_BUFFER_OVERFLOW_ERROR) return std::u16string(text);
+    out.resize(static_cast<std::size_t>(length));
+    if (U_SUCCESS(status)) return out;
+  }
 }
 
 }  // namespace
@@ -173,16 +175,8 @@ std::u16string FormOfRun(Form form, std::u16string_view text) {
   return DecomposedInOrder(Folded(decomposed));
 }
 
-std::u16string Lower(std::u16string_view text) {
-  return Filled(text.size() + 16, [&](char16_t* out, std::int32_t capacity, UErrorCode* status) {
-    return u_strToLower(out, capacity, text.data(), Size(text), "", status);
-  });
-}
+std::u16string Lower(std::u16string_view text) { return Mapped(text, Icu().u_strToLower); }
 
-std::u16string Upper(std::u16string_view text) {
-  return Filled(text.size() + 16, [&](char16_t* out, std::int32_t capacity, UErrorCode* status) {
-    return u_strToUpper(out, capacity, text.data(), Size(text), "", status);
-  });
-}
+std::u16string Upper(std::u16string_view text) { return Mapped(text, Icu().u_strToUpper); }
 
 }  // namespace orb::platform

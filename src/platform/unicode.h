@@ -61,7 +61,7 @@ inline CharForm FormOf(Form form, char32_t c) {
 /// nothing but marks costs little more than another.
 std::u16string FormOfRun(Form form, std::u16string_view text);
 
-/// The root locale's full case mapping.
+/// The root locale's full case mapping. A text of more than half a billion units stays as it is.
 std::u16string Lower(std::u16string_view text);
 std::u16string Upper(std::u16string_view text);
 

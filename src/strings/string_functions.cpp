@@ -37,19 +37,21 @@ std::string Joined(const COrbStringData& a, const COrbStringData& b) {
   return text;
 }
 
-/// A text to read that leaves its string without value when it has none.
-class Source {
- public:
-  explicit Source(const COrbStringData& s)
-      : own_(s.HasValueUtf8() ? COrbStringData() : s),
-        text(StringAccess::Read(s.HasValueUtf8() ? s : own_)) {}
+/// Reads `s`, through `copy` where that would give a string without value one.
+Utf8Text ReadOnly(const COrbStringData& s, COrbStringData& copy) {
+  if (s.HasValueUtf8()) return StringAccess::Read(s);
+  copy = s;
+  return StringAccess::Read(copy);
+}
 
- private:
-  const COrbStringData own_;
-
- public:
-  const Utf8Text text;
-};
+/// The `count` units from unit `start`.
+COrbStringData Cut(const COrbStringData& s, std::size_t start, std::size_t count) {
+  const Utf8Text text = StringAccess::Read(s);
+  if (text.scan.kind == TextKind::kAscii) {
+    return StringAccess::FromUtf8(text.bytes.substr(start, count));
+  }
+  return StringAccess::FromUtf8(orb::Middle(text.Readable(), start, count));
+}
 
 /// Calls `compare(a, b)` on the two texts; 0 when either is not UTF-8.
 template <typename Compare>
@@ -85,7 +87,7 @@ COrbStringData Mapped(const COrbStringData& s,
 
 COrbStringData COrbStringData::Mid(unsigned long start, unsigned long count) const {
   if (start >= GetLengthChar() || IsEmpty()) return {};
-  return StringAccess::FromUtf8(orb::Middle(StringAccess::Read(*this).Readable(), start, count));
+  return Cut(*this, start, count);
 }
 
 COrbStringData COrbStringData::operator+(const COrbStringData& other) const {
@@ -104,7 +106,7 @@ COrbStringData OrbStringDataCat(const COrbStringData& a, const COrbStringData& b
 COrbStringData OrbStringDataInc(const COrbStringData& s, unsigned long m) {
   const unsigned long length = s.GetLengthChar();
   if (length < m) return {};
-  return StringAccess::FromUtf8(orb::Middle(StringAccess::Read(s).Readable(), m, length - m));
+  return Cut(s, m, length - m);
 }
 
 COrbStringData OrbStringDataStr(const COrbStringData& s, const COrbStringData& find) {
@@ -148,8 +150,8 @@ int OrbStringDataCmpni(const COrbStringData& a, const COrbStringData& b, unsigne
 COrbStringData OrbStringDataReplace(const COrbStringData& s,
                                     const COrbStringData& find,
                                     const COrbStringData& with) {
-  const Source source(s);
-  const Utf8Text& text = source.text;
+  COrbStringData copy;
+  const Utf8Text text = ReadOnly(s, copy);
   const Utf8Text wanted = StringAccess::Read(find);
   if (orb::FindEquivalent(text, wanted) == orb::kNotFound) {
     return StringAccess::FromUtf8(text.bytes);
@@ -162,8 +164,8 @@ void OrbStringDataSplit(const COrbStringData& s,
                         const COrbStringData& sep,
                         std::vector<COrbStringData>* out) {
   if (out == nullptr) return;
-  const Source source(s);
-  const orb::Pieces pieces(source.text, StringAccess::Read(sep));
+  COrbStringData copy;
+  const orb::Pieces pieces(ReadOnly(s, copy), StringAccess::Read(sep));
   std::vector<COrbStringData> made;  // Either string may be in the list that is to be emptied.
   made.reserve(pieces.Views().size());
   for (const std::string_view piece : pieces.Views()) made.emplace_back(Piece{piece});
@@ -175,8 +177,8 @@ COrbStringData OrbString::Trim(const COrbStringData& s,
                                bool left,
                                bool right) {
   if (set.IsEmpty() || (!left && !right)) return s;
-  const Source source(s);
-  const orb::Trimmed trimmed = orb::Trim(source.text, StringAccess::Read(set), left, right);
+  COrbStringData copy;
+  const orb::Trimmed trimmed = orb::Trim(ReadOnly(s, copy), StringAccess::Read(set), left, right);
   if (trimmed.extent == orb::Trimming::kNothing) return s;
   return trimmed.text ? StringAccess::FromUtf8(*trimmed.text) : COrbStringData();
 }

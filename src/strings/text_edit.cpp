@@ -292,8 +292,10 @@ void Pieces::Add(std::string_view piece) {
 }
 
 void Pieces::SplitLiterally(std::string_view text, std::string_view separator) {
+  const LiteralSearch search(separator);
+  views_.reserve(CountMatches(search, text) + 1);
   std::size_t done = 0;
-  LiteralSearch(separator).ForEach(text, [&](std::size_t place) {
+  search.ForEach(text, [&](std::size_t place) {
     Add(text.substr(done, place - done));
     done = place + separator.size();
     return true;

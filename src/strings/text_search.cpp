@@ -43,10 +43,37 @@ std::size_t FindLastLiteral(std::string_view text, std::string_view needle) {
   return kNotFound;
 }
 
+namespace {
+
+/// The Kelvin sign, the Greek question mark and the Greek varia are other ways to write these.
+constexpr std::string_view kWrittenOtherwise = "K;`";
+
+char LoneAscii(std::string_view needle, platform::Form form) {
+  if (form != platform::Form::kDecomposed || needle.size() != 1) return '\0';
+  return kWrittenOtherwise.find(needle[0]) == std::string_view::npos ? needle[0] : '\0';
+}
+
+}  // namespace
+
 EquivalenceSearch::EquivalenceSearch(std::string_view needle, platform::Form form)
-    : form_(form), needle_(FormOfText(form, needle)), matcher_(needle_), begins_(needle_.size()) {}
+    : form_(form),
+      ascii_(LoneAscii(needle, form)),
+      needle_(FormOfText(form, needle)),
+      matcher_(needle_),
+      begins_(needle_.size()) {}
+
+/// Only a mark behind it can keep the character from being a match.
+std::size_t EquivalenceSearch::FindAscii(std::string_view text) const {
+  for (std::size_t at = 0; (at = text.find(ascii_, at)) != kNotFound; ++at) {
+    const std::string_view behind = text.substr(at + 1);
+    if (behind.empty() || ByteAt(behind, 0) < 0x80) return at;
+    if (platform::FormOf(form_, CharAt(behind, 0)).startsSegment) return at;
+  }
+  return kNotFound;
+}
 
 std::size_t EquivalenceSearch::Find(std::string_view text) {
+  if (ascii_ != '\0') return FindAscii(text);
   matcher_.Reset();
   std::size_t slot = 0;  // Of the next unit, and of the one that a match ending before it began at.
   for (FormReader reader(text, form_); !reader.AtEnd();) {

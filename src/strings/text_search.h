@@ -235,7 +235,10 @@ class EquivalenceSearch {
   std::size_t Find(std::string_view text);
 
  private:
+  std::size_t FindAscii(std::string_view text) const;
+
   platform::Form form_;
+  char ascii_;  // A needle of one ASCII character that nothing else is equivalent to, or 0.
   std::u16string needle_;
   PatternMatcher<char16_t> matcher_;
   std::vector<std::size_t> begins_;  // By unit, modulo the needle's size: the place in the text.

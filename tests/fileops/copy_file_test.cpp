@@ -14,8 +14,8 @@
 #include "fileops/copy_worker.h"
 #include "platform/volumes.h"
 #include "support/faults.h"
+#include "support/paths.h"
 #include "support/temp_folder.h"
-#include "support/texts.h"
 #include "support/trees.h"
 
 namespace {
@@ -27,13 +27,6 @@ using orb::test::ReadAll;
 using orb::test::RunAsUser;
 using orb::test::RunWithPrivateMounts;
 using orb::test::TempFolder;
-
-COrbFilePath PathOf(const std::string& text) {
-  const COrbStringData data = S(text);
-  COrbFilePath path;
-  path.Initialize(&data);
-  return path;
-}
 
 /// Counts its calls and answers false at one of them.
 struct Progress {

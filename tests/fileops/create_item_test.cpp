@@ -12,8 +12,8 @@
 
 #include "fileops/numbered_name.h"
 #include "support/faults.h"
+#include "support/paths.h"
 #include "support/temp_folder.h"
-#include "support/texts.h"
 
 namespace {
 
@@ -23,13 +23,6 @@ using orb::TakenNumbers;
 using orb::test::ReadAll;
 using orb::test::RunWithPrivateMounts;
 using orb::test::TempFolder;
-
-COrbFilePath PathOf(const std::string& text) {
-  const COrbStringData data = S(text);
-  COrbFilePath path;
-  path.Initialize(&data);
-  return path;
-}
 
 /// The name that was made, or the code in its place.
 std::string Unique(const std::string& folder, const std::string& name) {

@@ -9,8 +9,8 @@
 #include <thread>
 
 #include "support/faults.h"
+#include "support/paths.h"
 #include "support/temp_folder.h"
-#include "support/texts.h"
 
 namespace {
 
@@ -19,13 +19,6 @@ using orb::test::RunAsUser;
 using orb::test::RunWithPrivateMounts;
 using orb::test::TempFolder;
 using Clock = std::chrono::steady_clock;
-
-COrbFilePath PathOf(const std::string& text) {
-  const COrbStringData data = S(text);
-  COrbFilePath path;
-  path.Initialize(&data);
-  return path;
-}
 
 TEST(DeleteFile, RemovesWhatIsWritableAndNotLocked) {
   const TempFolder folder;

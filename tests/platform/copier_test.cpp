@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: MIT
 #include "platform/copier.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <signal.h>
+#include <sys/syscall.h>
 #include <sys/wait.h>
 #include <sys/xattr.h>
 
@@ -10,10 +12,12 @@
 #include <filesystem>
 #include <string>
 #include <thread>
+#include <vector>
 
 #include "platform/items.h"
 #include "platform/removal.h"
 #include "support/faults.h"
+#include "support/refused_calls.h"
 #include "support/temp_folder.h"
 #include "support/trees.h"
 
@@ -33,6 +37,7 @@ using orb::test::ChainDepth;
 using orb::test::Describe;
 using orb::test::OpenDescriptors;
 using orb::test::ReadAll;
+using orb::test::RefusedCall;
 using orb::test::RunAsUser;
 using orb::test::RunInChild;
 using orb::test::RunWithPrivateMounts;
@@ -242,6 +247,38 @@ TEST(CopyItem, LeavesNothingWhenTheVolumeOrTheRightsEnd) {
                             expect(kTooLarge);
                           }));
   ORB_IN_CHILD(RunAsUser(65534, [&] { expect(kNotPermitted); }));
+}
+
+// Files without a name, renaming without replacing, links, copying inside the kernel: where one is
+// missing the next way is taken, with the same outcome.
+TEST(CopyItem, WorksWhereTheSystemCanDoLess) {
+  constexpr unsigned kNameless = O_TMPFILE & ~unsigned{O_DIRECTORY};
+  const RefusedCall nameless{SYS_openat, EOPNOTSUPP, kNameless};
+  const RefusedCall rename{SYS_renameat2, EINVAL};
+  const std::vector<RefusedCall> kCases[] = {
+      {nameless},
+      {nameless, rename},
+      {nameless, rename, {SYS_linkat, EPERM}},
+      {{SYS_copy_file_range, EXDEV}},
+      {{SYS_copy_file_range, ENOSYS}, {SYS_ioctl, EOPNOTSUPP}},
+      {{SYS_flistxattr, EOPNOTSUPP}, {SYS_fsetxattr, EOPNOTSUPP}},
+      {{SYS_fchmod, EPERM}, {SYS_utimensat, EPERM}},
+  };
+  const std::string bytes = Bytes(300000);
+  for (const auto& refused : kCases) {
+    SCOPED_TRACE(&refused - kCases);
+    const TempFolder folder;
+    const std::string source = folder.Write("source", bytes);
+    ORB_IN_CHILD(RunInChild([&] { return orb::test::RefuseCalls(refused); },
+                            [&] {
+                              EXPECT_TRUE(CopyItem(source, folder / "copy"));
+                              EXPECT_EQ(ErrorOf(CopyItem(source, folder / "copy")), kItemExists);
+                              EXPECT_EQ(ErrorOf(CopyItem(source, folder / "missing/copy")),
+                                        kNoSuchItem);
+                            }));
+    EXPECT_TRUE(ReadAll(folder / "copy") == bytes);
+    EXPECT_EQ(EntriesIn(folder.Path()), 2u);
+  }
 }
 
 TEST(CopyItem, LeavesCompleteCopiesOrNoneWhenTheProcessIsKilled) {

@@ -5,9 +5,7 @@
 #include <sys/stat.h>
 
 #include <filesystem>
-#include <span>
 #include <string>
-#include <string_view>
 
 #include "platform/items.h"
 #include "support/temp_folder.h"
@@ -15,7 +13,6 @@
 namespace {
 
 namespace fs = std::filesystem;
-using orb::platform::Error;
 using orb::platform::InputStream;
 using orb::platform::Items;
 using orb::platform::kItemExists;
@@ -24,29 +21,6 @@ using orb::platform::kNotPermitted;
 using orb::platform::OutputStream;
 using orb::test::ReadAll;
 using orb::test::TempFolder;
-
-std::span<const std::byte> AsBytes(std::string_view text) {
-  return std::as_bytes(std::span(text.data(), text.size()));
-}
-
-TEST(OutputStream, IsUndoneUnlessFinished) {
-  const TempFolder folder;
-  folder.Write("old", "12345");
-  const auto before = fs::last_write_time(folder / "old");
-  for (const bool finish : {false, true}) {
-    SCOPED_TRACE(finish);
-    for (const char* name : {"old", "new"}) {
-      auto stream = OutputStream::Append(folder / name);
-      ASSERT_TRUE(stream);
-      EXPECT_TRUE(stream.Value().Write(AsBytes("abc")));
-      EXPECT_TRUE(!finish || stream.Value().Finish());
-    }
-    EXPECT_EQ(ReadAll(folder / "old"), finish ? "12345abc" : "12345");
-    EXPECT_EQ(fs::last_write_time(folder / "old") == before, !finish);
-    EXPECT_EQ(ReadAll(folder / "new"), finish ? "abc" : "");
-    EXPECT_EQ(fs::exists(folder / "new"), finish);
-  }
-}
 
 TEST(OutputStream, TakesNoNameThatSomebodyElseTookMeanwhile) {
   const TempFolder folder;

@@ -67,6 +67,9 @@ TEST(Unicode, EveryCharacterHasIcusForms) {
     const auto first = static_cast<UChar32>(Shown(Form::kFoldedDecomposed, c).front());
     ASSERT_TRUE(!made.startsSegment || u_getCombiningClass(first) == 0);
     ASSERT_TRUE(!made.startsSegment || made.leadsWithStarter);
+    // And what searching for one ASCII character rests on.
+    const bool isAsciiToo = c >= 0x80 && decomposed.size() == 1 && decomposed[0] < 0x80;
+    ASSERT_EQ(isAsciiToo, c == 0x37E || c == 0x1FEF || c == 0x212A);
   }
 }
 

@@ -77,6 +77,29 @@ TEST(Joining, AlwaysHasAValueAndKeepsRawBytes) {
   EXPECT_EQ(Text(copy), "ab");
 }
 
+TEST(Comparing, HasItsOwnRuleInEachForm) {
+  const struct {
+    const char *a, *b;
+    int cmp, cmpi, cmpni;
+  } kCases[] = {
+      {"a", "B", 1, -1, -1},
+      {"é", "e\u0301", 1, 0, 1},  // Only the uncounted form knows equivalence.
+      {"Straße", "STRASSE", 1, 0, 0},
+      {"\uFB00", "😀", 1, -1, -1},  // In UTF-16 a surrogate stands before U+FB00, which folds to ff.
+      {"a", "a\xFF", 0, 0, 0},
+      {"", "a", -1, -1, -1},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.a);
+    EXPECT_EQ(OrbStringDataCmp(S(c.a), S(c.b)), c.cmp);
+    EXPECT_EQ(OrbStringDataCmp(S(c.b), S(c.a)), -c.cmp);
+    EXPECT_EQ(OrbStringDataCmpi(S(c.a), S(c.b)), c.cmpi);
+    EXPECT_EQ(OrbStringDataCmpni(S(c.a), S(c.b), 10), c.cmpni);
+  }
+  EXPECT_EQ(OrbStringDataCmpn(S("abc"), S("abd"), 2), 0);
+  EXPECT_EQ(OrbStringDataCmpn(S("😀"), S("😁"), 1), 0);  // Both begin with the same half.
+}
+
 TEST(Splitting, DropsEmptyPiecesAndGivesNothingWithoutASeparator) {
   using Texts = std::vector<std::string>;
   EXPECT_EQ(Pieces(",a,,b,", ","), (Texts{"a", "b"}));
@@ -121,6 +144,18 @@ TEST(Replacing, CutsAsManyUnitsAsTheWantedTextHas) {
     EXPECT_EQ(Shown(OrbStringDataReplace(S(c.text), S(c.find), S(c.with))), c.result);
   }
   EXPECT_EQ(Shown(OrbStringDataReplace(COrbStringData(), S("a"), S("b"))), "");
+}
+
+TEST(Operations, ReadTheirInputsButGiveASourceNoValue) {
+  const COrbStringData source;
+  const COrbStringData read;
+  std::vector<COrbStringData> pieces;
+  OrbStringDataReplace(source, S("a"), read);  // Nothing matches, so `read` is not needed.
+  OrbStringDataSplit(source, S("a"), &pieces);
+  OrbStringDataTrim(source, S("a"));
+  EXPECT_TRUE(HasNoValue(source) && HasNoValue(read));
+  EXPECT_EQ(OrbStringDataCmp(source, read), 0);
+  EXPECT_TRUE(source.HasValueUtf8() && read.HasValueUtf8());
 }
 
 TEST(Trimming, TakesTheSetUnitByUnit) {

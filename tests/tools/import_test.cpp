@@ -189,6 +189,7 @@ TEST_F(Import, SaysWhatItLeavesOutAndWhy) {
             (std::map<std::string, int>{{R"({"status":"copied")", 1},
                                         {R"({"status":"failed")", 2},
                                         {R"({"status":"skipped")", 5}}));
+  EXPECT_NE(ended.out.find(R"("bytes":4,"modified":"2024-05-01T10:00:00Z"})"), std::string::npos);
   const std::string bytes = "_bytes\":\"" + folder_.Path() + "/card/bad%20folder%E9/inside.jpg\"";
   EXPECT_NE(ended.out.find(bytes), std::string::npos) << ended.out;
   const std::string check = "python3 -c 'import json,sys\nfor l in sys.stdin: json.loads(l)' < ";
@@ -240,6 +241,7 @@ TEST_F(Import, LeavesNothingOfAPhotoForWhichThereIsNoRoom) {
   }));
   EXPECT_EQ(ended.exitCode, 1);
   EXPECT_NE(ended.err.find("kOrbErrDiskFull " + Card("big.jpg")), std::string::npos) << ended.err;
+  EXPECT_NE(ended.err.find("1/2 2024/2024-05-01/big.jpg failed"), std::string::npos) << ended.err;
   EXPECT_EQ(Tree(), (Files{{"2024/2024-05-01/small.jpg", "small"}}));
 }
 

@@ -24,7 +24,10 @@ class FakeView : public View {
     }
     return NumbersAmong(names, stem, tail);
   }
-  Found Look(const std::string& path, const Item&) override { return there.at(path); }
+  Found Look(const std::string& path, const Item&) override {
+    const auto found = there.find(path);
+    return found == there.end() ? Found::kFree : found->second;
+  }
 };
 
 std::vector<Item> Items(const std::vector<std::string>& paths) {

@@ -201,7 +201,8 @@ void Importer::Finish(Status status, const ShotPlan& plan, const Step& step, Orb
   const std::string path = plan.PathOf(step);
   if (work_.report.PrintsItems()) work_.progress.Hide();
   work_.report.Add(status, item, status == Status::kFailed ? "" : path, code);
-  if (step.Copies()) work_.progress.EndFile(item.size, Quote(path));
+  const std::string failure = code < kOrbErrFirst ? "" : " failed: " + CodeName(code);
+  if (step.Copies()) work_.progress.EndFile(item.size, Quote(path) + failure);
 }
 
 }  // namespace orbimport

@@ -37,24 +37,41 @@ std::string WithoutSlash(std::string path) {
   return path;
 }
 
+/// What is wrong with a path, for the user.
+std::string NoFolder(const char* role, const std::string& path, const std::error_code& error) {
+  const std::string reason = error ? ": " + error.message() : "";
+  return std::string(role) + " is no folder: " + Quote(path) + reason;
+}
+
+bool ResolveSource(std::string& source, std::string& why) {
+  std::error_code error;
+  const fs::path resolved = fs::canonical(source, error);
+  if (error || !fs::is_directory(resolved, error)) {
+    why = NoFolder("SOURCE", source, error);
+    return false;
+  }
+  source = resolved.string();
+  return true;
+}
+
+/// DESTINATION need not be there yet.
+bool ResolveDestination(std::string& destination, std::string& why) {
+  std::error_code error;
+  const fs::path resolved = fs::weakly_canonical(fs::absolute(destination, error), error);
+  const bool isTaken = !error && fs::exists(resolved, error) && !fs::is_directory(resolved, error);
+  if (error || destination.empty() || isTaken) {
+    why = NoFolder("DESTINATION", destination, error);
+    return false;
+  }
+  destination = WithoutSlash(resolved.string());
+  return true;
+}
+
 /// Makes both paths absolute, without links and dots, so that they can be told apart. False when
 /// they cannot be used; `why` then says so.
 bool ResolvePaths(Options& options, std::string& why) {
-  std::error_code error;
-  const fs::path source = fs::canonical(options.source, error);
-  if (error || !fs::is_directory(source, error)) {
-    why = "SOURCE is no folder: " + Quote(options.source);
+  if (!ResolveSource(options.source, why) || !ResolveDestination(options.destination, why))
     return false;
-  }
-  const fs::path destination =
-      fs::weakly_canonical(fs::absolute(options.destination, error), error);
-  if (error || options.destination.empty() ||
-      (fs::exists(destination, error) && !fs::is_directory(destination, error))) {
-    why = "DESTINATION is no folder: " + Quote(options.destination);
-    return false;
-  }
-  options.source = source.string();
-  options.destination = WithoutSlash(destination.string());
   if (options.source == options.destination) {
     why = "SOURCE and DESTINATION are the same folder";
   } else if (!IsUtf8(options.source) || !IsUtf8(options.destination)) {

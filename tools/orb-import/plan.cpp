@@ -62,10 +62,7 @@ std::vector<unsigned> NumbersAmong(const std::set<std::string>& names,
 
 Found Planner::At(const std::string& folder, const Member& member, unsigned number) {
   const std::string path = Join(folder, NameOf(member, number));
-  if (claimed_.count(path) != 0) return Found::kOther;
-  const std::vector<unsigned> taken = view_.Numbers(folder, member.stem, member.tail);
-  if (!std::binary_search(taken.begin(), taken.end(), number)) return Found::kFree;
-  return view_.Look(path, items_[member.item]);
+  return claimed_.count(path) != 0 ? Found::kOther : view_.Look(path, items_[member.item]);
 }
 
 /// The number under which the shot's main file is there, and with the fewest strangers beside it.

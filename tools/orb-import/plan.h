@@ -29,7 +29,7 @@ class View {
   virtual std::vector<unsigned> Numbers(const std::string& folder,
                                         const std::string& stem,
                                         const std::string& tail) = 0;
-  /// Whether the item's bytes and times are what is there.
+  /// What stands there.
   virtual Found Look(const std::string& path, const Item& item) = 0;
 };
 

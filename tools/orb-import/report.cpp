@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "report.h"
 
+#include <chrono>
+#include <cstdio>
 #include <iomanip>
 #include <ostream>
 #include <string_view>
@@ -61,26 +63,21 @@ const char* ReasonOf(SkipReason reason) {
 
 /// 2024-05-01T10:20:30Z
 std::string UtcText(const COrbTime& time) {
-  constexpr std::int64_t kDaysFrom1904To1970 = 24107;
-  const auto seconds = static_cast<std::int64_t>(WholeSeconds(time));
-  const std::int64_t rest = seconds % 86400;
-  // Days since 0000-03-01, in eras of 400 years, so that leap days end their years.
-  const std::int64_t day = seconds / 86400 - kDaysFrom1904To1970 + 719468;
-  const std::int64_t era = day / 146097;
-  const std::int64_t ofEra = day % 146097;
-  const std::int64_t year = (ofEra - ofEra / 1460 + ofEra / 36524 - ofEra / 146096) / 365;
-  const std::int64_t ofYear = ofEra - (365 * year + year / 4 - year / 100);
-  const std::int64_t month = (5 * ofYear + 2) / 153;
+  using namespace std::chrono;
+  constexpr sys_days kStart = year(1904) / January / 1;
+  const sys_seconds at = kStart + seconds(WholeSeconds(time));
+  const year_month_day date(floor<days>(at));
+  const hh_mm_ss<seconds> clock(at - floor<days>(at));
   char text[48];
   std::snprintf(text,
                 sizeof text,
-                "%04lld-%02lld-%02lldT%02lld:%02lld:%02lldZ",
-                static_cast<long long>(year + era * 400 + (month >= 10 ? 1 : 0)),
-                static_cast<long long>(month < 10 ? month + 3 : month - 9),
-                static_cast<long long>(ofYear - (153 * month + 2) / 5 + 1),
-                static_cast<long long>(rest / 3600),
-                static_cast<long long>(rest / 60 % 60),
-                static_cast<long long>(rest % 60));
+                "%04d-%02u-%02uT%02d:%02d:%02dZ",
+                static_cast<int>(date.year()),
+                static_cast<unsigned>(date.month()),
+                static_cast<unsigned>(date.day()),
+                static_cast<int>(clock.hours().count()),
+                static_cast<int>(clock.minutes().count()),
+                static_cast<int>(clock.seconds().count()));
   return text;
 }
 

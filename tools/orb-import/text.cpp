@@ -244,12 +244,13 @@ std::string CodeMeaning(OrbResult code) {
 }
 
 OrbResult MakeFolder(const std::string& path) {
+  // Through the dot, so that a link to a folder will do and a file will not.
+  const auto isFolder = [&] { return COrbFileHandle(OrbPath(path + "/.")).IsExist(); };
+  if (isFolder()) return kOrbNoErr;
   const std::size_t slash = path.rfind('/');
   const OrbResult made = OrbCreateFolder(
       OrbPath(slash == 0 ? "/" : path.substr(0, slash)), OrbText(path.substr(slash + 1)), nullptr);
-  // Through the dot, so that a link to a folder will do and a file will not.
-  const bool isFolder = COrbFileHandle(OrbPath(path + "/.")).IsExist();
-  return made == kOrbErrFileExists && isFolder ? kOrbNoErr : made;
+  return made == kOrbErrFileExists && isFolder() ? kOrbNoErr : made;
 }
 
 }  // namespace orbimport

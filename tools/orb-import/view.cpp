@@ -65,6 +65,9 @@ std::vector<unsigned> FolderView::Numbers(const std::string& folder,
 }
 
 Found FolderView::Look(const std::string& path, const Item& item) {
+  const std::size_t slash = path.rfind('/');
+  const std::string folder = slash == std::string::npos ? "" : path.substr(0, slash);
+  if (Names(folder).count(path.substr(slash + 1)) == 0) return Found::kFree;
   const auto [at, isNew] = looks_.try_emplace({path, item.path}, Found::kOther);
   if (isNew) at->second = LookNow(path, item);
   return at->second;

@@ -79,6 +79,12 @@ class ORB_EXPORT COrbFileHandle : public COrbFilePath {
   /// Whether both paths are the same text without regard to case and to a trailing "/".
   bool IsEqual(const COrbFileHandle& other) const;
 
+  /// One of the eOrbDriveType values, found out once for each volume and then kept as long as the
+  /// process runs. eOrbDriveType_Fixed also where nothing exists, which is not kept. Whether an item
+  /// on a network volume exists is not asked, so that a server that is gone does not hang the
+  /// answer. Collects nothing, and may be called on different handles from several threads at once.
+  unsigned int GetDriveType() const;
+
   /// Times with a resolution of 1/65536 s. kOrbErrNoSuchFile when they cannot be collected; the
   /// output is then untouched.
   OrbResult GetCreateTime(COrbTime* time) const;

@@ -22,6 +22,9 @@ constexpr off_t kRangeStep = 4 * 1024 * 1024;
 
 Status EndedEarly() { return ErrorFromErrno(EIO); }
 
+/// A file system that takes nothing and names no error would be asked forever.
+Status WriteFailure(ssize_t count) { return count < 0 ? LastError() : ErrorFromErrno(EIO); }
+
 /// Carries stretches of one file into another. What the kernel cannot do by itself it does not try
 /// again.
 class Carrier {
@@ -63,7 +66,7 @@ class Carrier {
     for (std::size_t done = 0; done < count;) {
       const ssize_t written =
           Retry([&] { return ::pwrite(to_, block_->data() + done, count - done, *offset); });
-      if (written < 0) return LastError();
+      if (written <= 0) return WriteFailure(written);
       done += static_cast<std::size_t>(written);
       *offset += written;
     }
@@ -155,7 +158,7 @@ Result<std::size_t> ReadBlock(int from, std::span<std::byte> block) {
 Status WriteBlock(int to, std::span<const std::byte> block) {
   while (!block.empty()) {
     const ssize_t count = Retry([&] { return ::write(to, block.data(), block.size()); });
-    if (count < 0) return LastError();
+    if (count <= 0) return WriteFailure(count);
     block = block.subspan(static_cast<std::size_t>(count));
   }
   return {};

@@ -1,0 +1,315 @@
+// SPDX-License-Identifier: MIT
+#include "platform/drives.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <atomic>
+#include <chrono>
+#include <climits>
+#include <cstddef>
+#include <filesystem>
+#include <mutex>
+#include <optional>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include "platform/linux/posix.h"
+#include "platform/linux/system_file.h"
+#include "platform/mount_table.h"
+
+namespace orb::platform {
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+/// Newer than the C library's own header.
+constexpr unsigned kUniqueMountId = 0x4000;
+constexpr std::chrono::seconds kTableAge{1};
+/// Mappings stand on mappings; a chain longer than this is a loop.
+constexpr int kMostSlaves = 8;
+
+constexpr std::string_view kRemoteTypes[] = {"9p",
+                                             "afs",
+                                             "auristorfs",
+                                             "beegfs",
+                                             "ceph",
+                                             "cifs",
+                                             "coda",
+                                             "davfs",
+                                             "fuse.afp",
+                                             "fuse.beegfs",
+                                             "fuse.ceph",
+                                             "fuse.curlftpfs",
+                                             "fuse.davfs",
+                                             "fuse.davfs2",
+                                             "fuse.gcsfuse",
+                                             "fuse.glusterfs",
+                                             "fuse.goofys",
+                                             "fuse.gvfsd-fuse",
+                                             "fuse.juicefs",
+                                             "fuse.kio-fuse",
+                                             "fuse.rclone",
+                                             "fuse.s3fs",
+                                             "fuse.smbnetfs",
+                                             "fuse.sshfs",
+                                             "gfs2",
+                                             "glusterfs",
+                                             "gpfs",
+                                             "gvfs",
+                                             "lustre",
+                                             "ncpfs",
+                                             "nfs",
+                                             "nfs4",
+                                             "ocfs2",
+                                             "orangefs",
+                                             "smb3",
+                                             "smbfs"};
+
+bool IsRemote(const Mount& mount) { return std::ranges::binary_search(kRemoteTypes, mount.type); }
+
+// --- The device below a volume, as sysfs tells of it
+
+/// A disk, a partition, or what is made of such ones.
+struct Device {
+  /// Its folder in sysfs, by a link, and that of the disk which a partition is on.
+  std::string folder;
+  std::string disk;
+  /// Where the link leads: "../../devices/pci0000:00/0000:00:14.0/usb1/1-2/.../block/sdb/sdb1".
+  std::string path;
+};
+
+std::optional<Device> FindDevice(const std::string& folder) {
+  std::array<char, PATH_MAX> target;
+  const ssize_t size = ::readlink(folder.c_str(), target.data(), target.size());
+  if (size < 0 && errno != EINVAL) return std::nullopt;  // EINVAL: a folder, and no link.
+  Device device{folder, folder, size < 0 ? folder : std::string(target.data(), std::size_t(size))};
+  const bool isPartition = ::access((folder + "/partition").c_str(), F_OK) == 0;
+  if (isPartition) device.disk += "/..";
+  return device;
+}
+
+/// Empty when there is none.
+std::string ReadAttribute(const std::string& folder, const char* name) {
+  const Result<std::string> text = ReadSystemFile(folder + '/' + name);
+  return text ? text.Value().substr(0, text.Value().find('\n')) : std::string();
+}
+
+/// Whether a component of the path is the word and a number, as in usb1 and fw0.
+bool HasNumbered(std::string_view path, std::string_view word) {
+  const auto isDigit = [](char c) { return c >= '0' && c <= '9'; };
+  for (std::size_t at = path.find(word); at != path.npos; at = path.find(word, at + 1)) {
+    const std::size_t number = at + word.size();
+    const std::size_t end = std::min(path.find('/', number), path.size());
+    const std::string_view digits = path.substr(number, end - number);
+    const bool begins = at > 0 && path[at - 1] == '/';
+    if (begins && !digits.empty() && std::ranges::all_of(digits, isDigit)) return true;
+  }
+  return false;
+}
+
+/// Only devices that the kernel makes of others stand on some.
+bool IsPhysical(const Device& device) {
+  return device.path.find("/devices/") != std::string::npos &&
+         device.path.find("/virtual/") == std::string::npos;
+}
+
+/// The disks and partitions that a device-mapper or md device stands on.
+std::vector<Device> Slaves(const Device& device) {
+  std::vector<Device> slaves;
+  std::error_code ignored;
+  for (const auto& entry :
+       std::filesystem::directory_iterator(device.folder + "/slaves", ignored)) {
+    if (auto slave = FindDevice(entry.path())) slaves.push_back(*std::move(slave));
+  }
+  return slaves;
+}
+
+/// Of a SCSI device its kind, where 5 is an optical drive; of a card "SD", or "MMC" for one that is
+/// soldered in.
+std::string TypeOf(const Device& device) { return ReadAttribute(device.disk, "device/type"); }
+
+bool IsEjectable(const Device& device, const std::string& type, int depth = 0) {
+  if (HasNumbered(device.path, "usb") || HasNumbered(device.path, "fw")) return true;
+  if (type.starts_with("SD") || ReadAttribute(device.disk, "removable") == "1") return true;
+  if (IsPhysical(device) || depth == kMostSlaves) return false;
+  return std::ranges::any_of(Slaves(device), [&](const auto& slave) {
+    return IsEjectable(slave, TypeOf(slave), depth + 1);
+  });
+}
+
+/// sysfs has "!" for the "/" of such names as cciss/c0d0.
+std::string SysfsName(std::string_view source) {
+  constexpr std::string_view kDevices = "/dev/";
+  if (!source.starts_with(kDevices)) return {};
+  std::string name(source.substr(kDevices.size()));
+  std::ranges::replace(name, '/', '!');
+  return name;
+}
+
+/// A mapping's source is the link that udev makes; the kernel calls its device dm-0 and the like.
+std::optional<Device> FindMapping(const std::string& sysfs, std::string_view source) {
+  constexpr std::string_view kMapper = "/dev/mapper/";
+  if (!source.starts_with(kMapper)) return std::nullopt;
+  std::error_code ignored;
+  for (const auto& entry : std::filesystem::directory_iterator(sysfs + "/block", ignored)) {
+    const std::string folder = entry.path();
+    if (ReadAttribute(folder, "dm/name") == source.substr(kMapper.size())) {
+      return FindDevice(folder);
+    }
+  }
+  return std::nullopt;
+}
+
+/// The device that a volume is on, if it is on one. Volumes that may be on several, such as those
+/// of btrfs, have no device number and are found by their source.
+std::optional<Device> FindDevice(const std::string& sysfs, const Mount& mount) {
+  if (mount.device.major != 0) {
+    const std::string number =
+        std::to_string(mount.device.major) + ':' + std::to_string(mount.device.minor);
+    if (auto device = FindDevice(sysfs + "/dev/block/" + number)) return device;
+  }
+  const std::string name = SysfsName(mount.source);
+  if (name.empty()) return std::nullopt;
+  if (auto device = FindDevice(sysfs + "/class/block/" + name)) return device;
+  if (auto device = FindDevice(sysfs + "/block/" + name)) return device;
+  return FindMapping(sysfs, mount.source);
+}
+
+bool CallerMayWrite(const Mount& mount, const Device& device) {
+  if (mount.readOnly || ReadAttribute(device.folder, "ro") == "1") return false;
+  if (device.folder != device.disk && ReadAttribute(device.disk, "ro") == "1") return false;
+  return ::faccessat(AT_FDCWD, mount.folder.c_str(), W_OK, AT_EACCESS) == 0;
+}
+
+DriveTraits TraitsOf(const Mount& mount, const std::string& sysfs) {
+  constexpr std::string_view kScsiOptical = "5";
+  if (IsRemote(mount)) return {.remote = true};
+  const std::optional<Device> device = FindDevice(sysfs, mount);
+  if (!device) return {};
+  DriveTraits traits;
+  const std::string type = TypeOf(*device);
+  traits.optical = type == kScsiOptical;
+  traits.ejectable = traits.optical || IsEjectable(*device, type);
+  traits.writable = traits.ejectable && CallerMayWrite(mount, *device);
+  return traits;
+}
+
+// --- The volume of an item
+
+using StatusRecord = struct statx;
+
+Result<StatusRecord> ReadMountId(const std::string& path, unsigned wanted) {
+  constexpr int kFlags = AT_SYMLINK_NOFOLLOW | AT_NO_AUTOMOUNT | AT_STATX_DONT_SYNC;
+  StatusRecord status;
+  const auto ask = [&] { return ::statx(AT_FDCWD, path.c_str(), kFlags, wanted, &status); };
+  if (Retry(ask) != 0) return LastError();
+  return status;
+}
+
+VolumeId IdOf(std::uint64_t mount, DeviceNumber device) {
+  return {mount, std::uint64_t{device.major} << 32 | device.minor};
+}
+
+VolumeId IdOf(const StatusRecord& status) {
+  if ((status.stx_mask & kUniqueMountId) != 0) return {status.stx_mnt_id, 0};
+  const bool known = (status.stx_mask & STATX_MNT_ID) != 0;
+  return IdOf(known ? status.stx_mnt_id : 0, {status.stx_dev_major, status.stx_dev_minor});
+}
+
+/// Keeps the mount table for a second: the questions about 10,000 items should not read it 10,000
+/// times. Guarded by its lock.
+class RecentMountTable {
+ public:
+  explicit RecentMountTable(std::string file) : file_(std::move(file)) {}
+
+  /// The network mount that a path is on by its text. What ".." means only the kernel knows.
+  std::optional<Mount> FindRemote(std::string_view path) {
+    if (path.find("/..") != std::string_view::npos) return std::nullopt;
+    const std::lock_guard lock(mutex_);
+    if (!freshUntil_ || Clock::now() >= *freshUntil_) Refresh();
+    const Mount* mount = hasRemote_ ? table_.FindByPath(path) : nullptr;
+    return mount != nullptr && IsRemote(*mount) ? std::optional(*mount) : std::nullopt;
+  }
+
+  /// The mount with the number or, where the kernel tells none, the path's. A number that is not
+  /// known may be that of a new mount.
+  std::optional<Mount> Find(std::optional<std::uint64_t> id, std::string_view path) {
+    const std::lock_guard lock(mutex_);
+    const Mount* mount = id ? table_.FindById(*id) : nullptr;
+    if (mount == nullptr) Refresh();
+    if (mount == nullptr && id) mount = table_.FindById(*id);
+    if (mount == nullptr) mount = table_.FindByPath(path);
+    return mount != nullptr ? std::optional(*mount) : std::nullopt;
+  }
+
+ private:
+  void Refresh() {
+    Result<MountTable> table = MountTable::Read(file_);
+    table_ = table ? std::move(table).Value() : MountTable();
+    hasRemote_ = std::ranges::any_of(table_.Mounts(), IsRemote);
+    freshUntil_ = Clock::now() + kTableAge;
+  }
+
+  const std::string file_;
+  std::mutex mutex_;
+  MountTable table_;
+  bool hasRemote_ = false;
+  std::optional<Clock::time_point> freshUntil_;
+};
+
+class SystemDrives final : public Drives {
+ public:
+  explicit SystemDrives(SystemRoots roots)
+      : sysfs_(std::move(roots.sysfs)), mounts_(std::move(roots.mountTable)) {}
+
+  Result<VolumeId> VolumeOf(const std::string& path) const override {
+    const ErrnoKeeper errnoKeeper;
+    if (const auto remote = mounts_.FindRemote(path)) return IdOf(remote->id, remote->device);
+    const Result<StatusRecord> status = ReadMountId(path, kUniqueMountId);
+    if (!status) return status.Reason();
+    return IdOf(status.Value());
+  }
+
+  Result<DriveTraits> Read(const std::string& path) const override {
+    const ErrnoKeeper errnoKeeper;
+    if (mounts_.FindRemote(path)) return DriveTraits{.remote = true};
+    const Result<StatusRecord> status = ReadMountId(path, STATX_MNT_ID);
+    if (!status) return status.Reason();
+    const bool known = (status.Value().stx_mask & STATX_MNT_ID) != 0;
+    const auto id = known ? std::optional<std::uint64_t>(status.Value().stx_mnt_id) : std::nullopt;
+    const std::optional<Mount> mount = mounts_.Find(id, path);
+    if (!mount) return kNoSuchItem;
+    return TraitsOf(*mount, sysfs_);
+  }
+
+ private:
+  const std::string sysfs_;
+  mutable RecentMountTable mounts_;
+};
+
+constinit std::atomic<const Drives*> currentDrives = nullptr;
+
+}  // namespace
+
+std::unique_ptr<const Drives> MakeDrives(SystemRoots roots) {
+  return std::make_unique<SystemDrives>(std::move(roots));
+}
+
+const Drives& Drives::Current() {
+  static const SystemDrives systemDrives{SystemRoots()};
+  const Drives* replacement = currentDrives.load(std::memory_order_acquire);
+  return replacement != nullptr ? *replacement : systemDrives;
+}
+
+ScopedDrives::ScopedDrives(const Drives& replacement)
+    : previous_(currentDrives.exchange(&replacement)) {}
+
+ScopedDrives::~ScopedDrives() { currentDrives.store(previous_); }
+
+}  // namespace orb::platform

@@ -1,0 +1,25 @@
+// SPDX-License-Identifier: MIT
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+#include "platform/error.h"
+
+namespace orb::platform {
+
+/// What is known of an item with all it holds.
+struct TreeSurvey {
+  /// The space it takes up on its volume.
+  std::uint64_t bytes = 0;
+  /// Something inside is locked, or on a volume of its own: not all of it could be removed.
+  bool canBeRemoved = true;
+};
+
+enum class SurveyFor { kSize, kRemoval };
+
+/// Looks at the item at `name` in an open folder and, without following links, at all below it.
+/// kSize asks for the size alone. Fails for a tree that is deeper than a path can tell.
+Result<TreeSurvey> SurveyTree(int folder, const std::string& name, SurveyFor purpose);
+
+}  // namespace orb::platform

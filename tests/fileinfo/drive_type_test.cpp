@@ -1,0 +1,113 @@
+// SPDX-License-Identifier: MIT
+#include <gtest/gtest.h>
+#include <orb/fileinfo/drive_type.h>
+#include <orb/fileinfo/file_handle.h>
+
+#include <atomic>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "platform/drives.h"
+#include "support/temp_folder.h"
+
+namespace {
+
+using orb::platform::DriveTraits;
+using orb::platform::Result;
+using orb::platform::VolumeId;
+
+/// A machine of one volume, which counts how often it is looked at. Every test takes a number of
+/// its own, because what was found out stays.
+class OneVolume final : public orb::platform::Drives {
+ public:
+  OneVolume(std::uint64_t number, Result<DriveTraits> traits) : number_(number), traits_(traits) {}
+
+  Result<VolumeId> VolumeOf(const std::string& path) const override {
+    if (path == "/gone") return orb::platform::kNoSuchItem;
+    return VolumeId{number_, 1};
+  }
+  Result<DriveTraits> Read(const std::string&) const override {
+    ++reads;
+    return traits_;
+  }
+
+  mutable std::atomic<int> reads = 0;
+
+ private:
+  std::uint64_t number_;
+  Result<DriveTraits> traits_;
+};
+
+unsigned int DriveTypeOf(const char* path) {
+  const COrbStringData text(OrbCharUtf8{path});
+  COrbFileHandle handle;
+  handle.Initialize(&text);
+  return handle.GetDriveType();
+}
+
+TEST(GetDriveType, TakesTheFirstThatHolds) {
+  const struct {
+    DriveTraits traits;
+    unsigned int type;
+  } kCases[] = {
+      {{}, 0x100},
+      {{.writable = true}, 0x100},
+      {{.optical = true, .remote = true, .ejectable = true}, 0x200},
+      {{.remote = true, .ejectable = true, .writable = true}, 0x800},
+      {{.ejectable = true, .writable = true}, 0x400},
+      {{.ejectable = true}, 0x1000},
+  };
+  std::uint64_t number = 1000;
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.type);
+    const OneVolume volume(++number, c.traits);
+    const orb::platform::ScopedDrives scoped(volume);
+    EXPECT_EQ(DriveTypeOf("/a"), c.type);
+    EXPECT_EQ(DriveTypeOf("/b"), c.type);
+    EXPECT_EQ(volume.reads, 1) << "kept for the volume";
+  }
+}
+
+TEST(GetDriveType, KeepsAVolumesTypeAndNoFailure) {
+  {
+    const OneVolume broken(2001, orb::platform::kNotPermitted);
+    const orb::platform::ScopedDrives scoped(broken);
+    EXPECT_EQ(DriveTypeOf("/a"), 0x100u);
+    EXPECT_EQ(DriveTypeOf("/gone"), 0x100u);
+    EXPECT_EQ(broken.reads, 1);
+  }
+  {
+    const OneVolume stick(2001, DriveTraits{.ejectable = true, .writable = true});
+    const orb::platform::ScopedDrives scoped(stick);
+    EXPECT_EQ(DriveTypeOf("/gone"), 0x100u);
+    EXPECT_EQ(DriveTypeOf(""), 0x100u);
+    EXPECT_EQ(DriveTypeOf("/\xff"), 0x100u) << "no text that names an item";
+    EXPECT_EQ(DriveTypeOf("/a"), 0x400u) << "the failure was not kept";
+  }
+  const OneVolume locked(2001, DriveTraits{.ejectable = true});
+  const orb::platform::ScopedDrives scoped(locked);
+  EXPECT_EQ(DriveTypeOf("/a"), 0x400u) << "also after its writability has changed";
+  EXPECT_EQ(locked.reads, 0);
+}
+
+TEST(GetDriveType, MayBeAskedFromSeveralThreads) {
+  const OneVolume stick(3001, DriveTraits{.ejectable = true, .writable = true});
+  const orb::platform::ScopedDrives scoped(stick);
+  std::vector<std::thread> threads;
+  for (int i = 0; i < 4; ++i) {
+    threads.emplace_back([] {
+      for (int j = 0; j < 500; ++j) EXPECT_EQ(DriveTypeOf("/a"), 0x400u);
+    });
+  }
+  for (std::thread& thread : threads) thread.join();
+}
+
+TEST(GetDriveType, AnswersForThisMachine) {
+  const orb::test::TempFolder folder;
+  const unsigned int type = DriveTypeOf(folder.Path().c_str());
+  EXPECT_TRUE(type == 0x100 || type == 0x400 || type == 0x800) << type;
+  EXPECT_EQ(DriveTypeOf((folder / "gone").c_str()), 0x100u);
+}
+
+}  // namespace

@@ -1,0 +1,202 @@
+// SPDX-License-Identifier: MIT
+#include "platform/drives.h"
+
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+
+#include <filesystem>
+#include <string>
+
+#include "support/faults.h"
+#include "support/temp_folder.h"
+
+namespace orb::platform {
+namespace {
+
+namespace fs = std::filesystem;
+
+/// Lays out sysfs and the mount table of a machine of its own. Its mounts are plain folders, known
+/// by their paths: no mount here has a number that the kernel gives out.
+class Machine {
+ public:
+  /// A disk or partition, "pci0/usb1/1-2/block/sdb/sdb1", found by number and by name.
+  void AddDevice(const std::string& path, const std::string& number) const {
+    const std::string folder = folder_ / ("sys/devices/" + path);
+    const std::string name = fs::path(path).filename();
+    fs::create_directories(folder);
+    Link("sys/dev/block", number, "../../devices/" + path);
+    Link("sys/class/block", name, "../../devices/" + path);
+    if (fs::path(path).parent_path().filename() == "block") {
+      Link("sys/block", name, "../devices/" + path);
+      SetAttribute(path, "removable", "0");
+    } else {
+      SetAttribute(path, "partition", "1");
+    }
+  }
+  void SetAttribute(const std::string& path,
+                    const std::string& name,
+                    const std::string& value) const {
+    const std::string file = "sys/devices/" + path + "/" + name;
+    fs::create_directories(fs::path(folder_ / file).parent_path());
+    folder_.Write(file, value + "\n");
+  }
+  void AddSlave(const std::string& path, const std::string& slave) const {
+    Link("sys/devices/" + path + "/slaves",
+         fs::path(slave).filename(),
+         folder_ / ("sys/devices/" + slave));
+  }
+
+  /// Gives the folder where the volume is seen.
+  std::string Mount(const std::string& name,
+                    const std::string& number,
+                    const std::string& type,
+                    const std::string& source,
+                    const std::string& options = "rw") {
+    fs::create_directories(folder_ / name);
+    std::string escaped = folder_ / name;
+    for (std::size_t at; (at = escaped.find(' ')) != std::string::npos;) {
+      escaped.replace(at, 1, "\\040");
+    }
+    table_ += std::to_string(900'000'000 + ++mounts_) + " 1 " + number + " / " + escaped + " " +
+              options + " - " + type + " " + source + " rw\n";
+    folder_.Write("mountinfo", table_);
+    return folder_ / name;
+  }
+
+  std::string KindOf(const std::string& path) const {
+    const auto drives = MakeDrives({folder_ / "mountinfo", folder_ / "sys"});
+    const Result<DriveTraits> read = drives->Read(path);
+    if (!read) return "nothing";
+    const DriveTraits& traits = read.Value();
+    if (traits.remote) return "remote";
+    if (traits.optical) return "optical";
+    if (!traits.ejectable) return "fixed";
+    return traits.writable ? "removable" : "read-only";
+  }
+  const test::TempFolder& Folder() const { return folder_; }
+
+ private:
+  void Link(const std::string& folder, const std::string& name, const std::string& target) const {
+    fs::create_directories(folder_ / folder);
+    fs::create_symlink(target, folder_ / (folder + "/" + name));
+  }
+
+  test::TempFolder folder_;
+  std::string table_;
+  int mounts_ = 0;
+};
+
+TEST(Drives, TellTheDisksOfAMachineApart) {
+  Machine machine;
+  machine.AddDevice("pci0/ata1/block/sda", "8:0");
+  machine.AddDevice("pci0/ata1/block/sda/sda2", "8:2");
+  machine.AddDevice("pci0/usb2/2-1/2-1:1.0/host6/block/sdb", "8:16");
+  machine.AddDevice("pci0/usb2/2-1/2-1:1.0/host6/block/sdb/sdb1", "8:17");
+  machine.AddDevice("pci0/usb2/2-2/block/sdd", "8:48");  // A stick with a write-protect switch.
+  machine.SetAttribute("pci0/usb2/2-2/block/sdd", "ro", "1");
+  machine.AddDevice("pci0/ata2/block/sdc", "8:32");  // A bay that says it can be emptied.
+  machine.SetAttribute("pci0/ata2/block/sdc", "removable", "1");
+  machine.AddDevice("pci0/ata2/block/sdc/sdc1", "8:33");
+  machine.AddDevice("pci0/fw0/block/sde", "8:64");
+  machine.AddDevice("pci0/mmc_host/mmc0/mmc0:1/block/mmcblk0", "179:0");
+  machine.SetAttribute("pci0/mmc_host/mmc0/mmc0:1/block/mmcblk0", "device/type", "SD");
+  machine.AddDevice("pci0/mmc_host/mmc0/mmc0:1/block/mmcblk0/mmcblk0p1", "179:1");
+  machine.AddDevice("pci0/mmc_host/mmc1/mmc1:1/block/mmcblk1", "179:32");
+  machine.SetAttribute("pci0/mmc_host/mmc1/mmc1:1/block/mmcblk1", "device/type", "MMC");
+  machine.AddDevice("pci0/mmc_host/mmc1/mmc1:1/block/mmcblk1/mmcblk1p1", "179:33");
+  machine.AddDevice("pci0/ata3/block/sr0", "11:0");
+  machine.SetAttribute("pci0/ata3/block/sr0", "removable", "1");
+  machine.SetAttribute("pci0/ata3/block/sr0", "device/type", "5");
+  machine.AddDevice("virtual/block/loop0", "7:0");
+  machine.AddDevice("virtual/block/dm-0", "253:0");
+  machine.SetAttribute("virtual/block/dm-0", "dm/name", "vault");
+  machine.AddSlave("virtual/block/dm-0", "pci0/usb2/2-1/2-1:1.0/host6/block/sdb/sdb1");
+  machine.AddDevice("virtual/block/dm-1", "253:1");
+  machine.AddSlave("virtual/block/dm-1", "pci0/ata1/block/sda/sda2");
+  machine.AddSlave("virtual/block/dm-1", "virtual/block/dm-1");  // A loop ends.
+
+  const struct {
+    const char* name;
+    const char* number;
+    const char* type;
+    const char* source;
+    const char* options;
+    const char* kind;
+  } kCases[] = {
+      {"disk", "8:2", "ext4", "/dev/sda2", "rw", "fixed"},
+      {"stick", "8:17", "vfat", "/dev/sdb1", "rw", "removable"},
+      {"stick in ro", "8:17", "vfat", "/dev/sdb1", "ro,nosuid", "read-only"},
+      {"switched stick", "8:48", "exfat", "/dev/sdd", "rw", "read-only"},
+      {"stick by name", "0:61", "fuse.exfat", "/dev/sdb1", "rw", "removable"},
+      {"stick, new node", "8:17", "vfat", "/dev/mine", "rw", "removable"},
+      {"bay", "8:33", "xfs", "/dev/sdc1", "rw", "removable"},
+      {"firewire", "8:64", "ext4", "/dev/sde", "rw", "removable"},
+      {"card", "179:1", "exfat", "/dev/mmcblk0p1", "rw", "removable"},
+      {"eMMC", "179:33", "ext4", "/dev/mmcblk1p1", "rw", "fixed"},
+      {"dvd", "11:0", "udf", "/dev/sr0", "ro", "optical"},
+      {"image", "7:0", "iso9660", "/dev/loop0", "ro", "fixed"},
+      {"LUKS on USB", "253:0", "ext4", "/dev/mapper/vault", "rw", "removable"},
+      {"btrfs on LUKS on USB", "0:62", "btrfs", "/dev/mapper/vault", "rw", "removable"},
+      {"LVM", "253:1", "ext4", "/dev/mapper/vg-home", "rw", "fixed"},
+      {"subvolume", "0:50", "btrfs", "/dev/sda2", "rw,subvol=/@home", "fixed"},
+      {"subvolume on a stick", "0:51", "btrfs", "/dev/sdb1", "rw", "removable"},
+      {"overlay", "0:52", "overlay", "overlay", "rw", "fixed"},
+      {"memory", "0:53", "tmpfs", "tmpfs", "rw", "fixed"},
+      {"pool", "0:54", "zfs", "pool/data", "rw", "fixed"},
+      {"nfs", "0:55", "nfs4", "nas:/photos", "rw", "remote"},
+      {"cifs", "0:56", "cifs", "//nas/photos", "ro", "remote"},
+      {"sshfs", "0:57", "fuse.sshfs", "me@nas:", "rw", "remote"},
+      {"share that looks like a stick", "0:58", "9p", "/dev/sdb1", "rw", "remote"},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.name);
+    const std::string folder = machine.Mount(c.name, c.number, c.type, c.source, c.options);
+    EXPECT_EQ(machine.KindOf(folder), c.kind);
+    std::ofstream(folder + "/photo.jpg");
+    EXPECT_EQ(machine.KindOf(folder + "/photo.jpg"), c.kind);
+  }
+}
+
+TEST(Drives, DoNotLookAtWhatIsBelowANetworkMount) {
+  Machine machine;
+  const std::string share = machine.Mount("share", "0:55", "nfs", "nas:/photos");
+  const auto drives = MakeDrives({machine.Folder() / "mountinfo", machine.Folder() / "sys"});
+  fs::remove(share);  // As good as a server that does not answer.
+  EXPECT_EQ(machine.KindOf(share + "/photo.jpg"), "remote");
+  EXPECT_EQ(drives->VolumeOf(share + "/photo.jpg").Value(),
+            drives->VolumeOf(share + "/b/c").Value());
+}
+
+TEST(Drives, GiveNothingWhereNothingIs) {
+  Machine machine;
+  const std::string disk = machine.Mount("disk", "8:2", "ext4", "/dev/sda2");
+  EXPECT_EQ(machine.KindOf(disk + "/gone"), "nothing");
+  EXPECT_EQ(machine.KindOf(""), "nothing");
+  EXPECT_FALSE(Drives::Current().VolumeOf(disk + "/gone").Ok());
+}
+
+TEST(Drives, KnowARealMountByItsNumber) {
+  const test::TempFolder folder;
+  const std::string inner = folder / "inner";
+  const auto volumeOf = [](const std::string& path) {
+    return Drives::Current().VolumeOf(path).Value();
+  };
+  fs::create_directory(inner);
+  fs::create_symlink(inner, folder / "link");
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    const VolumeId before = volumeOf(inner);
+    EXPECT_EQ(before, volumeOf(folder.Path()));
+    ASSERT_TRUE(test::MountTmpfs(inner, "size=1m"));
+    const VolumeId first = volumeOf(inner);
+    EXPECT_NE(first, before);
+    EXPECT_EQ(volumeOf(folder / "link"), before) << "the link itself is asked about";
+    EXPECT_TRUE(Drives::Current().Read(inner).Ok()) << "newer than the table that was read";
+    ::umount(inner.c_str());
+    ASSERT_TRUE(test::BindMount(folder.Path(), inner));
+    EXPECT_NE(volumeOf(inner), first);
+    EXPECT_NE(volumeOf(inner), before) << "the same volume, seen through another mount";
+  }));
+}
+
+}  // namespace
+}  // namespace orb::platform
