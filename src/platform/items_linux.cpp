@@ -78,10 +78,22 @@ bool CallerMayWrite(const ItemRecord& item) {
   return MayWrite(item, ::getuid(), groups);
 }
 
-void FillRecord(ItemRecord& record,
-                const ItemRef& item,
-                const StatusRecord& status,
-                const OwnAttributes& own) {
+/// What the system tells of an item.
+struct Reading {
+  StatusRecord status;
+  OwnAttributes own;
+};
+
+Result<Reading> ReadItem(const ItemRef& item) {
+  const Result<StatusRecord> status = ReadStatus(item);
+  if (!status) return status.Reason();
+  const Result<OwnAttributes> own = FindOwnAttributes(item);
+  if (!own) return own.Reason();
+  return Reading{status.Value(), own.Value()};
+}
+
+void FillRecord(ItemRecord& record, const ItemRef& item, const Reading& reading) {
+  const auto& [status, own] = reading;
   record.kind = KindOf(status);
   record.locked = own.lock || HasLockFlag(status);
   record.mode = status.stx_mode & 07777;
@@ -113,10 +125,8 @@ int ReadVolume(const char* path, ItemKind kind, struct statfs* volume) {
   return link ? ItemRef(link.Get()).Volume(volume) : -1;
 }
 
-void AskTheVolume(ItemInfo& info,
-                  const char* path,
-                  const StatusRecord& status,
-                  const OwnAttributes& own) {
+void AskTheVolume(ItemInfo& info, const char* path, const Reading& reading) {
+  const auto& [status, own] = reading;
   struct statfs volume;
   if (ReadVolume(path, info.kind, &volume) != 0) {
     info.volumeReadOnly = LastError();
@@ -142,8 +152,10 @@ Result<UniqueFd> OpenUnlocked(const char* path) {
   return item;
 }
 
-Status WriteModificationTime(int item, Timestamp time) {
-  const struct timespec times[] = {{0, UTIME_OMIT}, {time.seconds, time.nanoseconds}};
+/// Both times at once: disks behind FUSE accept a change of one alone without doing it.
+Status WriteTimes(int item, Timestamp accessed, Timestamp modified) {
+  const struct timespec times[] = {{accessed.seconds, accessed.nanoseconds},
+                                   {modified.seconds, modified.nanoseconds}};
   const int result = Retry([&] { return ::utimensat(item, "", times, AT_EMPTY_PATH); });
   return result == 0 ? Status() : Status(LastError());
 }
@@ -272,14 +284,12 @@ class SystemItems final : public Items {
   Result<ItemRecord> ReadRecord(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
     const ItemRef item(path.Get());
-    const Result<StatusRecord> status = ReadStatus(item);
-    if (!status) return status.Reason();
-    const Result<OwnAttributes> own = FindOwnAttributes(item);
-    if (!own) return own.Reason();
+    const Result<Reading> reading = ReadItem(item);
+    if (!reading) return reading.Reason();
     ItemInfo info;
-    FillRecord(info, item, status.Value(), own.Value());
-    if (MayShowReadOnlyAttribute(status.Value())) {
-      AskTheVolume(info, path.Get(), status.Value(), own.Value());
+    FillRecord(info, item, reading.Value());
+    if (MayShowReadOnlyAttribute(reading.Value().status)) {
+      AskTheVolume(info, path.Get(), reading.Value());
     }
     return ItemRecord(info);
   }
@@ -287,17 +297,15 @@ class SystemItems final : public Items {
   Result<ItemInfo> Read(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
     const ItemRef item(path.Get());
-    const Result<StatusRecord> status = ReadStatus(item);
-    if (!status) return status.Reason();
-    const Result<OwnAttributes> own = FindOwnAttributes(item);
-    if (!own) return own.Reason();
+    const Result<Reading> reading = ReadItem(item);
+    if (!reading) return reading.Reason();
     ItemInfo info;
-    FillRecord(info, item, status.Value(), own.Value());
+    FillRecord(info, item, reading.Value());
     info.mayWrite = CallerMayWrite(info);
     info.readable = IsReadableOnWritableVolume(path.Get(), info);
     if (!info.readable) {
       info.readable = Permits(path.Get(), R_OK, AT_SYMLINK_NOFOLLOW);
-      AskTheVolume(info, path.Get(), status.Value(), own.Value());
+      AskTheVolume(info, path.Get(), reading.Value());
     }
     info.isPackage = info.kind == ItemKind::kFolder && IsPackage(path.Get());
     return info;
@@ -324,11 +332,12 @@ class SystemItems final : public Items {
     const int fd = item.Value().Get();
     const Result<StatusRecord> before = ReadStatus(fd);
     if (!before) return before.Reason();
-    if (const Status written = WriteModificationTime(fd, time); !written) return written;
+    const Timestamp accessed = LastAccessTime(before.Value());
+    if (const Status written = WriteTimes(fd, accessed, time); !written) return written;
     const Result<StatusRecord> after = ReadStatus(fd);
     if (after && IsNear(ModificationTime(after.Value()), time)) return {};
     // The kernel takes what the volume cannot hold for the nearest that it can.
-    (void)WriteModificationTime(fd, ModificationTime(before.Value()));
+    (void)WriteTimes(fd, accessed, ModificationTime(before.Value()));
     return kNotPermitted;
   }
 

@@ -219,6 +219,28 @@ TEST(SetModified, RefusesATimeThatTheVolumeCannotHold) {
   EXPECT_EQ(Subject().Read(file).Value().modified, before);
 }
 
+/// A card as it comes from a camera, served by a process. False where the programs are missing.
+bool MountCard(const std::string& folder) {
+  const std::string make = "cd '" + folder + "' && mkdir card && truncate -s 8M image && " +
+                           "mkfs.exfat image && loop=$(losetup -f --show image) && " +
+                           "{ mount.exfat-fuse $loop card; status=$?; losetup -d $loop; } && " +
+                           "[ $status -eq 0 ]";
+  return std::system(("{ " + make + "; } >/dev/null 2>&1").c_str()) == 0;
+}
+
+TEST(SetModified, WorksOnACard) {
+  const TempFolder folder;
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    if (!MountCard(folder.Path())) return;
+    const std::string file = folder.Write("card/a.jpg", "");
+    EXPECT_TRUE(Subject().SetModified(file, {1588334400, 0}).Ok());
+    EXPECT_EQ(Subject().Read(file).Value().modified, (Timestamp{1588334400, 0}));
+    EXPECT_EQ(ReasonOf(Subject().SetCreated(file, {1588334400, 0})), kNotPermitted);
+    EXPECT_EQ(ReasonOf(Subject().SetLocked(file, true)), kNotPermitted);  // Not done, so not said.
+    EXPECT_EQ(::umount((folder / "card").c_str()), 0);
+  }));
+}
+
 TEST(SetCreated, IsReadBackUnlessTheAttributeIsGarbage) {
   const TempFolder folder;
   const std::string file = folder.Write("file", "");
