@@ -84,12 +84,13 @@ struct Reading {
   OwnAttributes own;
 };
 
-Result<Reading> ReadItem(const ItemRef& item) {
-  const Result<StatusRecord> status = ReadStatus(item);
-  if (!status) return status.Reason();
+/// In place: the record is large, and copies of it show in the time of a pass.
+Status ReadItem(const ItemRef& item, Reading& reading) {
+  if (Retry([&] { return item.Status(&reading.status); }) != 0) return LastError();
   const Result<OwnAttributes> own = FindOwnAttributes(item);
   if (!own) return own.Reason();
-  return Reading{status.Value(), own.Value()};
+  reading.own = own.Value();
+  return {};
 }
 
 void FillRecord(ItemRecord& record, const ItemRef& item, const Reading& reading) {
@@ -284,12 +285,12 @@ class SystemItems final : public Items {
   Result<ItemRecord> ReadRecord(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
     const ItemRef item(path.Get());
-    const Result<Reading> reading = ReadItem(item);
-    if (!reading) return reading.Reason();
+    Reading reading;
+    if (const Status read = ReadItem(item, reading); !read) return read.Reason();
     ItemInfo info;
-    FillRecord(info, item, reading.Value());
-    if (MayShowReadOnlyAttribute(reading.Value().status)) {
-      AskTheVolume(info, path.Get(), reading.Value());
+    FillRecord(info, item, reading);
+    if (MayShowReadOnlyAttribute(reading.status)) {
+      AskTheVolume(info, path.Get(), reading);
     }
     return ItemRecord(info);
   }
@@ -297,15 +298,15 @@ class SystemItems final : public Items {
   Result<ItemInfo> Read(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
     const ItemRef item(path.Get());
-    const Result<Reading> reading = ReadItem(item);
-    if (!reading) return reading.Reason();
+    Reading reading;
+    if (const Status read = ReadItem(item, reading); !read) return read.Reason();
     ItemInfo info;
-    FillRecord(info, item, reading.Value());
+    FillRecord(info, item, reading);
     info.mayWrite = CallerMayWrite(info);
     info.readable = IsReadableOnWritableVolume(path.Get(), info);
     if (!info.readable) {
       info.readable = Permits(path.Get(), R_OK, AT_SYMLINK_NOFOLLOW);
-      AskTheVolume(info, path.Get(), reading.Value());
+      AskTheVolume(info, path.Get(), reading);
     }
     info.isPackage = info.kind == ItemKind::kFolder && IsPackage(path.Get());
     return info;
