@@ -86,7 +86,7 @@ OrbResult SetTime(const COrbFileHandle& handle,
 bool IsFolder(const COrbStringData& path) {
   COrbFileHandle handle;
   handle.Initialize(&path);
-  return handle.IsExist() && (handle.GetAttribute() & kOrbFileAttrFolder) != 0;
+  return (handle.GetAttribute() & kOrbFileAttrFolder) != 0;
 }
 
 std::string_view WithoutOneSeparator(std::string_view path) {
@@ -154,8 +154,8 @@ OrbResult COrbFileHandle::SetCatalogInfo(CFStringRef fullPath) const {
   return Keep({itemPath, Items::Current().Read(itemPath)});
 }
 
-/// A pass that fails half-way leaves what it has found up to there, and whether anything is
-/// collected, as it was.
+/// A pass that fails half-way keeps what it has found up to there. Whether anything counts as
+/// collected then stays as it was.
 OrbResult COrbFileHandle::Keep(const Pass& pass) const {
   attributes = 0;
   if (!pass.answer) return FailureCode(pass.answer.Reason());

@@ -37,7 +37,8 @@ constexpr Error kVolumeFull{ErrorDomain::kCocoa, 640};
 template <typename T>
 class [[nodiscard]] Result {
  public:
-  Result(T value) : state_(std::in_place_index<0>, std::move(value)) {}
+  Result(const T& value) : state_(std::in_place_index<0>, value) {}
+  Result(T&& value) : state_(std::in_place_index<0>, std::move(value)) {}
   Result(Error error) : state_(std::in_place_index<1>, error) {}
 
   bool Ok() const { return state_.index() == 0; }

@@ -5,6 +5,7 @@
 #include <sys/random.h>
 #include <sys/stat.h>
 #include <sys/statvfs.h>
+#include <sys/syscall.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -77,10 +78,23 @@ bool CallerMayWrite(const ItemRecord& item) {
   return MayWrite(item, ::getuid(), groups);
 }
 
-void FillRecord(ItemRecord& record,
-                const ItemRef& item,
-                const StatusRecord& status,
-                const OwnAttributes& own) {
+/// What the system tells of an item.
+struct Reading {
+  StatusRecord status;
+  OwnAttributes own;
+};
+
+/// In place: the record is large, and copies of it show in the time of a pass.
+Status ReadItem(const ItemRef& item, Reading& reading) {
+  if (Retry([&] { return item.Status(&reading.status); }) != 0) return LastError();
+  const Result<OwnAttributes> own = FindOwnAttributes(item);
+  if (!own) return own.Reason();
+  reading.own = own.Value();
+  return {};
+}
+
+void FillRecord(ItemRecord& record, const ItemRef& item, const Reading& reading) {
+  const auto& [status, own] = reading;
   record.kind = KindOf(status);
   record.locked = own.lock || HasLockFlag(status);
   record.mode = status.stx_mode & 07777;
@@ -92,11 +106,14 @@ void FillRecord(ItemRecord& record,
   record.created = CreationTime(item, status, own);
 }
 
-/// One question that settles two: who may read and write the item can read it, and its volume is
-/// writable. Special files may be written on a read-only volume.
+/// One question that settles two: who may read and write the item can read it, and neither its
+/// mount nor its file system is read-only. Special files may be written on a read-only volume. The
+/// kernel itself has to say so: where it does not know the call, the C library judges by the mode
+/// alone.
 bool IsReadableOnWritableVolume(const char* path, const ItemInfo& info) {
   if (!info.mayWrite || info.locked || info.kind == ItemKind::kOther) return false;
-  return Permits(path, R_OK | W_OK, AT_SYMLINK_NOFOLLOW);
+  constexpr int kFlags = AT_EACCESS | AT_SYMLINK_NOFOLLOW;
+  return ::syscall(SYS_faccessat2, AT_FDCWD, path, R_OK | W_OK, kFlags) == 0;
 }
 
 UniqueFd OpenItem(const char* path) {
@@ -109,10 +126,8 @@ int ReadVolume(const char* path, ItemKind kind, struct statfs* volume) {
   return link ? ItemRef(link.Get()).Volume(volume) : -1;
 }
 
-void AskTheVolume(ItemInfo& info,
-                  const char* path,
-                  const StatusRecord& status,
-                  const OwnAttributes& own) {
+void AskTheVolume(ItemInfo& info, const char* path, const Reading& reading) {
+  const auto& [status, own] = reading;
   struct statfs volume;
   if (ReadVolume(path, info.kind, &volume) != 0) {
     info.volumeReadOnly = LastError();
@@ -132,8 +147,10 @@ Result<UniqueFd> OpenUnlocked(const char* path) {
   return item;
 }
 
-Status WriteModificationTime(int item, Timestamp time) {
-  const struct timespec times[] = {{0, UTIME_OMIT}, {time.seconds, time.nanoseconds}};
+/// Both times at once: disks behind FUSE accept a change of one alone without doing it.
+Status WriteTimes(int item, Timestamp accessed, Timestamp modified) {
+  const struct timespec times[] = {{accessed.seconds, accessed.nanoseconds},
+                                   {modified.seconds, modified.nanoseconds}};
   const int result = Retry([&] { return ::utimensat(item, "", times, AT_EMPTY_PATH); });
   return result == 0 ? Status() : Status(LastError());
 }
@@ -262,14 +279,12 @@ class SystemItems final : public Items {
   Result<ItemRecord> ReadRecord(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
     const ItemRef item(path.Get());
-    const Result<StatusRecord> status = ReadStatus(item);
-    if (!status) return status.Reason();
-    const Result<OwnAttributes> own = FindOwnAttributes(item);
-    if (!own) return own.Reason();
+    Reading reading;
+    if (const Status read = ReadItem(item, reading); !read) return read.Reason();
     ItemInfo info;
-    FillRecord(info, item, status.Value(), own.Value());
-    if (MayShowReadOnlyAttribute(status.Value())) {
-      AskTheVolume(info, path.Get(), status.Value(), own.Value());
+    FillRecord(info, item, reading);
+    if (MayShowReadOnlyAttribute(reading.status)) {
+      AskTheVolume(info, path.Get(), reading);
     }
     return ItemRecord(info);
   }
@@ -277,17 +292,15 @@ class SystemItems final : public Items {
   Result<ItemInfo> Read(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
     const ItemRef item(path.Get());
-    const Result<StatusRecord> status = ReadStatus(item);
-    if (!status) return status.Reason();
-    const Result<OwnAttributes> own = FindOwnAttributes(item);
-    if (!own) return own.Reason();
+    Reading reading;
+    if (const Status read = ReadItem(item, reading); !read) return read.Reason();
     ItemInfo info;
-    FillRecord(info, item, status.Value(), own.Value());
+    FillRecord(info, item, reading);
     info.mayWrite = CallerMayWrite(info);
     info.readable = IsReadableOnWritableVolume(path.Get(), info);
     if (!info.readable) {
       info.readable = Permits(path.Get(), R_OK, AT_SYMLINK_NOFOLLOW);
-      AskTheVolume(info, path.Get(), status.Value(), own.Value());
+      AskTheVolume(info, path.Get(), reading);
     }
     info.isPackage = info.kind == ItemKind::kFolder && IsPackage(path.Get());
     return info;
@@ -314,11 +327,12 @@ class SystemItems final : public Items {
     const int fd = item.Value().Get();
     const Result<StatusRecord> before = ReadStatus(fd);
     if (!before) return before.Reason();
-    if (const Status written = WriteModificationTime(fd, time); !written) return written;
+    const Timestamp accessed = LastAccessTime(before.Value());
+    if (const Status written = WriteTimes(fd, accessed, time); !written) return written;
     const Result<StatusRecord> after = ReadStatus(fd);
     if (after && IsNear(ModificationTime(after.Value()), time)) return {};
     // The kernel takes what the volume cannot hold for the nearest that it can.
-    (void)WriteModificationTime(fd, ModificationTime(before.Value()));
+    (void)WriteTimes(fd, accessed, ModificationTime(before.Value()));
     return kNotPermitted;
   }
 

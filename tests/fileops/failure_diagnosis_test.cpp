@@ -45,14 +45,10 @@ TEST(DiagnoseFailure, TestsExistenceThenNameThenPermission) {
   const TempFolder folder;
   const std::string file = folder.Write("file", "");
   const std::string other = folder.Write("other", "");
-  const std::string umlauts = [] {
-    std::string text;
-    for (int i = 0; i < 250; ++i) text += "\xC3\xA4";  // 250 characters in 500 bytes.
-    return text;
-  }();
-  const std::string far = folder / std::string(200, 'a') + "/" + std::string(200, 'b') + "/" +
-                          std::string(200, 'c') + "/" + std::string(200, 'd') + "/" +
-                          std::string(200, 'e') + "/" + std::string(200, 'f');
+  std::string umlauts = folder / "";
+  for (int i = 0; i < 120; ++i) umlauts += "\xC3\xA4\xC3\xA4";  // 240 characters, 480 bytes.
+  std::string far = folder.Path();
+  for (int i = 0; i < 6; ++i) far += "/" + std::string(200, 'f');
   const struct {
     std::string path;
     eOrbFailedOperation operation;
@@ -72,7 +68,7 @@ TEST(DiagnoseFailure, TestsExistenceThenNameThenPermission) {
       {folder / std::string(255, 'n'), kOrbOpCreateFile, kOrbErrUnknown},
       {folder / std::string(256, 'n'), kOrbOpCreateFile, kOrbErrInvalidName},
       {folder / std::string(256, 'n') + "/", kOrbOpCreateFolder, kOrbErrInvalidName},
-      {folder / umlauts, kOrbOpCreateFile, kOrbErrUnknown},
+      {umlauts, kOrbOpCreateFile, kOrbErrUnknown},
       {far, kOrbOpCreateFile, kOrbErrNameTooLong},
       {far, kOrbOpDelete, kOrbErrNoSuchFile},
   };

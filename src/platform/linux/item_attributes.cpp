@@ -17,9 +17,10 @@
 namespace orb::platform {
 namespace {
 
-constexpr std::size_t kMaxAttribute =
-    64 * 1024;                 // The kernel's own limit of a list and of a value.
-constexpr int kSizeTries = 4;  // While somebody changes it under us.
+/// The kernel's own limit of a list and of a value.
+constexpr std::size_t kMaxAttribute = 65'536;
+/// While somebody changes it under us.
+constexpr int kSizeTries = 4;
 
 bool IsUserAttribute(std::string_view name) {
   if (name == kLockAttribute || name == kCreatedAttribute) return false;  // Carried by meaning.
@@ -54,17 +55,19 @@ Status UnlessRefused() { return IsRefusal(errno) ? Status() : Status(LastError()
 /// for more than an attribute can hold.
 template <typename Read>
 Result<std::optional<std::string>> ReadSized(Read read) {
+  // Named: g++ 12 warns of a temporary without a value.
+  const std::optional<std::string> nothing;
   std::string value;
   for (int i = 0; i < kSizeTries; ++i) {
     const ssize_t size = read(nullptr, 0);
     if (size < 0) break;
-    if (static_cast<std::size_t>(size) > kMaxAttribute) return std::optional<std::string>();
+    if (static_cast<std::size_t>(size) > kMaxAttribute) return nothing;
     value.resize(static_cast<std::size_t>(size));
     const ssize_t count = size == 0 ? 0 : read(value.data(), value.size());
     if (count >= 0) return std::optional(value.substr(0, static_cast<std::size_t>(count)));
     if (errno != ERANGE) break;
   }
-  if (IsRefusal(errno)) return std::optional<std::string>();
+  if (IsRefusal(errno)) return nothing;
   return LastError();
 }
 

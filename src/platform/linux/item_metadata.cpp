@@ -13,7 +13,6 @@
 #include <charconv>
 #include <string>
 #include <string_view>
-#include <vector>
 
 #include "platform/linux/posix.h"
 
@@ -23,8 +22,6 @@ namespace {
 
 constexpr unsigned kWriteBits = S_IWUSR | S_IWGRP | S_IWOTH;
 constexpr unsigned kPermissionBits = 07777;
-/// The kernel's own limit of a list of attribute names.
-constexpr std::size_t kLongestList = 65536;
 constexpr std::size_t kLongestTime = 64;
 constexpr unsigned kStatusFields = STATX_BASIC_STATS | STATX_BTIME;
 constexpr __u64 kLockFlags = STATX_ATTR_IMMUTABLE | STATX_ATTR_APPEND;
@@ -56,6 +53,12 @@ OwnAttributes ScanNames(std::string_view names) {
     names.remove_prefix(std::min(names.size(), name.size() + 1));
   }
   return own;
+}
+
+/// For an item with many attributes: the kernel refuses to list more than 64 KiB of names.
+OwnAttributes AskForEach(const ItemRef& item) {
+  const auto has = [&](const char* name) { return item.GetAttribute(name, nullptr, 0) >= 0; };
+  return {.lock = has(kLockAttribute), .created = has(kCreatedAttribute)};
 }
 
 /// A volume without attributes, or one that will not list them, has none of ours to show.
@@ -256,11 +259,7 @@ Result<OwnAttributes> FindOwnAttributes(const ItemRef& item) {
   std::array<char, 256> names;
   const ssize_t size = item.ListAttributes(names.data(), names.size());
   if (size >= 0) return ScanNames({names.data(), static_cast<std::size_t>(size)});
-  if (errno != ERANGE) return WithoutNames();
-  std::vector<char> more(kLongestList);
-  const ssize_t moreSize = item.ListAttributes(more.data(), more.size());
-  if (moreSize < 0) return WithoutNames();
-  return ScanNames({more.data(), static_cast<std::size_t>(moreSize)});
+  return errno == ERANGE ? AskForEach(item) : WithoutNames();
 }
 
 bool HasLockFlag(const StatusRecord& status) { return (status.stx_attributes & kLockFlags) != 0; }
