@@ -8,6 +8,8 @@
 #include <cstdint>
 #include <cstdlib>
 
+#include "platform/errno_keeper.h"
+
 // Two steps, so that a name is spelled out after ICU's headers have added its version.
 #define ORB_SPELLED(name) #name
 #define ORB_SPELL(name) ORB_SPELLED(name)
@@ -38,6 +40,7 @@ void Find(void* library, const char* name, Function& function) {
 }
 
 IcuFunctions Load() {
+  const ErrnoKeeper errnoKeeper;
   void* library =
       ::dlopen(ORB_ICU_LIBRARY, RTLD_NOW | RTLD_LOCAL);  // Stays until the process ends.
   if (library == nullptr) std::abort();
