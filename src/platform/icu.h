@@ -22,7 +22,7 @@ namespace orb::platform {
 
 /// The functions of ICU that the library uses, under ICU's names.
 struct IcuFunctions {
-#define ORB_ICU_MEMBER(name) decltype(&::name) name;
+#define ORB_ICU_MEMBER(name) decltype(&::name) name;  // NOLINT(bugprone-macro-parentheses): a name.
   ORB_ICU_FUNCTIONS(ORB_ICU_MEMBER)
 #undef ORB_ICU_MEMBER
 };

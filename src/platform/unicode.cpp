@@ -61,8 +61,8 @@ void AppendFolded(std::u16string& out, char32_t c) {
   std::u16string self;
   Append(self, c);
   UErrorCode status = U_ZERO_ERROR;
-  const std::int32_t length =
-      Icu().u_strFoldCase(units.data(), kLongest, self.data(), Size(self), U_FOLD_CASE_DEFAULT, &status);
+  const std::int32_t length = Icu().u_strFoldCase(
+      units.data(), kLongest, self.data(), Size(self), U_FOLD_CASE_DEFAULT, &status);
   if (U_FAILURE(status)) return Append(out, c);
   out.append(units.data(), static_cast<std::size_t>(length));
 }
@@ -161,7 +161,7 @@ CharForm LookUp(Form form, char32_t c) {
   const CharPage* none = nullptr;
   auto& slot = charPages[static_cast<std::size_t>(form)][c >> 8];
   if (slot.compare_exchange_strong(none, page.get(), std::memory_order_acq_rel)) {
-    page.release();  // Kept until the process ends; others may be reading it.
+    static_cast<void>(page.release());  // Kept until the process ends; others may be reading it.
   }
   return found;
 }
