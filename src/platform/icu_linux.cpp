@@ -10,6 +10,8 @@
 #include <cstdint>
 #include <mutex>
 
+#include "platform/errno_keeper.h"
+
 // Two steps, so that a name is spelled out after ICU's headers have added its version.
 #define ORB_SPELLED(name) #name
 #define ORB_SPELL(name) ORB_SPELLED(name)
@@ -41,6 +43,7 @@ bool Find(void* library, const char* name, Function& function) {
 
 const IcuFunctions* Load() {
   static constinit IcuFunctions found{};
+  const ErrnoKeeper errnoKeeper;
   void* library = ::dlopen(ORB_ICU_LIBRARY, RTLD_NOW | RTLD_LOCAL);
   if (library == nullptr) return nullptr;  // Otherwise it stays until the process ends.
   bool all = true;

@@ -48,6 +48,8 @@ Utf8Text ReadOnly(const COrbStringData& s, COrbStringData& copy) {
 COrbStringData Cut(const COrbStringData& s, std::size_t start, std::size_t count) {
   const Utf8Text text = StringAccess::Read(s);
   if (text.scan.kind == TextKind::kAscii) {
+    // Without memory for the UTF-8 copy there is less of it than the string's length says.
+    start = std::min(start, text.bytes.size());
     return StringAccess::FromUtf8(text.bytes.substr(start, count));
   }
   return StringAccess::FromUtf8(orb::Middle(text.Readable(), start, count));

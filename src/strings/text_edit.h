@@ -49,6 +49,7 @@ class Replaced {
 class Pieces {
  public:
   Pieces(const Utf8Text& text, const Utf8Text& separator);
+  ~Pieces() = default;
   Pieces(const Pieces&) = delete;
   Pieces& operator=(const Pieces&) = delete;
   ~Pieces() = default;

@@ -10,11 +10,15 @@
 #include <memory>
 #include <string>
 
+#include "platform/errno_keeper.h"
 #include "strings/text_utf8.h"
 
 namespace {
 
+using orb::platform::ErrnoKeeper;
+
 COrbStringData Formatted(const char* format, std::va_list arguments) {
+  const ErrnoKeeper errnoKeeper;
   char* text = nullptr;
   if (::vasprintf(&text, format, arguments) < 0) return {};
   COrbStringData result;
@@ -38,11 +42,13 @@ constexpr std::size_t kWideLimit = 2048;
 }  // namespace
 
 int OrbStringDataToNumber(const OrbCharPlatform& text) {
+  const ErrnoKeeper errnoKeeper;
   const char* digits = text;
   return digits == nullptr ? 0 : std::atoi(digits);
 }
 
 double OrbStringDataToFloat(const OrbCharPlatform& text) {
+  const ErrnoKeeper errnoKeeper;
   const char* digits = text;
   return digits == nullptr ? 0 : std::atof(digits);
 }
@@ -67,6 +73,7 @@ COrbStringData OrbStringDataFormat(const OrbCharPlatform* format, ...) {
 
 COrbStringData OrbStringDataFormatW(const OrbCharUnicode* format, ...) {
   if (format == nullptr || static_cast<const wchar_t*>(*format) == nullptr) return {};
+  const ErrnoKeeper errnoKeeper;
   const auto buffer = std::make_unique<wchar_t[]>(kWideLimit);
   std::va_list arguments;
   va_start(arguments, format);

@@ -228,6 +228,7 @@ class EquivalenceSearch {
  public:
   /// The needle must not be empty.
   EquivalenceSearch(std::string_view needle, platform::Form form);
+  ~EquivalenceSearch() = default;
   EquivalenceSearch(const EquivalenceSearch&) = delete;
   EquivalenceSearch& operator=(const EquivalenceSearch&) = delete;
   ~EquivalenceSearch() = default;

@@ -2,6 +2,9 @@
 #include <gtest/gtest.h>
 #include <orb/strings/string_functions.h>
 
+#include <cerrno>
+#include <cmath>
+#include <cstring>
 #include <string>
 #include <vector>
 
@@ -225,6 +228,16 @@ TEST(Formatting, GivesNoValueWhereItFails) {
   EXPECT_EQ(Shown(OrbStringDataFormat(static_cast<const OrbCharPlatform*>(nullptr))), kNone);
   const OrbCharPlatform null(static_cast<const char*>(nullptr));
   EXPECT_EQ(Shown(OrbStringDataFormat(&null)), kNone);
+}
+
+TEST(Formatting, ReadsErrnoAndLeavesIt) {
+  const OrbCharPlatform number("%m");
+  const OrbCharPlatform wide("%ls");
+  errno = EBUSY;
+  EXPECT_EQ(OrbStringDataToFloat("1e999"), HUGE_VAL);         // ERANGE
+  EXPECT_TRUE(HasNoValue(OrbStringDataFormat(&wide, L"é")));  // EILSEQ
+  EXPECT_EQ(Text(OrbStringDataFormat(&number)), std::strerror(EBUSY));
+  EXPECT_EQ(errno, EBUSY);
 }
 
 TEST(Formatting, OfWideTextIsBounded) {

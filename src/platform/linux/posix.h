@@ -6,6 +6,7 @@
 #include <cerrno>
 #include <utility>
 
+#include "platform/errno_keeper.h"
 #include "platform/error.h"
 
 namespace orb::platform {
@@ -24,18 +25,6 @@ auto Retry(Call call) {
   while (result == -1 && errno == EINTR) result = call();
   return result;
 }
-
-/// Gives the host program its errno back.
-class ErrnoKeeper {
- public:
-  ErrnoKeeper() : kept_(errno) {}
-  ~ErrnoKeeper() { errno = kept_; }
-  ErrnoKeeper(const ErrnoKeeper&) = delete;
-  ErrnoKeeper& operator=(const ErrnoKeeper&) = delete;
-
- private:
-  int kept_;
-};
 
 /// Owns a descriptor and closes it once.
 class UniqueFd {
