@@ -52,7 +52,6 @@ class Pieces {
   ~Pieces() = default;
   Pieces(const Pieces&) = delete;
   Pieces& operator=(const Pieces&) = delete;
-  ~Pieces() = default;
 
   const std::vector<std::string_view>& Views() const { return views_; }
 

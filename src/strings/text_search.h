@@ -231,7 +231,6 @@ class EquivalenceSearch {
   ~EquivalenceSearch() = default;
   EquivalenceSearch(const EquivalenceSearch&) = delete;
   EquivalenceSearch& operator=(const EquivalenceSearch&) = delete;
-  ~EquivalenceSearch() = default;
 
   /// The first match, or kNotFound.
   std::size_t Find(std::string_view text);
