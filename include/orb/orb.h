@@ -7,12 +7,16 @@
 #include <orb/export.h>
 #include <orb/fileinfo/drive_type.h>
 #include <orb/fileinfo/file_handle.h>
+#include <orb/fileops/access.h>
 #include <orb/fileops/copy.h>
 #include <orb/fileops/create.h>
 #include <orb/fileops/path_relations.h>
 #include <orb/fileops/progress.h>
 #include <orb/fileops/remove.h>
+#include <orb/fileops/rename.h>
+#include <orb/fileops/temp_files.h>
 #include <orb/fileops/trash.h>
+#include <orb/fileops/whole_file.h>
 #include <orb/path/file_path.h>
 #include <orb/path/file_type.h>
 #include <orb/path/path_text.h>

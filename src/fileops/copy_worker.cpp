@@ -7,15 +7,7 @@
 #include "platform/copier.h"
 
 namespace orb {
-namespace {
-
-OrbResult CodeOf(const platform::Status& status) {
-  if (status.Ok()) return kOrbNoErr;
-  const OrbResult code = OrbMapErrorForFileOperation(status.Reason());
-  return code == kOrbNoErr ? kOrbErrAccessDenied : code;  // Failed without an error object.
-}
-
-}  // namespace
+namespace {}  // namespace
 
 OrbCopyPath::OrbCopyPath(std::string source, std::string destination)
     : source_(std::move(source)), destination_(std::move(destination)) {}
@@ -27,7 +19,7 @@ void OrbCopyPath::SetProgress(OrbProgressProc progress, void* data) {
 
 OrbResult OrbCopyPath::Perform() const {
   if (copyProgress_ != nullptr && !copyProgress_(progressData_)) return kOrbErrCanceled;
-  const OrbResult result = CodeOf(platform::CopyItem(source_, destination_));
+  const OrbResult result = FileOperationResult(platform::CopyItem(source_, destination_));
   if (copyProgress_ != nullptr) (void)copyProgress_(progressData_);
   return result;
 }

@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "fileinfo/item_path.h"
-#include "fileops/error_mapping.h"
+#include "fileops/creation_result.h"
 #include "fileops/failure_diagnosis.h"
 #include "fileops/numbered_name.h"
 #include "fileops/path_in.h"
@@ -21,19 +21,6 @@ using platform::Items;
 
 /// So many names are tried one by one before the folder is listed: mostly one is free.
 constexpr std::uint32_t kProbes = 4;
-
-OrbResult Deliver(const std::string& path, COrbFilePath* result) {
-  const COrbStringData text = StringAccess::FromUtf8(path);
-  (void)result->Initialize(&text);
-  return kOrbNoErr;
-}
-
-/// What the diagnosis sees comes first; the system's own error speaks where it sees nothing.
-OrbResult DiagnoseCreation(const platform::Status& failed, const std::string& path) {
-  const COrbStringData text = StringAccess::FromUtf8(path);
-  const OrbResult code = OrbDiagnoseFailure(std::nullopt, text, nullptr, kOrbOpCreateFile);
-  return code == kOrbErrUnknown ? OrbMapError(failed.Reason()) : code;
-}
 
 TakenNumbers ReadTakenNumbers(const std::string& folder, const NumberedName& names) {
   std::vector<std::uint32_t> numbers;

@@ -5,9 +5,12 @@
 #include <chrono>
 #include <string>
 #include <thread>
+#include <vector>
 
 #include "fileinfo/item_path.h"
+#include "fileops/error_mapping.h"
 #include "fileops/failure_diagnosis.h"
+#include "fileops/path_in.h"
 #include "platform/items.h"
 #include "platform/removal.h"
 #include "strings/string_access.h"
@@ -47,6 +50,14 @@ OrbResult RemoveOrWait(const std::string& path) {
   return platform::UnlinkItem(path) ? kOrbNoErr : WaitUntilRemoved(path);
 }
 
+template <typename Remove>
+OrbResult RemoveInOrder(const std::vector<COrbFilePath>& paths, Remove remove) {
+  for (const COrbFilePath& path : paths) {
+    if (const OrbResult result = remove(path); Failed(result)) return result;
+  }
+  return kOrbNoErr;
+}
+
 }  // namespace
 }  // namespace orb
 
@@ -57,4 +68,19 @@ OrbResult OrbDeleteFile(const COrbFilePath& path) {
   if ((attributes & kDecisive) != kOrbFileAttrWritable) return kOrbErrAccessDenied;
   const auto item = orb::ItemPath(path.GetFullPath());
   return item ? orb::RemoveOrWait(*item) : kOrbErrNoSuchFile;
+}
+
+OrbResult OrbDeleteFile(const std::vector<COrbFilePath>& paths, bool) {
+  return orb::RemoveInOrder(paths, [](const auto& path) { return OrbDeleteFile(path); });
+}
+
+OrbResult OrbRemoveFileRecursive(const COrbFilePath& path) {
+  const auto item = orb::ItemPath(path.GetFullPath());
+  return item ? orb::FileOperationResult(orb::platform::RemoveItem(*item)) : kOrbErrNotFound;
+}
+
+OrbResult OrbDeleteFolder(const COrbFilePath& path) { return OrbRemoveFileRecursive(path); }
+
+OrbResult OrbDeleteFolder(const std::vector<COrbFilePath>& paths, bool) {
+  return orb::RemoveInOrder(paths, OrbRemoveFileRecursive);
 }

@@ -68,4 +68,10 @@ OrbResult OrbMapErrorForFileOperation(const ErrorObject& error) {
   return IsNull(error) ? kOrbNoErr : Find(kCommonRows, *error);
 }
 
+OrbResult FileOperationResult(const platform::Status& status) {
+  if (status) return kOrbNoErr;
+  const OrbResult code = OrbMapErrorForFileOperation(status.Reason());
+  return code == kOrbNoErr ? kOrbErrAccessDenied : code;
+}
+
 }  // namespace orb

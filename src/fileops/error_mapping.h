@@ -19,4 +19,7 @@ OrbResult OrbMapError(const ErrorObject& error);
 /// The same for copy, move and removal, which know fewer codes.
 OrbResult OrbMapErrorForFileOperation(const ErrorObject& error);
 
+/// The result of a copy, move or removal. One that failed without an error object was denied.
+OrbResult FileOperationResult(const platform::Status& status);
+
 }  // namespace orb

@@ -124,12 +124,6 @@ void AskTheVolume(ItemInfo& info,
 
 // --- Changes
 
-Status RefuseLocked(int item) {
-  const Result<bool> locked = IsLocked(item);
-  if (!locked) return locked.Reason();
-  return locked.Value() ? Status(kNotPermitted) : Status();
-}
-
 /// Opens an item for a change of what a lock protects.
 Result<UniqueFd> OpenUnlocked(const char* path) {
   UniqueFd item = OpenItem(path);

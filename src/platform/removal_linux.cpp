@@ -13,7 +13,7 @@
 
 #include "platform/linux/folder_stream.h"
 #include "platform/linux/item_metadata.h"
-#include "platform/linux/place.h"
+#include "platform/linux/removal_at.h"
 
 namespace orb::platform {
 namespace {
@@ -24,26 +24,13 @@ constexpr std::size_t kOpenLevels = 32;
 /// again, before it counts as one that somebody else is filling.
 constexpr int kMaxPasses = 32;
 
-Status RefuseLocked(int item) {
-  const auto locked = IsLocked(item);
-  if (!locked) return locked.Reason();
-  return locked.Value() ? Status(kNotPermitted) : Status();
-}
-
-/// The kernel itself refuses to remove what has the immutable or the append-only flag. Where the
-/// attribute is not simply missing, all is looked at.
+/// The kernel itself refuses to remove or rename what has the immutable or the append-only flag.
+/// Where the attribute is not simply missing, all is looked at.
 bool HasNoLockAttribute(int folder, const char* name) {
   char path[sizeof "/proc/self/fd/" + 12 + NAME_MAX + 1];
   const int length = std::snprintf(path, sizeof path, "/proc/self/fd/%d/%s", folder, name);
   if (length < 0 || static_cast<std::size_t>(length) >= sizeof path) return false;
   return ::lgetxattr(path, kLockAttribute, nullptr, 0) < 0 && errno == ENODATA;
-}
-
-Status RefuseLockedEntry(int folder, const char* name) {
-  if (HasNoLockAttribute(folder, name)) return {};
-  const UniqueFd item(
-      Retry([&] { return ::openat(folder, name, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
-  return item ? RefuseLocked(item.Get()) : Status(LastError());
 }
 
 enum class Outcome { kGone, kNotEmpty };
@@ -151,6 +138,15 @@ class TreeRemover {
   std::vector<Level> levels_;
 };
 
+}  // namespace
+
+Status RefuseLockedEntry(int folder, const char* name) {
+  if (HasNoLockAttribute(folder, name)) return {};
+  const UniqueFd item(
+      Retry([&] { return ::openat(folder, name, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
+  return item ? RefuseLocked(item.Get()) : Status(LastError());
+}
+
 Result<Place> LocateRemovable(const std::string& path) {
   auto place = Locate(path);
   if (!place) return place;
@@ -161,17 +157,17 @@ Result<Place> LocateRemovable(const std::string& path) {
   return place;
 }
 
-}  // namespace
+Status RemoveItemAt(int folder, const std::string& name) {
+  const auto outcome = RemoveEntry(folder, name.c_str(), DT_UNKNOWN);
+  if (!outcome) return outcome.Reason();
+  return outcome.Value() == Outcome::kGone ? Status() : TreeRemover(folder).Remove(name);
+}
 
 Status RemoveItem(const std::string& path) {
   const ErrnoKeeper errnoKeeper;
   const auto place = LocateRemovable(path);
   if (!place) return place.Reason();
-  const int folder = place.Value().folder.Get();
-  const std::string& name = place.Value().name;
-  const auto outcome = RemoveEntry(folder, name.c_str(), DT_UNKNOWN);
-  if (!outcome) return outcome.Reason();
-  return outcome.Value() == Outcome::kGone ? Status() : TreeRemover(folder).Remove(name);
+  return RemoveItemAt(place.Value().folder.Get(), place.Value().name);
 }
 
 Status UnlinkItem(const std::string& path) {

@@ -16,12 +16,6 @@ namespace {
 
 constexpr mode_t kUsualMode = 0666;
 
-Status RefuseLocked(int item) {
-  const auto locked = IsLocked(item);
-  if (!locked) return locked.Reason();
-  return locked.Value() ? Status(kNotPermitted) : Status();
-}
-
 /// kNoSuchItem where nothing is.
 Result<UniqueFd> OpenExisting(const Place& place) {
   constexpr int kFlags = O_WRONLY | O_APPEND | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;

@@ -7,6 +7,7 @@
 #include <filesystem>
 #include <string>
 #include <thread>
+#include <vector>
 
 #include "support/faults.h"
 #include "support/paths.h"
@@ -74,6 +75,52 @@ TEST(DeleteFile, WaitsForABusyFileButNotForever) {
     freer.join();
   }));
   EXPECT_FALSE(fs::exists(busy));
+}
+
+TEST(DeleteFile, EndsAListAtTheFirstFailure) {
+  const TempFolder folder;
+  const auto paths = [&](const char* first, const char* second, const char* third) {
+    return std::vector{PathOf(folder / first), PathOf(folder / second), PathOf(folder / third)};
+  };
+  for (const char* name : {"a", "locked", "b"}) folder.Write(name, "");
+  for (const char* name : {"x/sub", "busy/sub", "y/sub"}) fs::create_directories(folder / name);
+  ASSERT_EQ(COrbFileHandle(PathOf(folder / "locked")).SetAttribute(kOrbFileAttrLocked), 0u);
+  EXPECT_EQ(OrbDeleteFile({}, true), kOrbNoErr);
+  EXPECT_EQ(OrbDeleteFolder({}, false), kOrbNoErr);
+  EXPECT_EQ(OrbDeleteFile(paths("a", "locked", "b"), true), kOrbErrAccessDenied);
+  EXPECT_EQ(OrbDeleteFile({PathOf(folder / "b")}, false), kOrbNoErr);
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(orb::test::BindMount(folder / "busy/sub", folder / "busy"));
+    EXPECT_EQ(OrbDeleteFolder(paths("x", "busy", "y"), true), kOrbErrAccessDenied);
+  }));
+  EXPECT_FALSE(fs::exists(folder / "a") || fs::exists(folder / "b") || fs::exists(folder / "x"));
+  EXPECT_TRUE(fs::exists(folder / "locked") && fs::exists(folder / "y/sub"));
+}
+
+TEST(DeleteFolder, AsksNothingAndSaysWhatThePlatformSaid) {
+  const TempFolder folder;
+  fs::create_directories(folder / "tree/sub");
+  folder.Write("read-only", "");
+  fs::permissions(folder / "read-only", fs::perms(0444));
+  folder.Write("locked", "");
+  ASSERT_EQ(COrbFileHandle(PathOf(folder / "locked")).SetAttribute(kOrbFileAttrLocked), 0u);
+  const struct {
+    std::string path;
+    OrbResult expected;
+  } kCases[] = {
+      {"", kOrbErrNotFound},
+      {folder / "missing", kOrbErrNotFound},
+      {folder / "\xff", kOrbErrNotFound},
+      {folder / "locked", kOrbErrAccessDenied},
+      {folder / "tree/.", kOrbErrAccessDenied},
+      {folder / std::string(256, 'n'), kOrbErrUnknown},
+      {folder / "tree", kOrbNoErr},
+      {folder / "read-only", kOrbNoErr},
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.path);
+    EXPECT_EQ(OrbDeleteFolder(PathOf(c.path)), c.expected);
+  }
 }
 
 }  // namespace

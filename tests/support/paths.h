@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #pragma once
 
+#include <orb/fileinfo/file_handle.h>
 #include <orb/path/file_path.h>
 
 #include <string>
@@ -12,4 +13,9 @@ inline COrbFilePath PathOf(const std::string& utf8) {
   COrbFilePath path;
   path.Initialize(&text);
   return path;
+}
+
+/// Whether the item could be locked.
+inline bool Lock(const std::string& utf8) {
+  return COrbFileHandle(PathOf(utf8)).SetAttribute(kOrbFileAttrLocked) == kOrbNoErr;
 }

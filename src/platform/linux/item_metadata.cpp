@@ -295,6 +295,12 @@ Result<bool> IsLocked(const ItemRef& item) {
   return ShowsReadOnlyAttribute(item, status.Value(), own.Value());
 }
 
+Status RefuseLocked(const ItemRef& item) {
+  const Result<bool> locked = IsLocked(item);
+  if (!locked) return locked.Reason();
+  return locked.Value() ? Status(kNotPermitted) : Status();
+}
+
 Status SetLocked(int item, bool locked) {
   const Result<bool> before = IsLocked(item);
   if (!before) return before.Reason();

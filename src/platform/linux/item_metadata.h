@@ -68,6 +68,8 @@ bool HasReadOnlyAttribute(const struct statfs& volume,
 
 /// Whether the item is locked in any form: the attribute, the flags, the read-only attribute.
 Result<bool> IsLocked(const ItemRef& item);
+/// kNotPermitted for a locked item: before whatever a lock forbids.
+Status RefuseLocked(const ItemRef& item);
 /// kNotPermitted when the volume cannot carry the lock or the caller may not change it. The owner
 /// needs no write permission. Unlocking clears every form or fails.
 Status SetLocked(int item, bool locked);

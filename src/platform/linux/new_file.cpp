@@ -4,10 +4,11 @@
 #include <fcntl.h>
 #include <stdio.h>
 #include <sys/random.h>
-#include <sys/stat.h>
 
 #include <cstdint>
 #include <utility>
+
+#include "platform/linux/rename.h"
 
 namespace orb::platform {
 namespace {
@@ -34,30 +35,12 @@ UniqueFd OpenExclusively(int folder, const std::string& name, mode_t mode) {
 }
 
 /// By descriptor, which older kernels allow only to the privileged, else through /proc.
-bool LinkNameless(int file, int folder, const char* name) {
-  if (::linkat(file, "", folder, name, AT_EMPTY_PATH) == 0) return true;
-  if (errno == EEXIST) return false;
+Status LinkNameless(int file, int folder, const char* name) {
+  if (::linkat(file, "", folder, name, AT_EMPTY_PATH) == 0) return {};
+  if (errno == EEXIST) return kItemExists;
   const std::string path = "/proc/self/fd/" + std::to_string(file);
-  return ::linkat(AT_FDCWD, path.c_str(), folder, name, AT_SYMLINK_FOLLOW) == 0;
-}
-
-bool IsFree(int folder, const char* name) {
-  struct stat ignored;
-  if (::fstatat(folder, name, &ignored, AT_SYMLINK_NOFOLLOW) != 0) return errno == ENOENT;
-  errno = EEXIST;
-  return false;
-}
-
-/// A file system that knows neither renaming without replacing nor links leaves the test before.
-bool RenameWithoutReplacing(int folder, const char* from, const char* to) {
-  if (::renameat2(folder, from, folder, to, RENAME_NOREPLACE) == 0) return true;
-  if (errno == EEXIST) return false;
-  if (::linkat(folder, from, folder, to, 0) == 0) {
-    ::unlinkat(folder, from, 0);
-    return true;
-  }
-  if (errno == EEXIST) return false;
-  return IsFree(folder, to) && ::renameat(folder, from, folder, to) == 0;
+  const int linked = ::linkat(AT_FDCWD, path.c_str(), folder, name, AT_SYMLINK_FOLLOW);
+  return linked == 0 ? Status() : Status(LastError());
 }
 
 }  // namespace
@@ -87,12 +70,11 @@ NewFile::~NewFile() {
 
 Status NewFile::Publish(const char* name) {
   if (Status flushed = Flush(file_.Get()); !flushed) return flushed;
-  const bool published = hiddenName_.empty()
-                             ? LinkNameless(file_.Get(), folder_, name)
-                             : RenameWithoutReplacing(folder_, hiddenName_.c_str(), name);
-  if (!published) return LastError();
-  hiddenName_.clear();
-  return {};
+  const Status published =
+      hiddenName_.empty() ? LinkNameless(file_.Get(), folder_, name)
+                          : RenameWithoutReplacing(folder_, hiddenName_.c_str(), folder_, name);
+  if (published) hiddenName_.clear();
+  return published;
 }
 
 }  // namespace orb::platform
