@@ -125,12 +125,6 @@ struct Item {
   bool IsFolder() const { return S_ISDIR(status.stx_mode); }
 };
 
-Status RefuseLocked(const ItemRef& item) {
-  const Result<bool> locked = IsLocked(item);
-  if (!locked) return locked.Reason();
-  return locked.Value() ? Status(kNotPermitted) : Status();
-}
-
 Result<Parent> OpenParent(const std::string& path) {
   Result<Place> place = Locate(path);
   if (!place) return place.Reason();
