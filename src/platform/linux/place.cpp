@@ -36,7 +36,9 @@ Result<Place> Locate(const std::string& path) {
 
 Result<struct stat> ReadStatus(const Place& place) {
   struct stat status;
-  if (::fstatat(place.folder.Get(), place.name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0)
+  const int folder = place.folder.Get();
+  const char* name = place.name.c_str();
+  if (Retry([&] { return ::fstatat(folder, name, &status, AT_SYMLINK_NOFOLLOW); }) != 0)
     return LastError();
   if (place.folderMeant && !S_ISDIR(status.st_mode)) return kNoSuchItem;
   return status;
