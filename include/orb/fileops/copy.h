@@ -48,7 +48,7 @@ ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
 /// a failure stays.
 ///
 /// In this order: kOrbErrNotFound for a source that is empty or not there; kOrbErrAccessDenied for
-/// one that can neither be read nor written, a link that leads nowhere among them;
+/// one that cannot be read, a link that leads nowhere among them, and for a socket, pipe or device;
 /// kOrbErrInvalidName for a name that is empty, "." or ".."; kOrbErrEmptyPath for an empty folder;
 /// kOrbErrInsideSource when the destination is the source or one of its folders, by its text or on
 /// disk, and kOrbErrAccessDenied when it cannot be removed. Up to here nothing has changed, but a
