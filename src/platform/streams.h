@@ -36,7 +36,8 @@ class InputStream {
 class OutputStream {
  public:
   /// A link at the path is not written through: kNotPermitted, as for a locked file, for a new file
-  /// in a locked folder, and for what is not a regular file.
+  /// in a locked folder, and for what is not a regular file. kInvalidName for a path that ends in
+  /// "/".
   static Result<OutputStream> Append(const std::string& path);
 
   OutputStream(OutputStream&&) noexcept;
@@ -48,6 +49,9 @@ class OutputStream {
   Status Write(std::span<const std::byte> block);
   /// kItemExists when somebody else made the file meanwhile.
   Status Finish();
+  /// Takes everything back now. Whether the path still leads to the file that was there before:
+  /// false when there was none, or somebody has put another in its place.
+  bool Undo();
 
  private:
   struct State;

@@ -79,14 +79,22 @@ struct OutputStream::State {
     return {};
   }
 
-  void TakeBack() const {
+  bool IsAtItsPath() const {
+    const auto now = ReadStatus(place);
+    return existing && now && IdentityOf(now.Value()) == IdentityOf(before);
+  }
+
+  void TakeBack() {
     const timespec times[2] = {before.st_atim, before.st_mtim};
-    if (Retry([&] { return ::ftruncate(existing.Get(), before.st_size); }) == 0)
+    if (existing && Retry([&] { return ::ftruncate(existing.Get(), before.st_size); }) == 0)
       (void)::futimens(existing.Get(), times);
+    existing.Reset();
+    made.reset();
   }
 
   ~State() {
-    if (existing) TakeBack();
+    const ErrnoKeeper errnoKeeper;
+    TakeBack();
   }
 };
 
@@ -98,6 +106,7 @@ Result<OutputStream> OutputStream::Append(const std::string& path) {
   const ErrnoKeeper errnoKeeper;
   auto place = Locate(path);
   if (!place) return place.Reason();
+  if (place.Value().folderMeant) return kInvalidName;
   auto state = std::make_unique<State>();
   state->place = std::move(place).Value();
   auto file = OpenExisting(state->place);
@@ -122,6 +131,13 @@ Status OutputStream::Finish() {
   if (Status flushed = Flush(state_->existing.Get()); !flushed) return flushed;
   state_->existing.Reset();
   return {};
+}
+
+bool OutputStream::Undo() {
+  const ErrnoKeeper errnoKeeper;
+  const bool isAtItsPath = state_->IsAtItsPath();
+  state_->TakeBack();
+  return isAtItsPath;
 }
 
 }  // namespace orb::platform

@@ -247,7 +247,6 @@ TEST(CopyFileEx, LeavesTheDestinationAsItWasWhenItDoesNotSucceed) {
     OrbResult expected;
   } kCases[] = {
       {"source", "new", 1, kOrbErrCanceled},
-      {"source", "old", 3, kOrbErrCanceled},
       {"old", "old", 0, kOrbErrSamePath},
       {"old", "hard", 0, kOrbErrSamePath},
       {"link", "old", 0, kOrbErrSamePath},
@@ -256,6 +255,7 @@ TEST(CopyFileEx, LeavesTheDestinationAsItWasWhenItDoesNotSucceed) {
       {"source", "locked", 0, kOrbErrUnknown},
       {"source", "missing/new", 0, kOrbErrNotFound},
       {"source", "\xff", 0, kOrbErrInvalidName},
+      {"source", "old/", 0, kOrbErrInvalidName},
       {"locked", "new", 0, kOrbErrUnknown},  // A folder cannot be read.
       {"missing", "new", 0, kOrbNoErr},
       {"missing", "old", 0, kOrbNoErr},
@@ -277,6 +277,33 @@ TEST(CopyFileEx, LeavesTheDestinationAsItWasWhenItDoesNotSucceed) {
   std::string wide;
   for (int i = 0; i < 100; ++i) wide += "\xe3\x81\x82";
   EXPECT_EQ(Append(folder / "source", folder.Path(), wide), kOrbErrInvalidName);
+}
+
+TEST(CopyFileEx, LeavesNoDestinationWhenCanceledButWhatSomebodyElsePutThere) {
+  const TempFolder folder;
+  folder.Write("source", std::string(200000, 's'));
+  folder.Write("old", "0123456789");
+  fs::create_hard_link(folder / "old", folder / "hard");
+  Progress progress{3};
+  EXPECT_EQ(Append(folder / "source", folder.Path(), "old", &progress), kOrbErrCanceled);
+  EXPECT_FALSE(fs::exists(folder / "old"));
+  EXPECT_EQ(ReadAll(folder / "hard"), "0123456789");
+  static const std::string photo = folder / "photo";
+  for (const char* reserved : {"", "photo"}) {
+    if (*reserved != '\0') folder.Write(reserved, "");
+    const auto replaceAndCancel = [](void*) {
+      fs::remove(photo);
+      std::ofstream(photo) << "theirs";
+      return false;
+    };
+    EXPECT_EQ(OrbCopyFileEx(PathOf(folder / "source"),
+                            PathOf(folder.Path()),
+                            S("photo"),
+                            replaceAndCancel,
+                            nullptr),
+              kOrbErrCanceled);
+    EXPECT_EQ(ReadAll(photo), "theirs");
+  }
 }
 
 TEST(CopyFileEx, TakesBackWhatAFullVolumeOrAStrangersFileLeft) {

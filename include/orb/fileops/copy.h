@@ -23,11 +23,13 @@ ORB_EXPORT OrbResult OrbMakeFilePath(const COrbFilePath& folder,
 
 /// Copies a file's bytes in pieces of 64 KiB to the end of the file `name` in `folder`, which is
 /// made when it is not there. Times, mode and attributes do not go along. `progress` is called
-/// after each piece that was written. When the copy fails or is cancelled, what it wrote is taken
-/// away again: an older file has its former length and times, and a new one is not there, because
-/// it gets its name when it is complete. While an older file grows, a process that is killed leaves
-/// it longer than it was. A source that is a link is read through it; a destination that is a link,
-/// is locked or is no regular file is refused with kOrbErrAccessDenied.
+/// after each piece that was written. When the copy fails, what it wrote is taken away again: an
+/// older file has its former length and times, and a new one is not there, because it gets its name
+/// when it is complete. When `progress` cancels, an older file is deleted as well, under the rules
+/// of OrbDeleteFile: a file that was reserved for the copy goes with it. While an older file grows,
+/// a process that is killed leaves it longer than it was. A source that is a link is read through
+/// it; a destination that is a link, is locked or is no regular file is refused with
+/// kOrbErrAccessDenied.
 ///
 /// kOrbErrEmptyPath for an empty source or folder; the codes of OrbMakeFilePath; kOrbErrCanceled;
 /// kOrbErrSamePath when source and destination are one file, under whichever names;
