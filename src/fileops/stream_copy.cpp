@@ -68,7 +68,7 @@ OrbResult OrbCopyFileEx(const COrbFilePath& source,
                         const COrbStringData& name,
                         OrbProgressProc progress,
                         void* data) {
-  if (source.IsEmpty() || folder.IsEmpty()) return kOrbErrEmptyPath;
+  if (folder.IsEmpty()) return kOrbErrEmptyPath;
   COrbStringData destination;
   const OrbResult joined = OrbMakeFilePath(folder.GetFullPath(), name, &destination);
   if (orb::Failed(joined)) return joined;

@@ -31,11 +31,11 @@ ORB_EXPORT OrbResult OrbMakeFilePath(const COrbFilePath& folder,
 /// it; a destination that is a link, is locked or is no regular file is refused with
 /// kOrbErrAccessDenied.
 ///
-/// kOrbErrEmptyPath for an empty source or folder; the codes of OrbMakeFilePath; kOrbErrCanceled;
+/// kOrbErrEmptyPath for an empty folder; the codes of OrbMakeFilePath; kOrbErrCanceled;
 /// kOrbErrSamePath when source and destination are one file, under whichever names;
 /// kOrbErrNotFound, kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrInvalidName, kOrbErrFileExists
 /// (somebody else made the destination meanwhile) and kOrbErrUnknown for what failed. A source that
-/// does not exist copies nothing, makes nothing and gives 0.
+/// is empty or does not exist copies nothing, makes nothing and gives 0.
 ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
                                    const COrbFilePath& folder,
                                    const COrbStringData& name,
