@@ -239,7 +239,10 @@ TEST(CopyFileEx, LeavesTheDestinationAsItWasWhenItDoesNotSucceed) {
   folder.Write("locked/file", "old");
   fs::create_hard_link(folder / "old", folder / "hard");
   fs::create_symlink("old", folder / "link");
-  ASSERT_EQ(COrbFileHandle(PathOf(folder / "locked/file")).SetAttribute(kOrbFileAttrLocked), 0u);
+  fs::create_symlink("nowhere", folder / "dangling");
+  ASSERT_EQ(::mkfifo((folder / "pipe").c_str(), 0600), 0);
+  for (const char* name : {"locked/file", "locked"})
+    ASSERT_EQ(COrbFileHandle(PathOf(folder / name)).SetAttribute(kOrbFileAttrLocked), 0u);
   const struct {
     const char* source;
     const char* name;
@@ -251,7 +254,11 @@ TEST(CopyFileEx, LeavesTheDestinationAsItWasWhenItDoesNotSucceed) {
       {"old", "hard", 0, kOrbErrSamePath},
       {"link", "old", 0, kOrbErrSamePath},
       {"source", "link", 0, kOrbErrAccessDenied},
+      {"source", "dangling", 0, kOrbErrAccessDenied},
+      {"source", "pipe", 0, kOrbErrAccessDenied},
+      {"pipe", "new", 0, kOrbErrAccessDenied},
       {"source", "locked/file", 0, kOrbErrAccessDenied},
+      {"source", "locked/new", 0, kOrbErrAccessDenied},
       {"source", "locked", 0, kOrbErrUnknown},
       {"source", "missing/new", 0, kOrbErrNotFound},
       {"source", "\xff", 0, kOrbErrInvalidName},
@@ -259,6 +266,7 @@ TEST(CopyFileEx, LeavesTheDestinationAsItWasWhenItDoesNotSucceed) {
       {"locked", "new", 0, kOrbErrUnknown},  // A folder cannot be read.
       {"missing", "new", 0, kOrbNoErr},
       {"missing", "old", 0, kOrbNoErr},
+      {"dangling", "new", 0, kOrbNoErr},
   };
   const auto before = Describe(folder.Path());
   const int descriptors = OpenDescriptors();
