@@ -20,6 +20,7 @@ struct Timestamp {
   std::int64_t seconds = 0;
   std::uint32_t nanoseconds = 0;
 
+  // NOLINTNEXTLINE(modernize-use-nullptr): clang-tidy takes the comparison for one with a pointer.
   auto operator<=>(const Timestamp&) const = default;
 };
 

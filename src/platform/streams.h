@@ -17,6 +17,9 @@ class InputStream {
   static Result<InputStream> Open(const std::string& path);
 
   InputStream(InputStream&&) noexcept;
+  InputStream& operator=(InputStream&&) = delete;
+  InputStream(const InputStream&) = delete;
+  InputStream& operator=(const InputStream&) = delete;
   ~InputStream();
 
   /// Fills the block as far as the file goes; 0 at the end.
@@ -41,6 +44,9 @@ class OutputStream {
   static Result<OutputStream> Append(const std::string& path);
 
   OutputStream(OutputStream&&) noexcept;
+  OutputStream& operator=(OutputStream&&) = delete;
+  OutputStream(const OutputStream&) = delete;
+  OutputStream& operator=(const OutputStream&) = delete;
   ~OutputStream();
 
   /// Whether both are one file, under whichever names.

@@ -59,7 +59,15 @@ struct OutputStream::State {
   Place place;
   std::optional<NewFile> made;
   UniqueFd existing;
-  struct stat before;
+  struct stat before {};
+
+  State() = default;
+  State(const State&) = delete;
+  State& operator=(const State&) = delete;
+  ~State() {
+    const ErrnoKeeper errnoKeeper;
+    TakeBack();
+  }
 
   int Descriptor() const { return made ? made->Descriptor() : existing.Get(); }
 
@@ -90,11 +98,6 @@ struct OutputStream::State {
       (void)::futimens(existing.Get(), times);
     existing.Reset();
     made.reset();
-  }
-
-  ~State() {
-    const ErrnoKeeper errnoKeeper;
-    TakeBack();
   }
 };
 

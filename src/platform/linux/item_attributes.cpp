@@ -17,9 +17,10 @@
 namespace orb::platform {
 namespace {
 
-constexpr std::size_t kMaxAttribute =
-    64 * 1024;                 // The kernel's own limit of a list and of a value.
-constexpr int kSizeTries = 4;  // While somebody changes it under us.
+/// The kernel's own limit of a list and of a value.
+constexpr std::size_t kMaxAttribute = 65536;
+/// While somebody changes it under us.
+constexpr int kSizeTries = 4;
 
 bool IsUserAttribute(std::string_view name) {
   if (name == kLockAttribute || name == kCreatedAttribute) return false;  // Carried by meaning.
