@@ -18,8 +18,8 @@ constexpr mode_t kUsualMode = 0666;
 
 /// kNoSuchItem where nothing is.
 Result<UniqueFd> OpenExisting(const Place& place) {
-  constexpr int kFlags = O_WRONLY | O_APPEND | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
-  UniqueFd file(Retry([&] { return ::openat(place.folder.Get(), place.name.c_str(), kFlags); }));
+  constexpr int kFlags = O_WRONLY | O_APPEND | O_NOFOLLOW;
+  UniqueFd file = OpenFile(place.folder.Get(), place.name.c_str(), kFlags);
   if (file) return file;
   const bool isLink = errno == ELOOP;
   const bool isPipe = errno == ENXIO;
@@ -39,8 +39,7 @@ InputStream::~InputStream() = default;
 
 Result<InputStream> InputStream::Open(const std::string& path) {
   const ErrnoKeeper errnoKeeper;
-  constexpr int kFlags = O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
-  UniqueFd file(Retry([&] { return ::open(path.c_str(), kFlags); }));
+  UniqueFd file = OpenFile(AT_FDCWD, path.c_str(), O_RDONLY);
   if (!file) return LastError();
   struct stat status;
   if (::fstat(file.Get(), &status) != 0) return LastError();
