@@ -14,9 +14,13 @@
 namespace orb {
 namespace {
 
-OrbResult CheckAttributes(const COrbFilePath& source) {
-  constexpr unsigned int kUsable = kOrbFileAttrReadable | kOrbFileAttrWritable;
-  const bool usable = (COrbFileHandle(source).GetAttribute() & kUsable) != 0;
+/// What the copy would refuse is refused before anything is removed to make way for it: what cannot
+/// be read, sockets, pipes and devices.
+OrbResult CheckAttributes(const COrbFilePath& source, const std::string& path) {
+  if ((COrbFileHandle(source).GetAttribute() & kOrbFileAttrReadable) == 0)
+    return kOrbErrAccessDenied;
+  const auto record = platform::Items::Current().ReadRecord(path);
+  const bool usable = record && record.Value().kind != platform::ItemKind::kOther;
   return usable ? kOrbNoErr : kOrbErrAccessDenied;
 }
 
@@ -56,7 +60,7 @@ OrbResult OrbCopyFileOverwriteEx(const COrbFilePath& source,
   const auto from = orb::ItemPath(source.GetFullPath());
   if (!from) return kOrbErrAccessDenied;
   if (OrbResult found = orb::ExpectSource(*from); orb::Failed(found)) return found;
-  if (OrbResult usable = orb::CheckAttributes(source); orb::Failed(usable)) return usable;
+  if (OrbResult usable = orb::CheckAttributes(source, *from); orb::Failed(usable)) return usable;
   COrbStringData newName;
   if (OrbResult named = orb::ChooseName(source, name, &newName); orb::Failed(named)) return named;
   std::string to;

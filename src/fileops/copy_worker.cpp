@@ -7,8 +7,6 @@
 #include "platform/copier.h"
 
 namespace orb {
-namespace {}  // namespace
-
 OrbCopyPath::OrbCopyPath(std::string source, std::string destination)
     : source_(std::move(source)), destination_(std::move(destination)) {}
 

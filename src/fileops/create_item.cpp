@@ -51,10 +51,13 @@ class UniqueFile {
     while (IsTaken(number)) number = taken.NextFree(number + 1);
   }
 
+  /// Where nothing may be made a name that is there counts as taken too: the diagnosis needs one
+  /// that is free.
   bool IsTaken(std::uint32_t number) {
     path_ = JoinPath(folder_, names_.With(number));
     created_ = Items::Current().CreateEmptyFile(path_);
-    return !created_ && created_.Reason() == platform::kItemExists;
+    if (created_) return false;
+    return created_.Reason() == platform::kItemExists || Items::Current().Exists(path_);
   }
 
   const std::string& folder_;

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: MIT
 #include <orb/fileops/copy.h>
+#include <orb/fileops/remove.h>
 
 #include <array>
 #include <cstddef>
 #include <span>
-#include <string>
 
 #include "fileinfo/item_path.h"
 #include "fileops/error_mapping.h"
@@ -38,15 +38,25 @@ OrbResult CopyPieces(InputStream* source,
   }
 }
 
+/// Who cancels wants no destination, also where one was reserved before. What somebody else has put
+/// in its place is not his.
+OrbResult Cancel(OutputStream* destination, const COrbStringData& path) {
+  COrbFilePath item;
+  item.Initialize(&path);
+  if (destination->Undo()) (void)OrbDeleteFile(item);
+  return kOrbErrCanceled;
+}
+
 /// What is not finished is taken back when the destination goes out of scope.
 OrbResult AppendFile(InputStream* source,
-                     const std::string& path,
+                     const COrbStringData& path,
                      OrbProgressProc progress,
                      void* data) {
-  auto destination = OutputStream::Append(path);
+  auto destination = OutputStream::Append(path.GetPtrUtf8());
   if (!destination) return OrbMapError(destination.Reason());
   if (destination.Value().Writes(*source)) return kOrbErrSamePath;
   const OrbResult copied = CopyPieces(source, &destination.Value(), progress, data);
+  if (copied == kOrbErrCanceled) return Cancel(&destination.Value(), path);
   return Failed(copied) ? copied : CodeOf(destination.Value().Finish());
 }
 
@@ -58,7 +68,7 @@ OrbResult OrbCopyFileEx(const COrbFilePath& source,
                         const COrbStringData& name,
                         OrbProgressProc progress,
                         void* data) {
-  if (source.IsEmpty() || folder.IsEmpty()) return kOrbErrEmptyPath;
+  if (folder.IsEmpty()) return kOrbErrEmptyPath;
   COrbStringData destination;
   const OrbResult joined = OrbMakeFilePath(folder.GetFullPath(), name, &destination);
   if (orb::Failed(joined)) return joined;
@@ -69,5 +79,5 @@ OrbResult OrbCopyFileEx(const COrbFilePath& source,
     const bool missing = input.Reason() == orb::platform::kNoSuchItem;
     return missing ? kOrbNoErr : orb::OrbMapError(input.Reason());
   }
-  return orb::AppendFile(&input.Value(), destination.GetPtrUtf8(), progress, data);
+  return orb::AppendFile(&input.Value(), destination, progress, data);
 }

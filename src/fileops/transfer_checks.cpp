@@ -18,7 +18,7 @@
 namespace orb {
 namespace {
 
-constexpr std::uint64_t kEnoughSpace = 100 * 1024 * 1024;
+constexpr std::uint64_t kEnoughSpace = std::uint64_t{100} << 20;  // 100 MiB.
 
 bool IsSubFolder(const std::string& a, const std::string& b) {
   return OrbIsSubFolder(StringAccess::FromUtf8(a), StringAccess::FromUtf8(b));

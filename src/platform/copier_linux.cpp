@@ -45,10 +45,8 @@ Status CopyOpenFile(int from, const struct stat& status, const Step& step) {
   return copy.Value().Publish(step.newName);
 }
 
-/// Not waiting: what was a file a moment ago may be a pipe now.
 Status CopyFile(const Step& step) {
-  constexpr int kFlags = O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
-  const UniqueFd from(Retry([&] { return ::openat(step.from, step.name, kFlags); }));
+  const UniqueFd from = OpenFile(step.from, step.name, O_RDONLY | O_NOFOLLOW);
   if (!from) return LastError();
   struct stat status;
   if (::fstat(from.Get(), &status) != 0) return LastError();

@@ -2,20 +2,19 @@
 #include "platform/items.h"
 
 #include <fcntl.h>
-#include <sys/random.h>
 #include <sys/stat.h>
 #include <sys/statvfs.h>
 #include <sys/syscall.h>
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
 #include <atomic>
 #include <string_view>
 #include <vector>
 
 #include "platform/linux/item_metadata.h"
-#include "platform/linux/posix.h"
+#include "platform/linux/new_file.h"
+#include "platform/linux/place.h"
 
 namespace orb::platform {
 
@@ -159,20 +158,13 @@ bool IsNear(Timestamp a, Timestamp b) {
   return a.seconds - b.seconds < kCoarsestStep && b.seconds - a.seconds < kCoarsestStep;
 }
 
-/// A folder that may get a new entry, and the entry's name in it.
-struct Place {
-  UniqueFd folder;
-  std::string name;
-};
-
-Result<Place> OpenPlace(const std::string& path) {
-  const std::size_t slash = path.rfind('/');
-  const std::string folder = slash == std::string::npos ? "." : path.substr(0, slash + 1);
-  UniqueFd opened(Retry([&] { return ::open(folder.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC); }));
-  if (!opened) return LastError();
-  if (const Status refused = RefuseLocked(opened.Get()); !refused) return refused.Reason();
-  Place place{std::move(opened), path.substr(slash + 1)};
-  if (place.name.empty()) return path.empty() ? kNoSuchItem : kInvalidName;
+/// Finds the folder that a new entry goes into.
+Result<Place> LocateNew(const std::string& path) {
+  Result<Place> place = Locate(path);
+  if (!place) return place;
+  if (const Status refused = RefuseLocked(place.Value().folder.Get()); !refused)
+    return refused.Reason();
+  if (place.Value().folderMeant) return kInvalidName;
   return place;
 }
 
@@ -182,23 +174,10 @@ Status CreateFile(const UniqueFd& folder, const std::string& name) {
   return file ? Status() : Status(LastError());
 }
 
-/// Hidden, and not to be guessed.
-std::string PrivateName() {
-  std::array<unsigned char, 8> random{};
-  // Names that collide cost one more try, no more: a failure needs no care.
-  (void)::getrandom(random.data(), random.size(), GRND_NONBLOCK);
-  std::string name = ".orb-";
-  for (const unsigned char byte : random) {
-    name += "0123456789abcdef"[byte >> 4];
-    name += "0123456789abcdef"[byte & 15];
-  }
-  return name;
-}
-
 Result<std::string> CreatePrivateFile(const UniqueFd& folder) {
   constexpr int kTries = 100;
   for (int i = 0; i < kTries; ++i) {
-    std::string name = PrivateName();
+    std::string name = RandomHiddenName();
     const Status created = CreateFile(folder, name);
     if (created.Ok()) return name;
     if (created.Reason() != kItemExists) return created.Reason();
@@ -222,18 +201,19 @@ Status ReplaceByNewFile(const Place& place) {
   if (!created) return created.Reason();
   const int folder = place.folder.Get();
   const char* temporary = created.Value().c_str();
-  if (::renameat(folder, temporary, folder, place.name.c_str()) == 0) return {};
+  const char* name = place.name.c_str();
+  if (Retry([&] { return ::renameat(folder, temporary, folder, name); }) == 0) return {};
   const Error error = LastError();
   ::unlinkat(folder, temporary, 0);
   return error;
 }
 
 Status CreateFolder(const std::string& path) {
-  const Result<Place> place = OpenPlace(path);
+  const Result<Place> place = LocateNew(path);
   if (!place) return place.Reason();
   const Place& at = place.Value();
-  return ::mkdirat(at.folder.Get(), at.name.c_str(), kNewFolder) == 0 ? Status()
-                                                                      : Status(LastError());
+  const int made = Retry([&] { return ::mkdirat(at.folder.Get(), at.name.c_str(), kNewFolder); });
+  return made == 0 ? Status() : Status(LastError());
 }
 
 /// Where the text of the folder above ends; 0 when there is none above.
@@ -345,7 +325,7 @@ class SystemItems final : public Items {
 
   Status ReplaceByEmptyFile(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
-    const Result<Place> place = OpenPlace(path.Get());
+    const Result<Place> place = LocateNew(path.Get());
     if (!place) return place.Reason();
     const Status created = CreateFile(place.Value().folder, place.Value().name);
     if (created || created.Reason() != kItemExists) return created;
@@ -355,7 +335,7 @@ class SystemItems final : public Items {
 
   Status CreateEmptyFile(PathText path) const override {
     const ErrnoKeeper errnoKeeper;
-    const Result<Place> place = OpenPlace(path.Get());
+    const Result<Place> place = LocateNew(path.Get());
     if (!place) return place.Reason();
     return CreateFile(place.Value().folder, place.Value().name);
   }

@@ -33,10 +33,14 @@ bool HasNoLockAttribute(int folder, const char* name) {
   return ::lgetxattr(path, kLockAttribute, nullptr, 0) < 0 && errno == ENODATA;
 }
 
+int Unlink(int folder, const char* name, int flags) {
+  return Retry([&] { return ::unlinkat(folder, name, flags); });
+}
+
 enum class Outcome { kGone, kNotEmpty };
 
 Result<Outcome> RemoveFolderEntry(int folder, const char* name) {
-  if (::unlinkat(folder, name, AT_REMOVEDIR) == 0) return Outcome::kGone;
+  if (Unlink(folder, name, AT_REMOVEDIR) == 0) return Outcome::kGone;
   if (errno == ENOTEMPTY || errno == EEXIST) return Outcome::kNotEmpty;
   return LastRemovalError();
 }
@@ -45,7 +49,7 @@ Result<Outcome> RemoveFolderEntry(int folder, const char* name) {
 Result<Outcome> RemoveEntry(int folder, const char* name, unsigned char type) {
   if (Status open = RefuseLockedEntry(folder, name); !open) return open.Reason();
   if (type == DT_DIR) return RemoveFolderEntry(folder, name);
-  if (::unlinkat(folder, name, 0) == 0) return Outcome::kGone;
+  if (Unlink(folder, name, 0) == 0) return Outcome::kGone;
   if (errno == EISDIR) return RemoveFolderEntry(folder, name);
   return LastRemovalError();
 }
@@ -177,7 +181,7 @@ Status UnlinkItem(const std::string& path) {
   const int folder = place.Value().folder.Get();
   const char* name = place.Value().name.c_str();
   if (Status open = RefuseLockedEntry(folder, name); !open) return open;
-  if (::unlinkat(folder, name, 0) != 0) return LastRemovalError();
+  if (Unlink(folder, name, 0) != 0) return LastRemovalError();
   return {};
 }
 

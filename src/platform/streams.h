@@ -17,6 +17,9 @@ class InputStream {
   static Result<InputStream> Open(const std::string& path);
 
   InputStream(InputStream&&) noexcept;
+  InputStream& operator=(InputStream&&) = delete;
+  InputStream(const InputStream&) = delete;
+  InputStream& operator=(const InputStream&) = delete;
   ~InputStream();
 
   /// Fills the block as far as the file goes; 0 at the end.
@@ -36,10 +39,14 @@ class InputStream {
 class OutputStream {
  public:
   /// A link at the path is not written through: kNotPermitted, as for a locked file, for a new file
-  /// in a locked folder, and for what is not a regular file.
+  /// in a locked folder, and for what is not a regular file. kInvalidName for a path that ends in
+  /// "/".
   static Result<OutputStream> Append(const std::string& path);
 
   OutputStream(OutputStream&&) noexcept;
+  OutputStream& operator=(OutputStream&&) = delete;
+  OutputStream(const OutputStream&) = delete;
+  OutputStream& operator=(const OutputStream&) = delete;
   ~OutputStream();
 
   /// Whether both are one file, under whichever names.
@@ -48,6 +55,9 @@ class OutputStream {
   Status Write(std::span<const std::byte> block);
   /// kItemExists when somebody else made the file meanwhile.
   Status Finish();
+  /// Takes everything back now. Whether the path still leads to the file that was there before:
+  /// false when there was none, or somebody has put another in its place.
+  bool Undo();
 
  private:
   struct State;

@@ -18,8 +18,8 @@ constexpr mode_t kUsualMode = 0666;
 
 /// kNoSuchItem where nothing is.
 Result<UniqueFd> OpenExisting(const Place& place) {
-  constexpr int kFlags = O_WRONLY | O_APPEND | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
-  UniqueFd file(Retry([&] { return ::openat(place.folder.Get(), place.name.c_str(), kFlags); }));
+  constexpr int kFlags = O_WRONLY | O_APPEND | O_NOFOLLOW;
+  UniqueFd file = OpenFile(place.folder.Get(), place.name.c_str(), kFlags);
   if (file) return file;
   const bool isLink = errno == ELOOP;
   const bool isPipe = errno == ENXIO;
@@ -39,8 +39,7 @@ InputStream::~InputStream() = default;
 
 Result<InputStream> InputStream::Open(const std::string& path) {
   const ErrnoKeeper errnoKeeper;
-  constexpr int kFlags = O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
-  UniqueFd file(Retry([&] { return ::open(path.c_str(), kFlags); }));
+  UniqueFd file = OpenFile(AT_FDCWD, path.c_str(), O_RDONLY);
   if (!file) return LastError();
   struct stat status;
   if (::fstat(file.Get(), &status) != 0) return LastError();
@@ -59,7 +58,15 @@ struct OutputStream::State {
   Place place;
   std::optional<NewFile> made;
   UniqueFd existing;
-  struct stat before;
+  struct stat before {};
+
+  State() = default;
+  State(const State&) = delete;
+  State& operator=(const State&) = delete;
+  ~State() {
+    const ErrnoKeeper errnoKeeper;
+    TakeBack();
+  }
 
   int Descriptor() const { return made ? made->Descriptor() : existing.Get(); }
 
@@ -79,14 +86,17 @@ struct OutputStream::State {
     return {};
   }
 
-  void TakeBack() const {
-    const timespec times[2] = {before.st_atim, before.st_mtim};
-    if (Retry([&] { return ::ftruncate(existing.Get(), before.st_size); }) == 0)
-      (void)::futimens(existing.Get(), times);
+  bool IsAtItsPath() const {
+    const auto now = ReadStatus(place);
+    return existing && now && IdentityOf(now.Value()) == IdentityOf(before);
   }
 
-  ~State() {
-    if (existing) TakeBack();
+  void TakeBack() {
+    const timespec times[2] = {before.st_atim, before.st_mtim};
+    if (existing && Retry([&] { return ::ftruncate(existing.Get(), before.st_size); }) == 0)
+      (void)::futimens(existing.Get(), times);
+    existing.Reset();
+    made.reset();
   }
 };
 
@@ -98,6 +108,7 @@ Result<OutputStream> OutputStream::Append(const std::string& path) {
   const ErrnoKeeper errnoKeeper;
   auto place = Locate(path);
   if (!place) return place.Reason();
+  if (place.Value().folderMeant) return kInvalidName;
   auto state = std::make_unique<State>();
   state->place = std::move(place).Value();
   auto file = OpenExisting(state->place);
@@ -122,6 +133,13 @@ Status OutputStream::Finish() {
   if (Status flushed = Flush(state_->existing.Get()); !flushed) return flushed;
   state_->existing.Reset();
   return {};
+}
+
+bool OutputStream::Undo() {
+  const ErrnoKeeper errnoKeeper;
+  const bool isAtItsPath = state_->IsAtItsPath();
+  state_->TakeBack();
+  return isAtItsPath;
 }
 
 }  // namespace orb::platform

@@ -105,6 +105,7 @@ TEST(CopyFileOverwriteEx, RemovesNothingUnlessItCanBeReplaced) {
   fs::create_directory(folder / "a/full");
   folder.Write("a/full/file", "old");
   fs::create_directory_symlink("a", folder / "link");
+  ASSERT_EQ(::mkfifo((folder / "a/pipe").c_str(), 0600), 0);
   const struct {
     const char* source;
     const char* folder;
@@ -132,6 +133,7 @@ TEST(CopyFileOverwriteEx, RemovesNothingUnlessItCanBeReplaced) {
       {"a/b/photo.jpg", "a/full", "\xff", kOrbErrInvalidName},
       {"a/b/photo.jpg", nullptr, "old", kOrbErrEmptyPath},
       {"a/b/photo.jpg", "a/missing", {}, kOrbErrNotFound},
+      {"a/pipe", "a", "old", kOrbErrAccessDenied},  // A source that is never copied.
       {"a", "a/b", "inside", kOrbErrUnknown},
   };
   const auto before = Describe(folder.Path());
@@ -177,14 +179,14 @@ TEST(CopyFileOverwriteEx, CanBeCanceledBeforeButNotAfterTheCopy) {
 TEST(CopyFileOverwriteEx, PutsFailuresDownToALowVolumeButNotACancel) {
   constexpr std::uint64_t kEnough = 104857600;
   const TempFolder folder;
-  ASSERT_EQ(::mkfifo((folder / "pipe").c_str(), 0600), 0);
+  fs::create_symlink("nowhere", folder / "taken");  // No way is made for what does not exist.
   folder.Write("file", "x");
   for (const std::uint64_t available : {kEnough, kEnough - 1}) {
     SCOPED_TRACE(available);
     const AlmostFull volumes(available);
     const orb::platform::ScopedVolumes scoped(volumes);
-    const OrbResult failed = available < kEnough ? kOrbErrDiskFull : kOrbErrAccessDenied;
-    EXPECT_EQ(Copy(folder / "pipe", folder.Path(), "copy"), failed);
+    const OrbResult failed = available < kEnough ? kOrbErrDiskFull : kOrbErrUnknown;
+    EXPECT_EQ(Copy(folder / "file", folder.Path(), "taken"), failed);
     Progress progress{1};
     EXPECT_EQ(Copy(folder / "file", folder.Path(), "copy", &progress), kOrbErrCanceled);
     EXPECT_EQ(Copy(folder / "file", folder.Path(), "copy"), kOrbNoErr);
@@ -237,7 +239,10 @@ TEST(CopyFileEx, LeavesTheDestinationAsItWasWhenItDoesNotSucceed) {
   folder.Write("locked/file", "old");
   fs::create_hard_link(folder / "old", folder / "hard");
   fs::create_symlink("old", folder / "link");
-  ASSERT_EQ(COrbFileHandle(PathOf(folder / "locked/file")).SetAttribute(kOrbFileAttrLocked), 0u);
+  fs::create_symlink("nowhere", folder / "dangling");
+  ASSERT_EQ(::mkfifo((folder / "pipe").c_str(), 0600), 0);
+  for (const char* name : {"locked/file", "locked"})
+    ASSERT_EQ(COrbFileHandle(PathOf(folder / name)).SetAttribute(kOrbFileAttrLocked), 0u);
   const struct {
     const char* source;
     const char* name;
@@ -245,18 +250,23 @@ TEST(CopyFileEx, LeavesTheDestinationAsItWasWhenItDoesNotSucceed) {
     OrbResult expected;
   } kCases[] = {
       {"source", "new", 1, kOrbErrCanceled},
-      {"source", "old", 3, kOrbErrCanceled},
       {"old", "old", 0, kOrbErrSamePath},
       {"old", "hard", 0, kOrbErrSamePath},
       {"link", "old", 0, kOrbErrSamePath},
       {"source", "link", 0, kOrbErrAccessDenied},
+      {"source", "dangling", 0, kOrbErrAccessDenied},
+      {"source", "pipe", 0, kOrbErrAccessDenied},
+      {"pipe", "new", 0, kOrbErrAccessDenied},
       {"source", "locked/file", 0, kOrbErrAccessDenied},
+      {"source", "locked/new", 0, kOrbErrAccessDenied},
       {"source", "locked", 0, kOrbErrUnknown},
       {"source", "missing/new", 0, kOrbErrNotFound},
       {"source", "\xff", 0, kOrbErrInvalidName},
+      {"source", "old/", 0, kOrbErrInvalidName},
       {"locked", "new", 0, kOrbErrUnknown},  // A folder cannot be read.
       {"missing", "new", 0, kOrbNoErr},
       {"missing", "old", 0, kOrbNoErr},
+      {"dangling", "new", 0, kOrbNoErr},
   };
   const auto before = Describe(folder.Path());
   const int descriptors = OpenDescriptors();
@@ -269,12 +279,39 @@ TEST(CopyFileEx, LeavesTheDestinationAsItWasWhenItDoesNotSucceed) {
   }
   EXPECT_EQ(OpenDescriptors(), descriptors);
   EXPECT_EQ(Append(folder / "source", "", "new"), kOrbErrEmptyPath);
-  EXPECT_EQ(Append("", folder.Path(), "new"), kOrbErrEmptyPath);
+  EXPECT_EQ(Append("", folder.Path(), "new"), kOrbNoErr);
   EXPECT_EQ(Append(folder / "source", folder.Path(), std::string(256, 'n')), kOrbErrNameTooLong);
   // 100 characters, 300 bytes.
   std::string wide;
   for (int i = 0; i < 100; ++i) wide += "\xe3\x81\x82";
   EXPECT_EQ(Append(folder / "source", folder.Path(), wide), kOrbErrInvalidName);
+}
+
+TEST(CopyFileEx, LeavesNoDestinationWhenCanceledButWhatSomebodyElsePutThere) {
+  const TempFolder folder;
+  folder.Write("source", std::string(200000, 's'));
+  folder.Write("old", "0123456789");
+  fs::create_hard_link(folder / "old", folder / "hard");
+  Progress progress{3};
+  EXPECT_EQ(Append(folder / "source", folder.Path(), "old", &progress), kOrbErrCanceled);
+  EXPECT_FALSE(fs::exists(folder / "old"));
+  EXPECT_EQ(ReadAll(folder / "hard"), "0123456789");
+  static const std::string photo = folder / "photo";
+  for (const char* reserved : {"", "photo"}) {
+    if (*reserved != '\0') folder.Write(reserved, "");
+    const auto replaceAndCancel = [](void*) {
+      fs::remove(photo);
+      std::ofstream(photo) << "theirs";
+      return false;
+    };
+    EXPECT_EQ(OrbCopyFileEx(PathOf(folder / "source"),
+                            PathOf(folder.Path()),
+                            S("photo"),
+                            replaceAndCancel,
+                            nullptr),
+              kOrbErrCanceled);
+    EXPECT_EQ(ReadAll(photo), "theirs");
+  }
 }
 
 TEST(CopyFileEx, TakesBackWhatAFullVolumeOrAStrangersFileLeft) {

@@ -72,6 +72,10 @@ TEST(CreateUniqueFile, EndsWhereNoNumberCanHelp) {
   EXPECT_EQ(Unique(folder.Path(), "n" + longest), std::to_string(kOrbErrInvalidName));
   EXPECT_EQ(Unique(folder / "missing", "a"), std::to_string(kOrbErrAccessDenied));
   EXPECT_EQ(Unique("", "a"), std::to_string(kOrbErrEmptyPath));
+  ASSERT_EQ(COrbFileHandle(PathOf(folder.Path())).SetAttribute(kOrbFileAttrLocked), 0u);
+  EXPECT_EQ(Unique(folder.Path(), longest), std::to_string(kOrbErrInvalidName));
+  folder.Write("a", "");
+  EXPECT_EQ(Unique(folder.Path(), "a"), std::to_string(kOrbErrAccessDenied));
 }
 
 TEST(CreateUniqueFile, GivesNoTwoCallersTheSameFile) {

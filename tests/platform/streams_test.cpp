@@ -1,25 +1,27 @@
 // SPDX-License-Identifier: MIT
 #include "platform/streams.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
-#include <sys/stat.h>
+#include <signal.h>
+#include <unistd.h>
 
-#include <filesystem>
+#include <chrono>
 #include <string>
+#include <thread>
 
-#include "platform/items.h"
+#include "platform/copier.h"
+#include "support/faults.h"
 #include "support/temp_folder.h"
 
 namespace {
 
-namespace fs = std::filesystem;
+using orb::platform::CopyItem;
 using orb::platform::InputStream;
-using orb::platform::Items;
 using orb::platform::kItemExists;
-using orb::platform::kNoSuchItem;
-using orb::platform::kNotPermitted;
 using orb::platform::OutputStream;
 using orb::test::ReadAll;
+using orb::test::RunInChild;
 using orb::test::TempFolder;
 
 TEST(OutputStream, TakesNoNameThatSomebodyElseTookMeanwhile) {
@@ -31,29 +33,26 @@ TEST(OutputStream, TakesNoNameThatSomebodyElseTookMeanwhile) {
   EXPECT_EQ(ReadAll(folder / "new"), "theirs");
 }
 
-TEST(Streams, OpenRegularFilesOnly) {
+// As a file server takes one: whoever opens the file waits until it lets go.
+TEST(Streams, WaitForAFileThatIsLeased) {
   const TempFolder folder;
-  folder.Write("file", "x");
-  fs::create_directory(folder / "locked");
-  folder.Write("locked/file", "x");
-  fs::create_symlink("file", folder / "link");
-  fs::create_symlink("nowhere", folder / "dangling");
-  ASSERT_EQ(::mkfifo((folder / "pipe").c_str(), 0600), 0);
-  ASSERT_TRUE(Items::Current().SetLocked(folder / "locked/file", true));
-  ASSERT_TRUE(Items::Current().SetLocked(folder / "locked", true));
-  for (const char* name : {"pipe", "link", "dangling", "locked/file", "locked/new"}) {
-    const auto stream = OutputStream::Append(folder / name);
-    ASSERT_FALSE(stream) << name;
-    EXPECT_EQ(stream.Reason(), kNotPermitted) << name;
-  }
-  EXPECT_EQ(InputStream::Open(folder / "pipe").Reason(), kNotPermitted);
-  EXPECT_EQ(InputStream::Open(folder / "dangling").Reason(), kNoSuchItem);
-  EXPECT_EQ(OutputStream::Append(folder / "missing/file").Reason(), kNoSuchItem);
-
-  const auto source = InputStream::Open(folder / "link");
-  ASSERT_TRUE(source);
-  EXPECT_TRUE(OutputStream::Append(folder / "file").Value().Writes(source.Value()));
-  EXPECT_FALSE(OutputStream::Append(folder / "new").Value().Writes(source.Value()));
+  const std::string photo = folder.Write("photo", "x");
+  ORB_IN_CHILD(RunInChild([] { return ::signal(SIGIO, SIG_IGN) != SIG_ERR; },
+                          [&] {
+                            const auto lease = [&](auto use) {
+                              const int file = ::open(photo.c_str(), O_RDWR | O_CLOEXEC);
+                              ASSERT_EQ(::fcntl(file, F_SETLEASE, F_WRLCK), 0);
+                              std::thread server([&] {
+                                std::this_thread::sleep_for(std::chrono::milliseconds(50));
+                                ::close(file);
+                              });
+                              use();
+                              server.join();
+                            };
+                            lease([&] { EXPECT_TRUE(InputStream::Open(photo)); });
+                            lease([&] { EXPECT_TRUE(OutputStream::Append(photo)); });
+                            lease([&] { EXPECT_TRUE(CopyItem(photo, folder / "copy")); });
+                          }));
 }
 
 }  // namespace

@@ -23,17 +23,19 @@ ORB_EXPORT OrbResult OrbMakeFilePath(const COrbFilePath& folder,
 
 /// Copies a file's bytes in pieces of 64 KiB to the end of the file `name` in `folder`, which is
 /// made when it is not there. Times, mode and attributes do not go along. `progress` is called
-/// after each piece that was written. When the copy fails or is cancelled, what it wrote is taken
-/// away again: an older file has its former length and times, and a new one is not there, because
-/// it gets its name when it is complete. While an older file grows, a process that is killed leaves
-/// it longer than it was. A source that is a link is read through it; a destination that is a link,
-/// is locked or is no regular file is refused with kOrbErrAccessDenied.
+/// after each piece that was written. When the copy fails, what it wrote is taken away again: an
+/// older file has its former length and times, and a new one is not there, because it gets its name
+/// when it is complete. When `progress` cancels, an older file is deleted as well, under the rules
+/// of OrbDeleteFile: a file that was reserved for the copy goes with it. While an older file grows,
+/// a process that is killed leaves it longer than it was. A source that is a link is read through
+/// it; a destination that is a link, is locked or is no regular file is refused with
+/// kOrbErrAccessDenied.
 ///
-/// kOrbErrEmptyPath for an empty source or folder; the codes of OrbMakeFilePath; kOrbErrCanceled;
+/// kOrbErrEmptyPath for an empty folder; the codes of OrbMakeFilePath; kOrbErrCanceled;
 /// kOrbErrSamePath when source and destination are one file, under whichever names;
 /// kOrbErrNotFound, kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrInvalidName, kOrbErrFileExists
 /// (somebody else made the destination meanwhile) and kOrbErrUnknown for what failed. A source that
-/// does not exist copies nothing, makes nothing and gives 0.
+/// is empty or does not exist copies nothing, makes nothing and gives 0.
 ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
                                    const COrbFilePath& folder,
                                    const COrbStringData& name,
@@ -48,7 +50,7 @@ ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
 /// a failure stays.
 ///
 /// In this order: kOrbErrNotFound for a source that is empty or not there; kOrbErrAccessDenied for
-/// one that can neither be read nor written, a link that leads nowhere among them;
+/// one that cannot be read, a link that leads nowhere among them, and for a socket, pipe or device;
 /// kOrbErrInvalidName for a name that is empty, "." or ".."; kOrbErrEmptyPath for an empty folder;
 /// kOrbErrInsideSource when the destination is the source or one of its folders, by its text or on
 /// disk, and kOrbErrAccessDenied when it cannot be removed. Up to here nothing has changed, but a

@@ -14,11 +14,11 @@
 namespace orb::platform {
 namespace {
 
-constexpr std::size_t kBlock = 128 * 1024;
+constexpr std::size_t kBlock = std::size_t{128} << 10;
 /// Files up to this size go with one read and one write: asking for more costs more than it saves.
-constexpr off_t kSmallFile = 64 * 1024;
+constexpr off_t kSmallFile = off_t{64} << 10;
 /// What one copy_file_range is asked for. A signal waits no longer than that.
-constexpr off_t kRangeStep = 4 * 1024 * 1024;
+constexpr off_t kRangeStep = off_t{4} << 20;
 
 Status EndedEarly() { return ErrorFromErrno(EIO); }
 

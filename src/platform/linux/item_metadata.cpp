@@ -214,10 +214,12 @@ Timestamp RecordedCreationTime(const StatusRecord& status) {
 }  // namespace
 
 int ItemRef::Status(struct statx* status) const {
-  if (path_ != nullptr) {
-    return ::statx(AT_FDCWD, path_, AT_SYMLINK_NOFOLLOW, kStatusFields, status);
-  }
-  return ::statx(descriptor_, "", AT_EMPTY_PATH, kStatusFields, status);
+  return Retry([&] {
+    if (path_ != nullptr) {
+      return ::statx(AT_FDCWD, path_, AT_SYMLINK_NOFOLLOW, kStatusFields, status);
+    }
+    return ::statx(descriptor_, "", AT_EMPTY_PATH, kStatusFields, status);
+  });
 }
 
 int ItemRef::Volume(struct statfs* volume) const {
@@ -226,22 +228,26 @@ int ItemRef::Volume(struct statfs* volume) const {
 }
 
 ssize_t ItemRef::ListAttributes(char* names, std::size_t size) const {
-  if (path_ != nullptr) return ::llistxattr(path_, names, size);
-  const ssize_t result = ::flistxattr(descriptor_, names, size);
-  if (result >= 0 || errno != EBADF) return result;
-  return ::listxattr(PathOf(descriptor_).Text(), names, size);
+  return Retry([&] {
+    if (path_ != nullptr) return ::llistxattr(path_, names, size);
+    const ssize_t result = ::flistxattr(descriptor_, names, size);
+    if (result >= 0 || errno != EBADF) return result;
+    return ::listxattr(PathOf(descriptor_).Text(), names, size);
+  });
 }
 
 ssize_t ItemRef::GetAttribute(const char* name, char* value, std::size_t size) const {
-  if (path_ != nullptr) return ::lgetxattr(path_, name, value, size);
-  const ssize_t result = ::fgetxattr(descriptor_, name, value, size);
-  if (result >= 0 || errno != EBADF) return result;
-  return ::getxattr(PathOf(descriptor_).Text(), name, value, size);
+  return Retry([&] {
+    if (path_ != nullptr) return ::lgetxattr(path_, name, value, size);
+    const ssize_t result = ::fgetxattr(descriptor_, name, value, size);
+    if (result >= 0 || errno != EBADF) return result;
+    return ::getxattr(PathOf(descriptor_).Text(), name, value, size);
+  });
 }
 
 Result<StatusRecord> ReadStatus(const ItemRef& item) {
   StatusRecord status;
-  if (Retry([&] { return item.Status(&status); }) != 0) return LastError();
+  if (item.Status(&status) != 0) return LastError();
   return status;
 }
 

@@ -15,15 +15,6 @@ namespace {
 
 constexpr int kNameTries = 16;
 
-std::string RandomHiddenName() {
-  std::uint64_t random = 0;
-  if (::getrandom(&random, sizeof random, GRND_NONBLOCK) != sizeof random)
-    random = reinterpret_cast<std::uintptr_t>(&random) ^ static_cast<std::uint64_t>(::getpid());
-  char name[32];
-  std::snprintf(name, sizeof name, ".orb-%016llx", static_cast<unsigned long long>(random));
-  return name;
-}
-
 UniqueFd OpenNameless(int folder, mode_t mode) {
   return UniqueFd(
       Retry([&] { return ::openat(folder, ".", O_TMPFILE | O_RDWR | O_CLOEXEC, mode); }));
@@ -44,6 +35,15 @@ Status LinkNameless(int file, int folder, const char* name) {
 }
 
 }  // namespace
+
+std::string RandomHiddenName() {
+  std::uint64_t random = 0;
+  if (::getrandom(&random, sizeof random, GRND_NONBLOCK) != sizeof random)
+    random = reinterpret_cast<std::uintptr_t>(&random) ^ static_cast<std::uint64_t>(::getpid());
+  char name[32];
+  std::snprintf(name, sizeof name, ".orb-%016llx", static_cast<unsigned long long>(random));
+  return name;
+}
 
 Status Flush(int file) {
   UniqueFd second(::fcntl(file, F_DUPFD_CLOEXEC, 0));

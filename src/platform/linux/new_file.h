@@ -9,6 +9,9 @@
 
 namespace orb::platform {
 
+/// A name for what is not to be seen before it is complete. Not to be guessed.
+std::string RandomHiddenName();
+
 /// What a network or user-space file system has kept back shows when a descriptor is closed. This
 /// lets it show while the file can still be dropped or taken back.
 Status Flush(int file);

@@ -4,6 +4,7 @@
 #include <fcntl.h>
 
 #include <optional>
+#include <utility>
 
 namespace orb::platform {
 namespace {
@@ -18,7 +19,28 @@ std::string FolderPart(const std::string& path, std::size_t lastSlash) {
   return lastSlash == 0 ? "/" : path.substr(0, lastSlash);
 }
 
+UniqueFd NotNow() {
+  errno = EWOULDBLOCK;
+  return {};
+}
+
+/// Only regular files are leased. The kernel takes the lease back within seconds.
+UniqueFd OpenLeased(int folder, const char* name, int flags) {
+  const int itemFlags = O_PATH | O_CLOEXEC | (flags & O_NOFOLLOW);
+  const UniqueFd item(Retry([&] { return ::openat(folder, name, itemFlags); }));
+  struct stat status;
+  if (!item || ::fstat(item.Get(), &status) != 0 || !S_ISREG(status.st_mode)) return NotNow();
+  const std::string path = "/proc/self/fd/" + std::to_string(item.Get());
+  return UniqueFd(Retry([&] { return ::open(path.c_str(), (flags & ~O_NOFOLLOW) | O_CLOEXEC); }));
+}
+
 }  // namespace
+
+UniqueFd OpenFile(int folder, const char* name, int flags) {
+  const int all = flags | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
+  UniqueFd file(Retry([&] { return ::openat(folder, name, all); }));
+  return file || errno != EWOULDBLOCK ? std::move(file) : OpenLeased(folder, name, flags);
+}
 
 Result<Place> Locate(const std::string& path) {
   if (path.empty()) return kNoSuchItem;
@@ -36,7 +58,9 @@ Result<Place> Locate(const std::string& path) {
 
 Result<struct stat> ReadStatus(const Place& place) {
   struct stat status;
-  if (::fstatat(place.folder.Get(), place.name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0)
+  const int folder = place.folder.Get();
+  const char* name = place.name.c_str();
+  if (Retry([&] { return ::fstatat(folder, name, &status, AT_SYMLINK_NOFOLLOW); }) != 0)
     return LastError();
   if (place.folderMeant && !S_ISDIR(status.st_mode)) return kNoSuchItem;
   return status;

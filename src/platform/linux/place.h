@@ -29,6 +29,11 @@ Result<Place> Locate(const std::string& path);
 /// The record of the item itself. kNoSuchItem where a folder was meant and something else is.
 Result<struct stat> ReadStatus(const Place& place);
 
+/// Opens what ought to be a file, but may have become a pipe or a device, without waiting for its
+/// other end. A file that is leased to a file server is waited for, as every program does. Nothing,
+/// and errno, when it fails.
+UniqueFd OpenFile(int folder, const char* name, int flags);
+
 /// Which file or folder it is, for as long as somebody holds it open.
 struct Identity {
   dev_t device = 0;
