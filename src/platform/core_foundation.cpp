@@ -27,8 +27,6 @@ auto NullWithoutMemory(Make make) noexcept -> decltype(make()) try {
   return nullptr;
 }
 
-}  // namespace
-
 /// What every object begins with, so that CFRetain and CFRelease need not know which it is.
 struct CFObject {
   CFObject() = default;
@@ -38,6 +36,8 @@ struct CFObject {
 
   mutable std::atomic<CFIndex> owners{1};
 };
+
+}  // namespace
 
 struct __CFString final : CFObject {
   explicit __CFString(std::u16string content) : text(std::move(content)) {}

@@ -239,19 +239,17 @@ std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
 // where the sanitizers are told so.
 __attribute__((no_sanitize("address", "thread"))) std::size_t Utf16Length(
     const unsigned short* text) {
-  const auto address = reinterpret_cast<std::uintptr_t>(text);
-  const auto* block = reinterpret_cast<const __m128i*>(address & ~std::uintptr_t{15});
-  unsigned before = 0xFFFFU << (address & 15);  // Drops what the first block has before the text.
-  while (true) {
+  const auto before = reinterpret_cast<std::uintptr_t>(text) % sizeof(__m128i);
+  const auto* block =
+      reinterpret_cast<const __m128i*>(reinterpret_cast<const char*>(text) - before);
+  unsigned inText = 0xFFFFU << before;  // Drops what the first block has before the text.
+  for (std::size_t at = 0;; at += sizeof *block, ++block) {
     const __m128i zeros = _mm_cmpeq_epi16(*block, _mm_setzero_si128());
-    const unsigned found = static_cast<unsigned>(_mm_movemask_epi8(zeros)) & before;
+    const unsigned found = static_cast<unsigned>(_mm_movemask_epi8(zeros)) & inText;
     if (found != 0) {
-      const auto end =
-          reinterpret_cast<std::uintptr_t>(block) + static_cast<unsigned>(std::countr_zero(found));
-      return (end - address) / sizeof *text;
+      return (at + static_cast<std::size_t>(std::countr_zero(found)) - before) / sizeof *text;
     }
-    before = 0xFFFF;
-    ++block;
+    inText = 0xFFFF;
   }
 }
 

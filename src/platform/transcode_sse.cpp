@@ -642,7 +642,7 @@ ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
       continue;
     }
     const Pairs pairs = PairsIn(units);
-    const unsigned cut = CutPair(text);
+    const std::size_t cut = CutPair(text);
     if (pairs.AreWhole()) {
       out = StoreUnits(out, units, pairs) - 2 * cut;
     } else {

@@ -25,7 +25,7 @@ struct StringAccess {
   /// Reads as a pointer accessor does: a string without value gets one without text. The scan is
   /// made once for each value and kept.
   static Utf8Text Read(const COrbStringData& s);
-  static Utf8Text Read(COrbStringData::COrbStringValue& value);
+  static Utf8Text Read(const COrbStringData::COrbStringValue& value);
   /// A new value from bytes that need no terminating zero, with one allocation. They must not hold
   /// a zero byte.
   static COrbStringData FromUtf8(std::string_view text);

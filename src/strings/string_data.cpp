@@ -47,6 +47,22 @@ class Held {
   const COrbCriticalSection& lock_;
 };
 
+/// Stores the first text that a value is given; later ones are ignored.
+template <typename Store>
+OrbResult InitOnce(const void* text,
+                   const COrbCriticalSection& lock,
+                   std::atomic<std::uint32_t>& master,
+                   Master encoding,
+                   Store store) {
+  if (text == nullptr) return kOrbErrUnknown;
+  if (master != kNone) return kOrbNoErr;
+  const Held held(lock);
+  if (master != kNone) return kOrbNoErr;
+  store();
+  master = encoding;
+  return kOrbNoErr;
+}
+
 /// A text on its way to being stored; `text` is null when there was no memory.
 template <typename Unit>
 struct Copy {
@@ -73,7 +89,7 @@ Copy<unsigned short> Duplicate(const unsigned short* text, std::size_t length) {
 /// learns to keep them only when they are freed as large as they were asked for, and would map the
 /// next one anew.
 char* Shrunk(char* buffer, std::size_t size, std::size_t before) {
-  constexpr std::size_t kLarge = 64 * 1024;
+  constexpr std::size_t kLarge = std::size_t{64} * 1024;
   void* exact = before < kLarge ? std::realloc(buffer, size) : std::malloc(size);
   if (exact == nullptr) return buffer;
   if (before >= kLarge) {
@@ -179,74 +195,62 @@ void COrbStringData::COrbStringValue::Clear() {
   scan = 0;
 }
 
-const char* COrbStringData::COrbStringValue::StoreSystem(char* text, std::size_t length) {
+const char* COrbStringData::COrbStringValue::StoreSystem(char* text, std::size_t length) const {
   systemLength = length;
   systemText.store(text, std::memory_order_release);
   return text;
 }
 
-const char* COrbStringData::COrbStringValue::StoreUtf8(char* text, std::size_t length) {
+const char* COrbStringData::COrbStringValue::StoreUtf8(char* text, std::size_t length) const {
   utf8Length = length;
   utf8Text.store(text, std::memory_order_release);
   return text;
 }
 
 const unsigned short* COrbStringData::COrbStringValue::StoreUnicode(unsigned short* text,
-                                                                    std::size_t length) {
+                                                                    std::size_t length) const {
   unicodeLength = length;
   unicodeText.store(text, std::memory_order_release);
   return text;
 }
 
 OrbResult COrbStringData::COrbStringValue::InitWithSystemEncoding(const char* text) {
-  if (text == nullptr) return kOrbErrUnknown;
-  if (master != kNone) return kOrbNoErr;
-  const Held held(lock);
-  if (master != kNone) return kOrbNoErr;
-  const Copy<char> copy = Duplicate(text);
-  StoreSystem(copy.text, copy.length);
-  master = kSystem;
-  return kOrbNoErr;
+  return InitOnce(text, lock, master, kSystem, [&] {
+    const Copy<char> copy = Duplicate(text);
+    StoreSystem(copy.text, copy.length);
+  });
 }
 
 OrbResult COrbStringData::COrbStringValue::InitWithUtf8(const char* text) {
-  if (text == nullptr) return kOrbErrUnknown;
-  if (master != kNone) return kOrbNoErr;
-  const Held held(lock);
-  if (master != kNone) return kOrbNoErr;
-  const Copy<char> copy = Duplicate(text);
-  StoreUtf8(copy.text, copy.length);
-  master = kUtf8;
-  return kOrbNoErr;
+  return InitOnce(text, lock, master, kUtf8, [&] {
+    const Copy<char> copy = Duplicate(text);
+    StoreUtf8(copy.text, copy.length);
+  });
 }
 
 OrbResult COrbStringData::COrbStringValue::InitWithUnicode(const unsigned short* text) {
-  if (text == nullptr) return kOrbErrUnknown;
-  if (master != kNone) return kOrbNoErr;
-  const Held held(lock);
-  if (master != kNone) return kOrbNoErr;
-  const Copy<unsigned short> copy = Duplicate(text, Utf16Length(text));
-  StoreUnicode(copy.text, copy.length);
-  master = kUnicode;
-  return kOrbNoErr;
+  return InitOnce(text, lock, master, kUnicode, [&] {
+    const Copy<unsigned short> copy = Duplicate(text, Utf16Length(text));
+    StoreUnicode(copy.text, copy.length);
+  });
 }
 
-const char* COrbStringData::COrbStringValue::GetPtrSystemEncoding() {
+const char* COrbStringData::COrbStringValue::GetPtrSystemEncoding() const {
   const char* made = systemText.load(std::memory_order_acquire);
   return made != nullptr ? made : DeriveSystem();
 }
 
-const char* COrbStringData::COrbStringValue::GetPtrUtf8() {
+const char* COrbStringData::COrbStringValue::GetPtrUtf8() const {
   const char* made = utf8Text.load(std::memory_order_acquire);
   return made != nullptr ? made : DeriveUtf8();
 }
 
-const unsigned short* COrbStringData::COrbStringValue::GetPtrUnicode() {
+const unsigned short* COrbStringData::COrbStringValue::GetPtrUnicode() const {
   const unsigned short* made = unicodeText.load(std::memory_order_acquire);
   return made != nullptr ? made : DeriveUnicode();
 }
 
-const char* COrbStringData::COrbStringValue::DeriveUtf8() {
+const char* COrbStringData::COrbStringValue::DeriveUtf8() const {
   const Held held(lock);
   if (const char* made = utf8Text.load(std::memory_order_acquire)) return made;
   Copy<char> copy{};
@@ -267,7 +271,7 @@ const char* COrbStringData::COrbStringValue::DeriveUtf8() {
   return StoreUtf8(copy.text, copy.length);
 }
 
-const char* COrbStringData::COrbStringValue::DeriveSystem() {
+const char* COrbStringData::COrbStringValue::DeriveSystem() const {
   const Held held(lock);
   if (const char* made = systemText.load(std::memory_order_acquire)) return made;
   Copy<char> copy{};
@@ -282,7 +286,7 @@ const char* COrbStringData::COrbStringValue::DeriveSystem() {
   return StoreSystem(copy.text, copy.length);
 }
 
-const unsigned short* COrbStringData::COrbStringValue::DeriveUnicode() {
+const unsigned short* COrbStringData::COrbStringValue::DeriveUnicode() const {
   const Held held(lock);
   if (const unsigned short* made = unicodeText.load(std::memory_order_acquire)) return made;
   Copy<unsigned short> copy{};
@@ -298,19 +302,19 @@ const unsigned short* COrbStringData::COrbStringValue::DeriveUnicode() {
   return StoreUnicode(copy.text, copy.length);
 }
 
-unsigned long COrbStringData::COrbStringValue::GetLengthByteSystemEncoding() {
+unsigned long COrbStringData::COrbStringValue::GetLengthByteSystemEncoding() const {
   return GetPtrSystemEncoding() == nullptr ? 0 : systemLength;
 }
 
-unsigned long COrbStringData::COrbStringValue::GetLengthByteUtf8() {
+unsigned long COrbStringData::COrbStringValue::GetLengthByteUtf8() const {
   return GetPtrUtf8() == nullptr ? 0 : utf8Length;
 }
 
-unsigned long COrbStringData::COrbStringValue::GetLengthByteUnicode() {
+unsigned long COrbStringData::COrbStringValue::GetLengthByteUnicode() const {
   return GetPtrUnicode() == nullptr ? 0 : 2 * unicodeLength;
 }
 
-unsigned long COrbStringData::COrbStringValue::GetLengthChar() {
+unsigned long COrbStringData::COrbStringValue::GetLengthChar() const {
   switch (master.load(std::memory_order_acquire)) {
     case kUnicode:
       return HasValueUnicode() ? unicodeLength : 0;
@@ -335,7 +339,7 @@ bool COrbStringData::COrbStringValue::HasValueUnicode() const {
   return unicodeText.load(std::memory_order_acquire) != nullptr;
 }
 
-bool COrbStringData::COrbStringValue::IsEmpty() {
+bool COrbStringData::COrbStringValue::IsEmpty() const {
   switch (master.load(std::memory_order_acquire)) {
     case kUnicode:
       return !HasValueUnicode() || unicodeLength == 0;
@@ -352,7 +356,7 @@ namespace orb {
 
 Utf8Text StringAccess::Read(const COrbStringData& s) { return Read(*s.EnsureValue()); }
 
-Utf8Text StringAccess::Read(COrbStringData::COrbStringValue& value) {
+Utf8Text StringAccess::Read(const COrbStringData::COrbStringValue& value) {
   const char* bytes = value.GetPtrUtf8();
   if (bytes == nullptr) return {};
   const std::string_view text(bytes, value.utf8Length);
@@ -414,10 +418,13 @@ void COrbStringData::Clear() {
   delete left;
 }
 
-/// The new value is complete before the old one goes, so its text may come from there.
-void COrbStringData::Replace(COrbStringValue* made) {
+// The new value is complete before the old one goes, so its text may come from there.
+OrbResult COrbStringData::Init(std::uint32_t encoding, const void* text, std::size_t length) {
+  const bool isText = text != nullptr;
+  auto* made = isText ? COrbStringValue::Make(encoding, text, length) : new COrbStringValue;
   Clear();
   value = made;
+  return isText ? kOrbNoErr : kOrbErrUnknown;
 }
 
 COrbStringData::COrbStringValue* COrbStringData::EnsureValue() const {
@@ -426,21 +433,15 @@ COrbStringData::COrbStringValue* COrbStringData::EnsureValue() const {
 }
 
 OrbResult COrbStringData::InitWithSystemEncoding(const char* text) {
-  const bool isText = text != nullptr;
-  Replace(isText ? COrbStringValue::Make(kSystem, text, std::strlen(text)) : new COrbStringValue);
-  return isText ? kOrbNoErr : kOrbErrUnknown;
+  return Init(kSystem, text, text == nullptr ? 0 : std::strlen(text));
 }
 
 OrbResult COrbStringData::InitWithUtf8(const char* text) {
-  const bool isText = text != nullptr;
-  Replace(isText ? COrbStringValue::Make(kUtf8, text, std::strlen(text)) : new COrbStringValue);
-  return isText ? kOrbNoErr : kOrbErrUnknown;
+  return Init(kUtf8, text, text == nullptr ? 0 : std::strlen(text));
 }
 
 OrbResult COrbStringData::InitWithUnicode(const unsigned short* text) {
-  const bool isText = text != nullptr;
-  Replace(isText ? COrbStringValue::Make(kUnicode, text, Utf16Length(text)) : new COrbStringValue);
-  return isText ? kOrbNoErr : kOrbErrUnknown;
+  return Init(kUnicode, text, text == nullptr ? 0 : Utf16Length(text));
 }
 
 OrbResult COrbStringData::InitWithChar(const OrbCharSystem& text) {

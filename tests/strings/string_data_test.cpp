@@ -202,8 +202,10 @@ TEST(StringValue, KeepsItsFirstTextUntilCleared) {
   EXPECT_EQ(value.InitWithUtf8("second"), 0U);
   EXPECT_EQ(value.InitWithSystemEncoding("second"), 0U);
   EXPECT_EQ(value.InitWithUnicode(Units(u"second")), 0U);
-  EXPECT_STREQ(value.GetPtrSystemEncoding(), "first");
-  EXPECT_EQ(value.GetLengthByteUnicode(), 10U);
+  const Value& read = value;
+  EXPECT_FALSE(read.HasValueUnicode());
+  EXPECT_STREQ(read.GetPtrSystemEncoding(), "first");
+  EXPECT_EQ(read.GetLengthByteUnicode(), 10U);
   value.Clear();
   EXPECT_FALSE(value.HasValueUtf8() || value.HasValueSystemEncoding() || value.HasValueUnicode());
   EXPECT_EQ(value.InitWithUnicode(Units(u"third")), 0U);

@@ -108,8 +108,8 @@ class ORB_EXPORT COrbStringData {
 
   void Share(const COrbStringData& other);
   void TakePlaceOf(COrbStringData& other) noexcept;
-  void Replace(COrbStringValue* made);
-  COrbStringValue* EnsureValue() const;
+  ORB_LOCAL OrbResult Init(std::uint32_t encoding, const void* text, std::size_t length);
+  ORB_LOCAL COrbStringValue* EnsureValue() const;
 
   // Every owner of one value stands in a chain, changed under the value's lock alone.
   mutable COrbStringData* prev = nullptr;
@@ -118,7 +118,8 @@ class ORB_EXPORT COrbStringData {
 };
 
 /// The text that copies of a string share. A copy once stored never changes until Clear(), so its
-/// pointer is published with release, behind its length, and read without the lock.
+/// pointer is published with release, behind its length, and read without the lock. The accessors
+/// are const and make what they need all the same: the text does not change by it.
 class ORB_EXPORT COrbStringData::COrbStringValue {
  public:
   COrbStringValue() = default;
@@ -137,45 +138,48 @@ class ORB_EXPORT COrbStringData::COrbStringValue {
   OrbResult InitWithUtf8(const char* text);
   OrbResult InitWithUnicode(const unsigned short* text);
 
-  const char* GetPtrSystemEncoding();
-  const char* GetPtrUtf8();
-  const unsigned short* GetPtrUnicode();
-  unsigned long GetLengthByteSystemEncoding();
-  unsigned long GetLengthByteUtf8();
-  unsigned long GetLengthByteUnicode();
-  unsigned long GetLengthChar();
+  const char* GetPtrSystemEncoding() const;
+  const char* GetPtrUtf8() const;
+  const unsigned short* GetPtrUnicode() const;
+  unsigned long GetLengthByteSystemEncoding() const;
+  unsigned long GetLengthByteUtf8() const;
+  unsigned long GetLengthByteUnicode() const;
+  unsigned long GetLengthChar() const;
   bool HasValueSystemEncoding() const;
   bool HasValueUtf8() const;
   bool HasValueUnicode() const;
-  bool IsEmpty();
+  bool IsEmpty() const;
 
  private:
   friend class COrbStringData;
   friend struct orb::StringAccess;
 
-  static COrbStringValue* Make(std::uint32_t encoding, const void* text, std::size_t length);
-
-  const char* StoreSystem(char* text, std::size_t length);
-  const char* StoreUtf8(char* text, std::size_t length);
-  const unsigned short* StoreUnicode(unsigned short* text, std::size_t length);
-  const char* DeriveSystem();
-  const char* DeriveUtf8();
-  const unsigned short* DeriveUnicode();
+  ORB_LOCAL static COrbStringValue* Make(std::uint32_t encoding,
+                                         const void* text,
+                                         std::size_t length);
+  ORB_LOCAL const char* StoreSystem(char* text, std::size_t length) const;
+  ORB_LOCAL const char* StoreUtf8(char* text, std::size_t length) const;
+  ORB_LOCAL const unsigned short* StoreUnicode(unsigned short* text, std::size_t length) const;
+  ORB_LOCAL const char* DeriveSystem() const;
+  ORB_LOCAL const char* DeriveUtf8() const;
+  ORB_LOCAL const unsigned short* DeriveUnicode() const;
 
   COrbCriticalSection lock;
-  std::atomic<std::uint32_t> master{0};
-  // Whether the value ever had a second owner. Set under the lock by the one that made the second;
-  // read without it by owners, who all came to be after that. False therefore means: mine alone.
+  mutable std::atomic<std::uint32_t> master{0};
+  // Whether the value ever had a second owner; false means that the one who asks is alone. Relaxed
+  // is enough: an owner that a copy made has set it itself, and one that was copied from is neither
+  // moved nor cleared before its caller knows that the copying is done.
   std::atomic<bool> shared{false};
   std::uint8_t inBlock = 0;  // The encoding whose copy lies behind the value; 0 for none.
-  std::atomic<char*> systemText{nullptr};
-  std::atomic<char*> utf8Text{nullptr};
-  std::atomic<unsigned short*> unicodeText{nullptr};
+  mutable std::atomic<char*> systemText{nullptr};
+  mutable std::atomic<char*> utf8Text{nullptr};
+  mutable std::atomic<unsigned short*> unicodeText{nullptr};
   // In units of each copy, set before its pointer.
-  std::size_t systemLength = 0;
-  std::size_t utf8Length = 0;
-  std::size_t unicodeLength = 0;
-  std::atomic<std::uint64_t> scan{0};  // What a scan of the UTF-8 text found, packed; 0 before it.
+  mutable std::size_t systemLength = 0;
+  mutable std::size_t utf8Length = 0;
+  mutable std::size_t unicodeLength = 0;
+  // What a scan of the UTF-8 text found, packed; 0 before it.
+  mutable std::atomic<std::uint64_t> scan{0};
 };
 
 // Strings are passed by value everywhere: what happens then stands here, so that no call is spent
