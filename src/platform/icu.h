@@ -22,14 +22,19 @@ namespace orb::platform {
 
 /// The functions of ICU that the library uses, under ICU's names.
 struct IcuFunctions {
-#define ORB_ICU_MEMBER(name) decltype(&::name) name;
+#define ORB_ICU_MEMBER(name) decltype(&::name) name;  // NOLINT(bugprone-macro-parentheses): a name
   ORB_ICU_FUNCTIONS(ORB_ICU_MEMBER)
 #undef ORB_ICU_MEMBER
 };
 
 /// Loads libicuuc on the first call, from any thread. Linked in the ordinary way it would cost
-/// every program a third of its start, and most never meet a text that needs it. Where the library
-/// is missing the program ends, as it would have at its start.
+/// every program a third of its start, and most never meet a text that needs it.
+///
+/// Where it cannot be loaded, as in a process that has no descriptor free, functions that know
+/// ASCII alone stand in, and a call a second later or more tries again.
 const IcuFunctions& Icu();
+
+/// Whether Icu() gives the real functions, so that what they say may be kept.
+bool IsIcuLoaded();
 
 }  // namespace orb::platform

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "platform/transcode.h"
 
-
 #include <algorithm>
 #include <array>
 #include <bit>
@@ -126,11 +125,11 @@ std::u16string Composed(std::u16string_view text) {
   std::u16string out(text.size() + 16, u'\0');
   const auto normalize = [&] {
     return Icu().unorm2_normalize(nfc,
-                            text.data(),
-                            static_cast<std::int32_t>(text.size()),
-                            out.data(),
-                            static_cast<std::int32_t>(out.size()),
-                            &status);
+                                  text.data(),
+                                  static_cast<std::int32_t>(text.size()),
+                                  out.data(),
+                                  static_cast<std::int32_t>(out.size()),
+                                  &status);
   };
   std::int32_t length = normalize();
   if (status == U_BUFFER_OVERFLOW_ERROR) {

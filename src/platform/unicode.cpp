@@ -61,8 +61,8 @@ void AppendFolded(std::u16string& out, char32_t c) {
   std::u16string self;
   Append(self, c);
   UErrorCode status = U_ZERO_ERROR;
-  const std::int32_t length =
-      Icu().u_strFoldCase(units.data(), kLongest, self.data(), Size(self), U_FOLD_CASE_DEFAULT, &status);
+  const std::int32_t length = Icu().u_strFoldCase(
+      units.data(), kLongest, self.data(), Size(self), U_FOLD_CASE_DEFAULT, &status);
   if (U_FAILURE(status)) return Append(out, c);
   out.append(units.data(), static_cast<std::size_t>(length));
 }
@@ -153,7 +153,7 @@ namespace detail {
 constinit std::array<CharPages, kFormCount> charPages{};
 
 CharForm LookUp(Form form, char32_t c) {
-  if (c >= kPagedEnd) return Made(form, c);
+  if (c >= kPagedEnd || !IsIcuLoaded()) return Made(form, c);
   auto page = std::make_unique<CharPage>();
   const char32_t first = c & ~char32_t{0xFF};
   for (char32_t i = 0; i < page->size(); ++i) (*page)[i] = Made(form, first + i);
@@ -161,7 +161,7 @@ CharForm LookUp(Form form, char32_t c) {
   const CharPage* none = nullptr;
   auto& slot = charPages[static_cast<std::size_t>(form)][c >> 8];
   if (slot.compare_exchange_strong(none, page.get(), std::memory_order_acq_rel)) {
-    page.release();  // Kept until the process ends; others may be reading it.
+    (void)page.release();  // Kept until the process ends; others may be reading it.
   }
   return found;
 }

@@ -51,6 +51,7 @@ class Pieces {
   Pieces(const Utf8Text& text, const Utf8Text& separator);
   Pieces(const Pieces&) = delete;
   Pieces& operator=(const Pieces&) = delete;
+  ~Pieces() = default;
 
   const std::vector<std::string_view>& Views() const { return views_; }
 

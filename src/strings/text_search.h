@@ -230,6 +230,7 @@ class EquivalenceSearch {
   EquivalenceSearch(std::string_view needle, platform::Form form);
   EquivalenceSearch(const EquivalenceSearch&) = delete;
   EquivalenceSearch& operator=(const EquivalenceSearch&) = delete;
+  ~EquivalenceSearch() = default;
 
   /// The first match, or kNotFound.
   std::size_t Find(std::string_view text);

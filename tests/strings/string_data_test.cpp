@@ -3,6 +3,7 @@
 #include <orb/strings/string_data.h>
 #include <sys/resource.h>
 
+#include <algorithm>
 #include <array>
 #include <atomic>
 #include <string>
@@ -170,6 +171,24 @@ TEST(StringData, CopiesShareOneValueAndKeepIt) {
   EXPECT_TRUE(HasNoValue(b));
 }
 
+TEST(StringData, OwnersMayLetGoInAnyOrder) {
+  std::array<int, 4> order = {0, 1, 2, 3};
+  do {
+    std::array<COrbStringData, 4> owners;
+    owners[0] = S("text");
+    owners[1] = owners[0];
+    owners[2] = owners[0];
+    COrbStringData moved(owners[1]);
+    owners[3] = std::move(moved);
+    for (std::size_t i = 0; i < order.size(); ++i) {
+      COrbStringData& leaving = owners[static_cast<std::size_t>(order[i])];
+      EXPECT_STREQ(leaving.GetPtrUtf8(), "text");
+      leaving.Clear();
+      EXPECT_TRUE(HasNoValue(leaving));
+    }
+  } while (std::next_permutation(order.begin(), order.end()));
+}
+
 TEST(StringData, MovesTakeThePlaceOfTheirSource) {
   for (const int owners : {1, 2, 3}) {
     COrbStringData source = S("text");
@@ -181,6 +200,23 @@ TEST(StringData, MovesTakeThePlaceOfTheirSource) {
     others.clear();
     EXPECT_STREQ(source.GetPtrUtf8(), "text");
   }
+}
+
+TEST(CharTypes, HandTheirPointerOnAndSayTheirEncoding) {
+  const char* bytes = "\x8E";
+  const wchar_t* wide = L"";
+  EXPECT_EQ(static_cast<const wchar_t*>(OrbCharUnicode(wide)), wide);
+  EXPECT_EQ(static_cast<const unsigned short*>(OrbCharUnicode(wide)),
+            reinterpret_cast<const unsigned short*>(wide));
+  EXPECT_EQ(static_cast<const char*>(OrbCharUtf8(OrbCharPlatform(OrbCharUtf8(bytes)))), bytes);
+  COrbStringData text;
+  EXPECT_EQ(text.InitWithChar(OrbCharSystem(bytes)), 0U);
+  EXPECT_EQ(Text(text), "\xC3\xA9");
+  EXPECT_EQ(text.InitWithChar(text.GetCharUnicode()), 0U);
+  EXPECT_EQ(text.InitWithChar(text.GetCharPlatform()), 0U);
+  EXPECT_EQ(text.GetLengthChar(), 1U);
+  text = OrbCharUtf8(bytes);  // The same byte is no UTF-8.
+  EXPECT_EQ(text.GetLengthChar(), 0U);
 }
 
 TEST(StringData, MayBeInitialisedFromItsOwnText) {
