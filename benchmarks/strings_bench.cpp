@@ -1,11 +1,14 @@
 // SPDX-License-Identifier: MIT
 #include <benchmark/benchmark.h>
+#include <malloc.h>
 #include <orb/strings/string_data.h>
 #include <pthread.h>
 #include <unicode/ustring.h>
 
+#include <algorithm>
+#include <cstdint>
 #include <cstdlib>
-#include <cstring>
+#include <ctime>
 #include <memory>
 #include <string>
 #include <thread>
@@ -162,8 +165,77 @@ void SetBytes(benchmark::State& state, const std::string& text) {
   state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(text.size()));
 }
 
-/// With a value made and ended, and the UTF-16 copy's double room; the bare rows only convert.
-void ToUnicodeOrb(benchmark::State& state) {
+// Each direction is timed in three ways:
+//   Derive: the other encoding of a text that is there, asked for the first time. The texts are
+//           made before and end afterwards; the peers' results too.
+//   Road:   the text made in one encoding, the other one asked for, and all of it ended.
+//   Bare:   the conversion alone, into a buffer.
+// The UTF-16 copy is to have twice the room of its units, all zero behind them: Zeroed only asks
+// for that memory, as the least that Derive and Road can cost.
+
+std::int64_t ThreadNanoseconds() {
+  timespec now{};
+  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &now);
+  return std::int64_t{now.tv_sec} * 1'000'000'000 + now.tv_nsec;
+}
+
+/// An iteration is a whole batch, so that looking at the clock costs nothing; compare the rates.
+template <typename Make, typename Convert>
+void Derive(benchmark::State& state, Make make, Convert convert) {
+  const std::size_t batch =
+      std::max<std::size_t>(4, (std::size_t{1} << 18) / static_cast<std::size_t>(state.range(1)));
+  std::vector<decltype(make())> texts(batch);
+  for (auto _ : state) {
+    for (auto& text : texts) text = make();
+    const std::int64_t start = ThreadNanoseconds();
+    for (auto& text : texts) convert(text);
+    state.SetIterationTime(static_cast<double>(ThreadNanoseconds() - start) * 1e-9);
+  }
+  state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(batch) * state.range(1));
+}
+
+void DeriveUnicodeOrb(benchmark::State& state) {
+  const std::string text = SampleBytes(state);
+  Derive(
+      state,
+      [&] { return COrbStringData(OrbCharUtf8(text.c_str())); },
+      [](const COrbStringData& made) { benchmark::DoNotOptimize(made.GetPtrUnicode()); });
+}
+
+/// Of a text whose length is known already.
+void DeriveScannedUnicodeOrb(benchmark::State& state) {
+  const std::string text = SampleBytes(state);
+  const auto make = [&] {
+    COrbStringData made{OrbCharUtf8(text.c_str())};
+    benchmark::DoNotOptimize(made.GetLengthChar());
+    return made;
+  };
+  Derive(state, make, [](const COrbStringData& made) {
+    benchmark::DoNotOptimize(made.GetPtrUnicode());
+  });
+}
+
+void DeriveUtf8Orb(benchmark::State& state) {
+  const std::u16string units = SampleUnits(state);
+  const OrbCharUnicode from(reinterpret_cast<const unsigned short*>(units.c_str()));
+  Derive(
+      state,
+      [&] { return COrbStringData(from); },
+      [](const COrbStringData& made) { benchmark::DoNotOptimize(made.GetPtrUtf8()); });
+}
+
+void ZeroedUnicode(benchmark::State& state) {
+  const std::string text = SampleBytes(state);
+  const std::size_t units = SampleUnits(state).size();
+  for (auto _ : state) {
+    void* block = std::calloc(units + 1, 4);
+    benchmark::DoNotOptimize(block);
+    std::free(block);
+  }
+  SetBytes(state, text);
+}
+
+void RoadUnicodeOrb(benchmark::State& state) {
   const std::string text = SampleBytes(state);
   for (auto _ : state) {
     COrbStringData made{OrbCharUtf8(text.c_str())};
@@ -172,7 +244,7 @@ void ToUnicodeOrb(benchmark::State& state) {
   SetBytes(state, text);
 }
 
-void ToUnicodeBare(benchmark::State& state) {
+void BareUnicodeOrb(benchmark::State& state) {
   const std::string text = SampleBytes(state);
   std::u16string out(text.size() + orb::platform::kSlack, u'\0');
   for (auto _ : state) {
@@ -182,7 +254,7 @@ void ToUnicodeBare(benchmark::State& state) {
   SetBytes(state, text);
 }
 
-void ToUnicodeIcu(benchmark::State& state) {
+void BareUnicodeIcu(benchmark::State& state) {
   const std::string text = SampleBytes(state);
   std::u16string out(text.size() + 1, u'\0');
   for (auto _ : state) {
@@ -200,7 +272,7 @@ void ToUnicodeIcu(benchmark::State& state) {
   SetBytes(state, text);
 }
 
-void ToUtf8Orb(benchmark::State& state) {
+void RoadUtf8Orb(benchmark::State& state) {
   const std::string text = SampleBytes(state);
   const std::u16string units = SampleUnits(state);
   const OrbCharUnicode from(reinterpret_cast<const unsigned short*>(units.c_str()));
@@ -211,7 +283,7 @@ void ToUtf8Orb(benchmark::State& state) {
   SetBytes(state, text);
 }
 
-void ToUtf8Bare(benchmark::State& state) {
+void BareUtf8Orb(benchmark::State& state) {
   const std::string text = SampleBytes(state);
   const std::u16string units = SampleUnits(state);
   std::string out(3 * units.size() + orb::platform::kSlack, '\0');
@@ -222,7 +294,7 @@ void ToUtf8Bare(benchmark::State& state) {
   SetBytes(state, text);
 }
 
-void ToUtf8Icu(benchmark::State& state) {
+void BareUtf8Icu(benchmark::State& state) {
   const std::string text = SampleBytes(state);
   const std::u16string units = SampleUnits(state);
   std::string out(3 * units.size() + 1, '\0');
@@ -259,7 +331,23 @@ void MakeQt(benchmark::State& state) {
   }
 }
 
-void ToUnicodeQt(benchmark::State& state) {
+void DeriveUnicodeQt(benchmark::State& state) {
+  const std::string text = SampleBytes(state);
+  Derive(
+      state,
+      [] { return QString(); },
+      [&](QString& made) {
+        made = QString::fromUtf8(text.data(), static_cast<qsizetype>(text.size()));
+      });
+}
+
+void DeriveUtf8Qt(benchmark::State& state) {
+  const QString units = QString::fromStdString(SampleBytes(state));
+  Derive(
+      state, [] { return QByteArray(); }, [&](QByteArray& made) { made = units.toUtf8(); });
+}
+
+void RoadUnicodeQt(benchmark::State& state) {
   const std::string text = SampleBytes(state);
   for (auto _ : state) {
     QString made = QString::fromUtf8(text.data(), static_cast<qsizetype>(text.size()));
@@ -268,7 +356,7 @@ void ToUnicodeQt(benchmark::State& state) {
   SetBytes(state, text);
 }
 
-void ToUtf8Qt(benchmark::State& state) {
+void RoadUtf8Qt(benchmark::State& state) {
   const std::string text = SampleBytes(state);
   const QString units = QString::fromStdString(text);
   for (auto _ : state) {
@@ -315,17 +403,30 @@ BENCHMARK(GrowOrb);
 BENCHMARK(GrowStd);
 ORB_ROWS(ORB_IDLE)
 ORB_ROWS(ORB_TWO)
-BENCHMARK(ToUnicodeOrb)->Apply(KindsAndSizes);
-BENCHMARK(ToUnicodeBare)->Apply(KindsAndSizes);
-BENCHMARK(ToUnicodeIcu)->Apply(KindsAndSizes);
-BENCHMARK(ToUtf8Orb)->Apply(KindsAndSizes);
-BENCHMARK(ToUtf8Bare)->Apply(KindsAndSizes);
-BENCHMARK(ToUtf8Icu)->Apply(KindsAndSizes);
+BENCHMARK(ZeroedUnicode)->Apply(KindsAndSizes);
+BENCHMARK(DeriveUnicodeOrb)->Apply(KindsAndSizes)->UseManualTime();
+BENCHMARK(DeriveScannedUnicodeOrb)->Apply(KindsAndSizes)->UseManualTime();
+BENCHMARK(RoadUnicodeOrb)->Apply(KindsAndSizes);
+BENCHMARK(BareUnicodeOrb)->Apply(KindsAndSizes);
+BENCHMARK(BareUnicodeIcu)->Apply(KindsAndSizes);
+BENCHMARK(DeriveUtf8Orb)->Apply(KindsAndSizes)->UseManualTime();
+BENCHMARK(RoadUtf8Orb)->Apply(KindsAndSizes);
+BENCHMARK(BareUtf8Orb)->Apply(KindsAndSizes);
+BENCHMARK(BareUtf8Icu)->Apply(KindsAndSizes);
 #ifdef ORB_BENCH_QT
-BENCHMARK(ToUnicodeQt)->Apply(KindsAndSizes);
-BENCHMARK(ToUtf8Qt)->Apply(KindsAndSizes);
+BENCHMARK(DeriveUnicodeQt)->Apply(KindsAndSizes)->UseManualTime();
+BENCHMARK(RoadUnicodeQt)->Apply(KindsAndSizes);
+BENCHMARK(DeriveUtf8Qt)->Apply(KindsAndSizes)->UseManualTime();
+BENCHMARK(RoadUtf8Qt)->Apply(KindsAndSizes);
 #endif
 
 }  // namespace
 
-BENCHMARK_MAIN();
+int main(int count, char** arguments) {
+  // Memory that is freed stays with the process, so that no row is charged for the kernel clearing
+  // the same pages again in every round.
+  mallopt(M_TRIM_THRESHOLD, 1 << 30);
+  mallopt(M_MMAP_THRESHOLD, 1 << 30);
+  benchmark::Initialize(&count, arguments);
+  benchmark::RunSpecifiedBenchmarks();
+}

@@ -3,6 +3,8 @@
 
 #include <orb/strings/string_data.h>
 
+#include <atomic>
+#include <cstdint>
 #include <string_view>
 
 #include "strings/text_scan.h"
@@ -24,11 +26,23 @@ struct Utf8Text {
 struct StringAccess {
   /// Reads as a pointer accessor does: a string without value gets one without text. The scan is
   /// made once for each value and kept.
-  static Utf8Text Read(const COrbStringData& s);
-  static Utf8Text Read(const COrbStringData::COrbStringValue& value);
+  static Utf8Text Read(const COrbStringData& s) {
+    if (s.value == nullptr) GiveValue(s);
+    return Read(*s.value);
+  }
+  static Utf8Text Read(const COrbStringData::COrbStringValue& value) {
+    if (value.scan.load(std::memory_order_relaxed) == 0) Scan(value);
+    const TextScan scan = TextScan::Unpack(value.scan.load(std::memory_order_acquire));
+    return {{value.utf8Text.load(std::memory_order_relaxed), value.utf8Length}, scan};
+  }
   /// A new value from bytes that need no terminating zero, with one allocation. They must not hold
   /// a zero byte.
   static COrbStringData FromUtf8(std::string_view text);
+
+ private:
+  static void GiveValue(const COrbStringData& s);
+  /// Leaves an empty text when there is no memory for the UTF-8 copy.
+  static void Scan(const COrbStringData::COrbStringValue& value);
 };
 
 }  // namespace orb

@@ -28,6 +28,7 @@ enum Master : std::uint32_t { kNone = 0, kSystem = 1, kUtf8 = 2, kUnicode = 3 };
 
 /// Up to here a text is converted on the stack and then copied at its size.
 constexpr std::size_t kShort = 256;
+constexpr std::size_t kMostOnStack = 3 * 1024;
 
 /// Null without memory.
 void* BlockFor(std::size_t size) noexcept try {
@@ -102,8 +103,8 @@ char* Shrunk(char* buffer, std::size_t size, std::size_t before) {
 /// `most` bounds what `write` writes, without its slack; it returns the length.
 template <typename Write>
 Copy<char> Written(std::size_t most, Write write) {
-  if (most <= 3 * kShort) {
-    std::array<char, 3 * kShort + kSlack> buffer;
+  if (most <= kMostOnStack) {
+    std::array<char, kMostOnStack + kSlack> buffer;
     return Duplicate({buffer.data(), write(buffer.data())});
   }
   auto* made = static_cast<char*>(std::malloc(most + kSlack));
@@ -354,18 +355,12 @@ bool COrbStringData::COrbStringValue::IsEmpty() const {
 
 namespace orb {
 
-Utf8Text StringAccess::Read(const COrbStringData& s) { return Read(*s.EnsureValue()); }
+void StringAccess::GiveValue(const COrbStringData& s) { s.EnsureValue(); }
 
-Utf8Text StringAccess::Read(const COrbStringData::COrbStringValue& value) {
+void StringAccess::Scan(const COrbStringData::COrbStringValue& value) {
   const char* bytes = value.GetPtrUtf8();
-  if (bytes == nullptr) return {};
-  const std::string_view text(bytes, value.utf8Length);
-  std::uint64_t packed = value.scan.load(std::memory_order_relaxed);
-  if (packed == 0) {
-    packed = ScanUtf8(text).Pack();
-    value.scan.store(packed, std::memory_order_relaxed);
-  }
-  return {text, TextScan::Unpack(packed)};
+  if (bytes == nullptr) return;
+  value.scan.store(ScanUtf8({bytes, value.utf8Length}).Pack(), std::memory_order_release);
 }
 
 COrbStringData StringAccess::FromUtf8(std::string_view text) {

@@ -9,13 +9,13 @@ namespace orb {
 
 /// How much care a text needs when it is searched or compared.
 enum class TextKind : std::uint8_t {
-  /// Not UTF-8: counts as the empty text.
-  kInvalid,
   kAscii,
   /// Every character stands alone and is in composed form, so canonical equivalence is equality.
   kPlain,
   /// Combining marks, or characters with other canonically equivalent forms.
   kComposing,
+  /// Not UTF-8: counts as the empty text.
+  kInvalid,
 };
 
 /// What one pass over a text finds.

@@ -103,6 +103,23 @@ TEST(Comparing, HasItsOwnRuleInEachForm) {
   EXPECT_EQ(OrbStringDataCmpn(S("😀"), S("😁"), 1), 0);  // Both begin with the same half.
 }
 
+TEST(Comparing, SeesADifferenceAtEachPlaceOfEachSize) {
+  for (std::size_t size = 1; size != 70; ++size) {
+    const std::string small(size, 'm');
+    const std::string capital(size, 'M');
+    EXPECT_EQ(OrbStringDataCmpi(S(small), S(capital)), 0) << size;
+    EXPECT_EQ(OrbStringDataCmpi(S(small), S(capital + "x")), -1) << size;
+    for (std::size_t at = 0; at != size; ++at) {
+      std::string other = capital + std::string(at % 3, 'A');  // Longer, with more to differ in.
+      for (std::size_t i = at; i != size; ++i) other[i] = 'a';
+      other[at] = 'N';
+      EXPECT_EQ(OrbStringDataCmpi(S(small), S(other)), -1) << size << " at " << at;
+      other[at] = '[';  // Behind the capitals, before the small letters.
+      EXPECT_EQ(OrbStringDataCmpi(S(small), S(other)), 1) << size << " at " << at;
+    }
+  }
+}
+
 TEST(Splitting, DropsEmptyPiecesAndGivesNothingWithoutASeparator) {
   using Texts = std::vector<std::string>;
   EXPECT_EQ(Pieces(",a,,b,", ","), (Texts{"a", "b"}));

@@ -171,13 +171,14 @@ class ORB_EXPORT COrbStringData::COrbStringValue {
   // moved nor cleared before its caller knows that the copying is done.
   std::atomic<bool> shared{false};
   std::uint8_t inBlock = 0;  // The encoding whose copy lies behind the value; 0 for none.
+  // The length of each copy, in its units, is set before its pointer.
   mutable std::atomic<char*> systemText{nullptr};
-  mutable std::atomic<char*> utf8Text{nullptr};
-  mutable std::atomic<unsigned short*> unicodeText{nullptr};
-  // In units of each copy, set before its pointer.
   mutable std::size_t systemLength = 0;
-  mutable std::size_t utf8Length = 0;
+  mutable std::atomic<unsigned short*> unicodeText{nullptr};
   mutable std::size_t unicodeLength = 0;
+  // What every operation reads stands last, next to a text that lies behind the value.
+  mutable std::atomic<char*> utf8Text{nullptr};
+  mutable std::size_t utf8Length = 0;
   // What a scan of the UTF-8 text found, packed; 0 before it.
   mutable std::atomic<std::uint64_t> scan{0};
 };
