@@ -21,8 +21,8 @@ class FileWriter {
   FileWriter(FileWriter&&) noexcept;
   ~FileWriter();
 
-  /// Writes the whole block, once. A file that has to grow and cannot, because its volume is full,
-  /// stays as it was.
+  /// Writes the whole block and closes the file: once. A file that has to grow and cannot, because
+  /// its volume is full, stays as it was.
   Status Write(std::span<const std::byte> block);
 
  private:

@@ -9,13 +9,13 @@
 
 #include "platform/linux/file_data.h"
 #include "platform/linux/item_metadata.h"
-#include "platform/linux/new_file.h"
 #include "platform/linux/posix.h"
 
 namespace orb::platform {
 namespace {
 
 Status WriteAt(int file, std::size_t offset, std::span<const std::byte> block) {
+  if (block.empty()) return {};
   if (::lseek(file, static_cast<off_t>(offset), SEEK_SET) < 0) return LastError();
   return WriteBlock(file, block);
 }
@@ -54,7 +54,8 @@ Status FileWriter::Write(std::span<const std::byte> block) {
     return grown;
   }
   if (const Status written = WriteAt(file, 0, block.first(inside)); !written) return written;
-  return Flush(file);
+  // Some volumes keep an error back until here.
+  return state_->file.Close() ? Status() : Status(LastError());
 }
 
 }  // namespace orb::platform

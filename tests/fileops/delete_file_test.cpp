@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
 #include <gtest/gtest.h>
-#include <orb/fileinfo/file_handle.h>
 #include <orb/fileops/remove.h>
 
 #include <chrono>
@@ -24,7 +23,7 @@ using Clock = std::chrono::steady_clock;
 TEST(DeleteFile, RemovesWhatIsWritableAndNotLocked) {
   const TempFolder folder;
   folder.Write("locked", "");
-  ASSERT_EQ(COrbFileHandle(PathOf(folder / "locked")).SetAttribute(kOrbFileAttrLocked), 0u);
+  ASSERT_TRUE(Lock(folder / "locked"));
   folder.Write("read-only", "");
   fs::permissions(folder / "read-only", fs::perms(0444));
   folder.Write("file", "");
@@ -84,7 +83,7 @@ TEST(DeleteFile, EndsAListAtTheFirstFailure) {
   };
   for (const char* name : {"a", "locked", "b"}) folder.Write(name, "");
   for (const char* name : {"x/sub", "busy/sub", "y/sub"}) fs::create_directories(folder / name);
-  ASSERT_EQ(COrbFileHandle(PathOf(folder / "locked")).SetAttribute(kOrbFileAttrLocked), 0u);
+  ASSERT_TRUE(Lock(folder / "locked"));
   EXPECT_EQ(OrbDeleteFile({}, true), kOrbNoErr);
   EXPECT_EQ(OrbDeleteFolder({}, false), kOrbNoErr);
   EXPECT_EQ(OrbDeleteFile(paths("a", "locked", "b"), true), kOrbErrAccessDenied);
@@ -103,7 +102,7 @@ TEST(DeleteFolder, AsksNothingAndSaysWhatThePlatformSaid) {
   folder.Write("read-only", "");
   fs::permissions(folder / "read-only", fs::perms(0444));
   folder.Write("locked", "");
-  ASSERT_EQ(COrbFileHandle(PathOf(folder / "locked")).SetAttribute(kOrbFileAttrLocked), 0u);
+  ASSERT_TRUE(Lock(folder / "locked"));
   const struct {
     std::string path;
     OrbResult expected;

@@ -77,13 +77,6 @@ TEST(WholeFile, SaysWhatCannotBeOpened) {
   }
   EXPECT_EQ(ReadAll(folder / "locked"), "photo");
   EXPECT_FALSE(fs::exists(folder / "missing"));
-  fs::permissions(folder.Path(), fs::perms(0755));
-  fs::permissions(folder / "locked", fs::perms(0600));
-  ORB_IN_CHILD(orb::test::RunAsUser(65534, [&] {
-    char letter;
-    EXPECT_EQ(OrbReadFile(PathOf(folder / "locked"), &letter, 1), kOrbErrAccessDenied);
-    EXPECT_EQ(Write(folder / "locked", "x"), kOrbErrAccessDenied);
-  }));
 }
 
 TEST(WriteFile, ThatCannotGrowLeavesTheFileAsItWas) {

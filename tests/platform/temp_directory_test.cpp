@@ -59,9 +59,6 @@ TEST(TemporaryDirectory, IsNotTakenFromOthers) {
   EXPECT_EQ(find(), ChildOutcome::kPassed);
   fs::remove(own);
   fs::create_directory(own);
-  fs::permissions(own, fs::perms(0777));
-  EXPECT_EQ(find(), ChildOutcome::kPassed);
-  fs::permissions(own, fs::perms(0700));
   if (::chown(own.c_str(), 65534, 65534) != 0) GTEST_SKIP() << "only root can give a folder away";
   EXPECT_EQ(find(), ChildOutcome::kPassed);
 }
