@@ -10,6 +10,7 @@
 #include <orb/fileops/access.h>
 #include <orb/fileops/copy.h>
 #include <orb/fileops/create.h>
+#include <orb/fileops/move.h>
 #include <orb/fileops/path_relations.h>
 #include <orb/fileops/progress.h>
 #include <orb/fileops/remove.h>

@@ -3,6 +3,7 @@
 
 #include <orb/fileinfo/file_handle.h>
 #include <orb/fileops/path_relations.h>
+#include <orb/path/path_text.h>
 
 #include <cstdint>
 
@@ -24,30 +25,30 @@ bool IsSubFolder(const std::string& a, const std::string& b) {
   return OrbIsSubFolder(StringAccess::FromUtf8(a), StringAccess::FromUtf8(b));
 }
 
-/// The rule of the texts on the paths without links, which also holds on volumes that are blind to
-/// case, and then the items themselves, for volumes mounted twice.
-platform::Result<bool> IsSameOrAbove(const std::string& destination, const std::string& source) {
+/// The rule of the texts, then the same on the paths without links, which also holds on volumes
+/// that are blind to case.
+platform::Result<bool> IsSameOrAboveByText(const std::string& destination,
+                                           const std::string& source) {
   if (IsSubFolder(destination, source)) return true;
   const auto realDestination = platform::ResolvedPath(destination);
   if (!realDestination) return realDestination.Reason();
   const auto realSource = platform::ResolvedPath(source);
   if (!realSource) return realSource.Reason();
-  if (IsSubFolder(realDestination.Value(), realSource.Value())) return true;
-  return platform::IsItemOrAbove(destination, source);
+  return IsSubFolder(realDestination.Value(), realSource.Value());
 }
 
-}  // namespace
-
-OrbResult ExpectSource(const std::string& source) {
-  const auto record = platform::Items::Current().ReadRecord(source);
-  return record ? kOrbNoErr : OrbMapErrorForFileOperation(record.Reason());
-}
-
-OrbResult RemoveExistingDestination(const std::string& source, const std::string& destination) {
-  const auto forbidden = IsSameOrAbove(destination, source);
-  if (!forbidden) return kOrbErrAccessDenied;  // What cannot be told apart is not removed.
-  if (forbidden.Value()) return kOrbErrInsideSource;
-  return platform::RemoveItem(destination) ? kOrbNoErr : kOrbErrAccessDenied;
+/// Whether removing the destination would take the source, or a part of it, away. Volumes that are
+/// mounted twice show only on disk.
+platform::Result<bool> IsEntangled(const std::string& source,
+                                   const std::string& destination,
+                                   Alike alike) {
+  if (alike == Alike::kByTextToo) {
+    const auto byText = IsSameOrAboveByText(destination, source);
+    if (!byText || byText.Value()) return byText;
+  }
+  const auto above = platform::IsItemOrAbove(destination, source);
+  if (!above || above.Value()) return above;
+  return platform::IsItemOrAbove(source, destination);
 }
 
 bool IsLowOnSpace(const COrbFilePath& folder) {
@@ -56,6 +57,45 @@ bool IsLowOnSpace(const COrbFilePath& folder) {
   if (!path) return false;
   const auto available = platform::Volumes::Current().AvailableCapacity(*path);
   return available && *available < kEnoughSpace;
+}
+
+}  // namespace
+
+OrbResult ExpectCopyable(const std::string& source) {
+  using platform::ItemKind;
+  const auto info = platform::Items::Current().Read(source);
+  if (!info) return OrbMapErrorForFileOperation(info.Reason());
+  const ItemKind kind = info.Value().kind;
+  const bool readable = kind == ItemKind::kLink || info.Value().readable;
+  return readable && kind != ItemKind::kOther ? kOrbNoErr : kOrbErrAccessDenied;
+}
+
+OrbResult ExpectMovable(const std::string& source) {
+  const auto record = platform::Items::Current().ReadRecord(source);
+  if (!record) return OrbMapErrorForFileOperation(record.Reason());
+  return record.Value().locked ? kOrbErrAccessDenied : kOrbNoErr;
+}
+
+OrbResult OrbCheckCopyTarget(const COrbStringData& source, const COrbStringData& destination) {
+  if (OrbPathCompareNoCase(source, destination) == 0) return kOrbErrSamePath;
+  return OrbIsSubFolder(source, destination) ? kOrbErrInsideSource : kOrbNoErr;
+}
+
+OrbResult RemoveExistingDestination(const std::string& source,
+                                    const std::string& destination,
+                                    Alike alike) {
+  if (!platform::Items::Current().Exists(destination)) return kOrbNoErr;
+  const auto entangled = IsEntangled(source, destination, alike);
+  if (!entangled) return kOrbErrAccessDenied;  // What cannot be told apart is not removed.
+  if (entangled.Value()) return kOrbErrInsideSource;
+  return platform::RemoveItem(destination) ? kOrbNoErr : kOrbErrAccessDenied;
+}
+
+OrbResult ConsiderSpace(const Outcome& failed, LowSpace lowSpace, const COrbFilePath& folder) {
+  const bool mayExplain =
+      lowSpace == LowSpace::kAnything || (lowSpace == LowSpace::kUntold && !failed.explained);
+  if (!mayExplain || failed.code == kOrbErrCanceled) return failed.code;
+  return IsLowOnSpace(folder) ? kOrbErrDiskFull : failed.code;
 }
 
 }  // namespace orb

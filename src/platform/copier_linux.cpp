@@ -8,12 +8,12 @@
 #include <utility>
 #include <vector>
 
+#include "platform/linux/copy_at.h"
 #include "platform/linux/file_data.h"
 #include "platform/linux/folder_stream.h"
 #include "platform/linux/item_attributes.h"
 #include "platform/linux/item_metadata.h"
 #include "platform/linux/new_file.h"
-#include "platform/linux/place.h"
 
 namespace orb::platform {
 namespace {
@@ -213,21 +213,21 @@ Status ExpectFree(const Place& destination) {
 
 }  // namespace
 
+Status CopyItemAt(const Place& from, const Place& to) {
+  const auto status = ReadStatus(from);
+  if (!status) return status.Reason();
+  if (Status free = ExpectFree(to); !free) return free;
+  const Step step{from.folder.Get(), from.name.c_str(), to.folder.Get(), to.name.c_str()};
+  const bool isFolder = S_ISDIR(status.Value().st_mode);
+  return isFolder ? CopyFolder(status.Value(), step) : CopyLeaf(status.Value().st_mode, step);
+}
+
 Status CopyItem(const std::string& source, const std::string& destination) {
   const ErrnoKeeper errnoKeeper;
   const auto from = Locate(source);
   if (!from) return from.Reason();
-  const auto status = ReadStatus(from.Value());
-  if (!status) return status.Reason();
   const auto to = Locate(destination);
-  if (!to) return to.Reason();
-  if (Status free = ExpectFree(to.Value()); !free) return free;
-  const Step step{from.Value().folder.Get(),
-                  from.Value().name.c_str(),
-                  to.Value().folder.Get(),
-                  to.Value().name.c_str()};
-  const bool isFolder = S_ISDIR(status.Value().st_mode);
-  return isFolder ? CopyFolder(status.Value(), step) : CopyLeaf(status.Value().st_mode, step);
+  return to ? CopyItemAt(from.Value(), to.Value()) : Status(to.Reason());
 }
 
 }  // namespace orb::platform

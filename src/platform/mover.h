@@ -7,14 +7,19 @@
 
 namespace orb::platform {
 
-/// Moves an item to a path of the same volume where nothing is, in one step: at every moment it is
-/// at one of the two. Links are moved and not followed. A change of an item's own name in nothing
-/// but letters' case works also where the volume takes both for one, in two steps there.
+/// Moves an item to a path where nothing is. Links are moved and not followed. On one volume that
+/// is one step: at every moment the item is at one of the two paths. A change of an item's own name
+/// in nothing but letters' case works also where the volume takes both for one, in two steps there.
+///
+/// To another volume the item is copied, a folder under a hidden name at first, and the source is
+/// removed when the copy is complete, on the device and in its place. A failed copy is taken away
+/// again. If removing the source fails the copy stays. A process that is killed leaves the source
+/// whole, or the copy; it may leave a part of a copied folder under the hidden name.
 ///
 /// kItemExists when anything is at the destination, also a link that leads nowhere. kNotPermitted
-/// for a locked item, in and into a locked folder, and for a source that ends in "." or "..".
-/// POSIX's EXDEV where the destination is on another volume. Whenever it fails the item is where it
-/// was.
+/// for a locked item, in and into a locked folder, for a source that ends in "." or "..", and to
+/// another volume also for a folder that holds a locked item or a volume of its own. Whenever it
+/// fails before the source is removed, the item is where it was.
 Status MoveItem(const std::string& source, const std::string& destination);
 
 }  // namespace orb::platform

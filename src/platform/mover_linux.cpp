@@ -10,6 +10,7 @@
 
 #include "platform/linux/folder_stream.h"
 #include "platform/linux/item_metadata.h"
+#include "platform/linux/move_across.h"
 #include "platform/linux/removal_at.h"
 #include "platform/linux/rename.h"
 #include "platform/transcode.h"
@@ -103,7 +104,9 @@ Status MoveItem(const std::string& source, const std::string& destination) {
   const std::string& newName = to.Value().name;
   const Status moved =
       RenameWithoutReplacing(folder, name.c_str(), to.Value().folder.Get(), newName.c_str());
-  if (moved || moved.Reason() != kItemExists) return moved;
+  if (moved) return moved;
+  if (moved.Reason() == ErrorFromErrno(EXDEV)) return MoveAcross(from.Value(), to.Value());
+  if (moved.Reason() != kItemExists) return moved;
   return IsOtherSpelling(from.Value(), to.Value()) ? ChangeCase(folder, name, newName) : moved;
 }
 

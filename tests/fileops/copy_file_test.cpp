@@ -11,7 +11,7 @@
 #include <optional>
 #include <string>
 
-#include "fileops/copy_worker.h"
+#include "fileops/path_workers.h"
 #include "platform/volumes.h"
 #include "support/faults.h"
 #include "support/paths.h"
@@ -198,7 +198,7 @@ TEST(CopyPath, CallsBeforeAndAfterAlsoWhenTheCopyFails) {
   Progress progress;
   orb::OrbCopyPath worker(folder / "missing", folder / "copy");
   worker.SetProgress(Progress::Call, &progress);
-  EXPECT_EQ(worker.Perform(), kOrbErrNotFound);
+  EXPECT_EQ(worker.Perform().code, kOrbErrNotFound);
   EXPECT_EQ(progress.calls, 2);
 }
 

@@ -2,8 +2,12 @@
 #include "platform/mover.h"
 
 #include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 #include <cerrno>
+#include <csignal>
 #include <cstdlib>
 #include <filesystem>
 #include <set>
@@ -92,8 +96,9 @@ TEST(MoveItem, ChangesTheCaseOfANameOnACard) {
       image + ")" + " && mount.exfat-fuse $loop " + card + " && losetup -d $loop) >/dev/null 2>&1";
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
     if (std::system(mount.c_str()) != 0) ::_exit(orb::test::kImpossibleStatus);
-    EXPECT_EQ(ErrorOf(MoveItem(folder / "image", card + "/image")),
-              (Error{orb::platform::ErrorDomain::kPosix, EXDEV}));
+    EXPECT_EQ(ErrorOf(MoveItem(folder / "image", card + "/image")), orb::platform::kVolumeFull);
+    EXPECT_TRUE(fs::exists(folder / "image"));
+    EXPECT_EQ(NamesIn(card), std::set<std::string>());
     folder.Write("card/img.jpg", "photo");
     folder.Write("card/other.jpg", "other");
     fs::create_directory(card + "/tree");
@@ -105,6 +110,133 @@ TEST(MoveItem, ChangesTheCaseOfANameOnACard) {
     EXPECT_EQ(ReadAll(card + "/IMG.jpg"), "photo");
     EXPECT_EQ(ReadAll(card + "/Tree/new.jpg"), "other");
     ::umount2(card.c_str(), MNT_DETACH);
+  }));
+}
+
+/// Two volumes, and a tree on the first one. For the body of RunWithPrivateMounts.
+void MakeVolumes(const TempFolder& folder) {
+  ASSERT_TRUE(orb::test::MountTmpfs(folder / "a", "size=64m"));
+  ASSERT_TRUE(orb::test::MountTmpfs(folder / "b", "size=64m"));
+  ASSERT_TRUE(orb::test::MountTmpfs(folder / "small", "size=1m"));
+  fs::create_directories(folder / "a/tree/sub/empty");
+  folder.Write("a/tree/100%.jpg", "photo");
+  folder.Write("a/tree/sub/big", std::string(3 << 20, 'b'));
+  fs::create_symlink("nowhere", folder / "a/tree/link");
+  for (const char* name : {"b", "small"}) folder.Write(std::string(name) + "/taken", "old");
+}
+
+TEST(MoveItem, BringsFilesLinksAndTreesToAnotherVolume) {
+  const TempFolder folder;
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    MakeVolumes(folder);
+    const auto before = orb::test::Describe(folder / "a");
+    const int descriptors = orb::test::OpenDescriptors();
+    fs::remove(folder / "b/taken");
+    for (const char* name : {"tree/100%.jpg", "tree/link"}) {
+      const std::string there = folder / "b/" + fs::path(name).filename().string();
+      EXPECT_EQ(ErrorOf(MoveItem(folder / "a/" + name, there)), kDone) << name;
+      EXPECT_FALSE(fs::exists(fs::symlink_status(folder / "a/" + name)));
+      EXPECT_EQ(ErrorOf(MoveItem(there, folder / "a/" + name)), kDone) << name;
+    }
+    const auto tree = orb::test::Describe(folder / "a/tree");
+    EXPECT_EQ(ErrorOf(MoveItem(folder / "a/tree", folder / "b/tree/")), kDone);
+    EXPECT_EQ(orb::test::Describe(folder / "b/tree"), tree);
+    EXPECT_EQ(NamesIn(folder / "b"), std::set<std::string>{"tree"});
+    EXPECT_EQ(NamesIn(folder / "a"), std::set<std::string>());
+    EXPECT_EQ(before.size(), tree.size() + 1);
+    EXPECT_EQ(orb::test::OpenDescriptors(), descriptors);
+  }));
+}
+
+void MakeObstacle(const TempFolder& folder, const std::string& kind) {
+  const std::string path = folder / "a/tree/obstacle";
+  if (kind.empty()) return;
+  if (kind == "pipe") {
+    ASSERT_EQ(::mkfifo(path.c_str(), 0600), 0);
+    return;
+  }
+  folder.Write("a/tree/obstacle", "x");
+  if (kind == "locked") {
+    ASSERT_TRUE(Items::Current().SetLocked(path, true));
+    return;
+  }
+  ASSERT_EQ(::chmod(path.c_str(), 0600), 0);
+  ASSERT_EQ(::chown((folder / "a/tree").c_str(), 65534, 65534), 0);
+}
+
+TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
+  const TempFolder folder;
+  const struct {
+    const char* obstacle;  // What is made in the tree: secret is not to be read.
+    const char* from;
+    const char* to;
+    Error expected;
+  } kCases[] = {
+      {"", "a/tree", "small/tree", orb::platform::kVolumeFull},
+      {"", "a/tree/sub/big", "small/big", orb::platform::kVolumeFull},
+      {"", "a/tree", "small/taken", kItemExists},
+      {"", "a/tree/100%.jpg", "b/taken", kItemExists},
+      {"", "a/tree", "b/missing/tree", kNoSuchItem},
+      {"locked", "a/tree", "b/tree", kNotPermitted},
+      {"locked", "a/tree/obstacle", "b/file", kNotPermitted},
+      {"pipe", "a/tree", "b/tree", kNotPermitted},
+      {"secret", "a/tree", "b/tree", kNotPermitted},
+  };
+  ASSERT_EQ(::chmod(folder.Path().c_str(), 0777), 0);
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(std::string(c.obstacle) + " " + c.from + " to " + c.to);
+    ORB_IN_CHILD(RunWithPrivateMounts([&] {
+      MakeVolumes(folder);
+      MakeObstacle(folder, c.obstacle);
+      const auto before = orb::test::Describe(folder / "a");
+      ASSERT_EQ(::seteuid(*c.obstacle == 's' ? 65534 : 0), 0);
+      EXPECT_EQ(ErrorOf(MoveItem(folder / c.from, folder / c.to)), c.expected);
+      ASSERT_EQ(::seteuid(0), 0);
+      EXPECT_TRUE(orb::test::Describe(folder / "a") == before);
+      EXPECT_EQ(NamesIn(folder / "b"), std::set<std::string>{"taken"});
+      EXPECT_EQ(NamesIn(folder / "small"), std::set<std::string>{"taken"});
+      EXPECT_EQ(ReadAll(folder / "b/taken"), "old");
+    }));
+  }
+}
+
+// Another user's file in a folder with the sticky bit may be read but not taken away.
+TEST(MoveItem, KeepsTheCopyOfASourceThatCannotBeRemoved) {
+  const TempFolder folder;
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    MakeVolumes(folder);
+    folder.Write("a/photo", "photo");
+    ASSERT_EQ(::chmod((folder / "a").c_str(), 01777), 0);
+    ASSERT_EQ(::chmod(folder.Path().c_str(), 0777), 0);
+    ASSERT_EQ(::chmod((folder / "b").c_str(), 0777), 0);
+    ASSERT_EQ(::setresuid(65534, 65534, 65534), 0);
+    EXPECT_EQ(ErrorOf(MoveItem(folder / "a/photo", folder / "b/photo")), kNotPermitted);
+    EXPECT_EQ(ReadAll(folder / "a/photo"), "photo");
+    EXPECT_EQ(ReadAll(folder / "b/photo"), "photo");
+  }));
+}
+
+TEST(MoveItem, LosesNothingWhenItIsKilledOnTheWayToAnotherVolume) {
+  const TempFolder folder;
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    MakeVolumes(folder);
+    for (int i = 0; i < 200; ++i)
+      folder.Write("a/tree/sub/" + std::to_string(i), std::string(50000, 'x'));
+    const auto whole = orb::test::Describe(folder / "a/tree");
+    bool arrived = false;
+    for (int delay = 0; !arrived && delay < 400; ++delay) {
+      SCOPED_TRACE(delay);
+      const pid_t mover = ::fork();
+      if (mover == 0) ::_exit(MoveItem(folder / "a/tree", folder / "b/tree") ? 0 : 1);
+      ::usleep(static_cast<useconds_t>(delay) * 500);
+      ::kill(mover, SIGKILL);
+      ASSERT_EQ(::waitpid(mover, nullptr, 0), mover);
+      arrived = fs::exists(folder / "b/tree");
+      ASSERT_EQ(orb::test::Describe(folder / (arrived ? "b/tree" : "a/tree")), whole);
+      for (const auto& part : fs::directory_iterator(folder / "b"))
+        if (part.path().filename().string().starts_with(".orb-")) fs::remove_all(part);
+    }
+    EXPECT_TRUE(arrived);
   }));
 }
 

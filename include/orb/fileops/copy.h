@@ -7,6 +7,26 @@
 #include <orb/result.h>
 #include <orb/strings/string_data.h>
 
+/// \file
+/// Copies of items, and the joining of a folder and a name. Unless a form says otherwise, it copies
+/// a file, a link (as a link) or a folder with all it holds, with times, mode, attributes and lock,
+/// and an item that is at the destination already makes it fail with kOrbErrUnknown. A copied file
+/// is complete or absent; what the copy of a folder finished before a failure stays.
+///
+/// A form that removes what is at the destination looks at the source first: kOrbErrNotFound, and
+/// nothing is removed, when it is empty or not there; kOrbErrAccessDenied for one that cannot be
+/// read, and for a socket, pipe or device. Nor is anything removed when the destination
+/// is the source, one of its folders or something inside it, by its text or on disk:
+/// kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed; a folder may then have lost
+/// some of its content.
+///
+/// Every form may give kOrbErrAccessDenied for a source that is not valid UTF-8, and forms that
+/// take a folder and a name kOrbErrInvalidName for a name that is empty, "." or ".." and
+/// kOrbErrEmptyPath for an empty folder. `name` is null for the source's own where it is a pointer.
+/// `result` may be null; it receives the destination on success alone. All other failures have the
+/// codes kOrbErrNotFound, kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrOutOfMemory and
+/// kOrbErrUnknown.
+
 /// Joins a folder and a name with exactly one "/"; a name joined to an empty folder is the name
 /// alone. kOrbErrInvalidName for a text that is not UTF-8, kOrbErrNameTooLong when the joined text
 /// has 1024 UTF-16 units or more or the name 256, then kOrbErrNotFound for a null `result`;
@@ -20,6 +40,15 @@ ORB_EXPORT OrbResult OrbMakeFilePath(const COrbStringData& folder,
 ORB_EXPORT OrbResult OrbMakeFilePath(const COrbFilePath& folder,
                                      const COrbStringData& name,
                                      COrbFilePath* result);
+
+/// kOrbErrNoSuchFile when the source does not exist; a link that leads nowhere does not.
+ORB_EXPORT OrbResult OrbCopyFile(const COrbStringData& source, const COrbStringData& destination);
+/// The same to `name` in `folder`. A failure that the system gives no reason for is kOrbErrDiskFull
+/// while the destination's volume has less than 100 MiB free.
+ORB_EXPORT OrbResult OrbCopyFile(const COrbFilePath& source,
+                                 const COrbFilePath& folder,
+                                 const COrbStringData& name,
+                                 COrbFilePath* result);
 
 /// Copies a file's bytes in pieces of 64 KiB to the end of the file `name` in `folder`, which is
 /// made when it is not there. Times, mode and attributes do not go along. `progress` is called
@@ -42,23 +71,69 @@ ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
                                    OrbProgressProc progress,
                                    void* data);
 
-/// Copies a file, a link (as a link) or a folder with all it holds, with times, mode, attributes
-/// and lock, into `folder` under `name`, or under its own name for a null `name`. What is there
-/// already is removed first, but not before the source was seen to be there. `progress` is called
-/// once before anything is copied, when it can cancel (what was there already is gone by then), and
-/// once at the end. A copied file is complete or absent; what the copy of a folder finished before
-/// a failure stays.
+/// Overwrites an existing file from its start with a file's bytes, which are read into memory
+/// before the first is written; what is beyond them stays. Times of creation and modification and
+/// the lock go along as far as the volume takes them. `progress` is called before each piece of 64
+/// KiB that is written. When the copy fails or is cancelled the destination is deleted, unless
+/// `progress` itself throws: that passes on, with the files closed, and the destination stays.
 ///
-/// In this order: kOrbErrNotFound for a source that is empty or not there; kOrbErrAccessDenied for
-/// one that cannot be read, a link that leads nowhere among them, and for a socket, pipe or device;
-/// kOrbErrInvalidName for a name that is empty, "." or ".."; kOrbErrEmptyPath for an empty folder;
-/// kOrbErrInsideSource when the destination is the source or one of its folders, by its text or on
-/// disk, and kOrbErrAccessDenied when it cannot be removed. Up to here nothing has changed, but a
-/// folder that could not be removed may have lost some of its content. Then kOrbErrCanceled;
-/// kOrbErrDiskFull, also for any failed copy while the destination's volume has less than 100 MiB
-/// free; the codes of what failed.
+/// Before anything is changed: kOrbErrNotFound and kOrbErrAccessDenied, also for a destination that
+/// is locked, a link or no regular file; kOrbErrSamePath when both are one file, under whichever
+/// names; kOrbErrUnknown for a folder. After that: kOrbErrCanceled, or kOrbErrUnknown for whatever
+/// failed.
+ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
+                                   const COrbFilePath& destination,
+                                   OrbProgressProc progress,
+                                   void* data);
+
+/// Removes what is at the destination first. kOrbErrAccessDenied, and nothing is touched, when both
+/// texts are equal; otherwise only the file system is asked whether both are one item.
+ORB_EXPORT OrbResult OrbCopyFileOverwrite(const COrbFilePath& source,
+                                          const COrbFilePath& destination);
+/// Removes what is at the destination first. A failure that the system gives no reason for is
+/// kOrbErrDiskFull while the destination's volume has less than 100 MiB free.
+ORB_EXPORT OrbResult OrbCopyFileOverwrite(const COrbFilePath& source,
+                                          const COrbFilePath& folder,
+                                          const COrbStringData* name,
+                                          COrbFilePath* result);
+
+/// Removes what is at the destination first. `progress` is called once before anything is copied,
+/// when it can cancel (what was there already is gone by then), and once at the end, also when the
+/// copy failed.
+///
+/// kOrbErrAccessDenied for a source that cannot be used, a link that leads nowhere among them;
+/// kOrbErrCanceled; kOrbErrDiskFull for any failed copy while the destination's volume has less
+/// than 100 MiB free.
 ORB_EXPORT OrbResult OrbCopyFileOverwriteEx(const COrbFilePath& source,
                                             const COrbFilePath& folder,
                                             const COrbStringData* name,
                                             OrbProgressProc progress,
                                             void* data);
+
+/// Before anything else kOrbErrSamePath when the folder is the source and kOrbErrInsideSource when
+/// it lies inside it, by their texts.
+ORB_EXPORT OrbResult OrbCopyFolder(COrbFilePath source,
+                                   COrbFilePath folder,
+                                   const COrbStringData& name,
+                                   COrbFilePath* result);
+
+/// OrbCopyFileOverwriteEx() with the test of the folder that OrbCopyFolder() makes. A failure keeps
+/// its code, however full the volume is.
+ORB_EXPORT OrbResult OrbCopyFolderEx(const COrbFilePath& source,
+                                     const COrbFilePath& folder,
+                                     const COrbStringData& name,
+                                     OrbProgressProc progress,
+                                     void* data);
+/// Does nothing. Always kOrbErrNotSupported.
+ORB_EXPORT OrbResult OrbCopyFolderEx(const COrbFilePath& source,
+                                     const COrbFilePath& destination,
+                                     OrbProgressProc progress,
+                                     void* data);
+
+/// OrbCopyFileOverwriteEx() with the test of the folder that OrbCopyFolder() makes, and without
+/// asking whether the source can be read or written.
+ORB_EXPORT OrbResult OrbCopyFolderOverwriteEx(const COrbFilePath& source,
+                                              const COrbFilePath& folder,
+                                              const COrbStringData* name,
+                                              OrbProgressProc progress,
+                                              void* data);

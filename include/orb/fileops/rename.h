@@ -7,9 +7,9 @@
 #include <orb/strings/string_data.h>
 
 /// Gives an item another name in its folder, keeping its lock. Nothing is ever replaced. A change
-/// of letters' case alone works on every volume. A "/" in the name leads into another folder of the
-/// volume. `result` may be null and may be the path; it receives the new path on success alone, and
-/// what it answers to that is then the result.
+/// of letters' case alone works on every volume. A "/" in the name leads into another folder, also
+/// on another volume. `result` may be null and may be the path; it receives the new path on success
+/// alone, and what it answers to that is then the result.
 ///
 /// kOrbErrNoSuchFile for an empty path; kOrbErrAccessDenied for an item that is not writable or not
 /// there, and in a folder that is locked or forbids it; kOrbErrFileExists when something has the
