@@ -80,8 +80,8 @@ class ORB_EXPORT COrbFileHandle : public COrbFilePath {
   bool IsEqual(const COrbFileHandle& other) const;
 
   /// One of the eOrbDriveType values, found out once for each volume and then kept as long as the
-  /// process runs. eOrbDriveType_Fixed also where nothing exists, which is not kept. Whether an item
-  /// on a network volume exists is not asked, so that a server that is gone does not hang the
+  /// process runs. eOrbDriveType_Fixed also where nothing exists, which is not kept. Whether an
+  /// item on a network volume exists is not asked, so that a server that is gone does not hang the
   /// answer. Collects nothing, and may be called on different handles from several threads at once.
   unsigned int GetDriveType() const;
 
