@@ -42,7 +42,8 @@ class ORB_EXPORT COrbOutputData {
 class ORB_EXPORT COrbBatchData {
  public:
   COrbBatchData() = default;
-  /// A copy starts with batchFlag false; no moves, so that every transfer keeps to that.
+  /// A copy starts with batchFlag false, also in a vector that grows; no moves, so that every
+  /// transfer keeps to that.
   COrbBatchData(const COrbBatchData& other);
   COrbBatchData& operator=(const COrbBatchData&) = default;
   virtual ~COrbBatchData();
@@ -175,8 +176,8 @@ class ORB_EXPORT COrbMovieTrimData {
 class ORB_EXPORT COrbMovieTrimSaveData : public COrbMovieTrimData {
  public:
   COrbMovieTrimSaveData() = default;
-  /// A copy starts with trimRange zero; no moves, so that every transfer keeps to that. Assignment
-  /// copies it.
+  /// A copy starts with trimRange zero, also in a vector that grows; no moves, so that every
+  /// transfer keeps to that. Assignment copies it.
   COrbMovieTrimSaveData(const COrbMovieTrimSaveData& other);
   COrbMovieTrimSaveData& operator=(const COrbMovieTrimSaveData&) = default;
   ~COrbMovieTrimSaveData() override;

@@ -19,6 +19,8 @@
 /// Mind how items and nodes are assigned: what every entry has (COrbSNSCommonData) says which entry
 /// of the service it is, and stays; only what the item or node adds is taken over. A new copy is a
 /// full copy. Items, nodes and lists have no moves, so that a growing container copies in full too.
+/// But std::swap, sorting, and inserting or erasing before the end of a vector assign: they shift
+/// items and nodes and leave the common members where they were. Build a new vector from copies.
 
 /// What every entry of the service has.
 class ORB_EXPORT COrbSNSCommonData {

@@ -193,8 +193,9 @@ class ORB_EXPORT COrbFunctionData {
  public:
   COrbFunctionData() = default;
   COrbFunctionData(const COrbFunctionData&) = default;
-  /// Leaves icons and functionInt5 as they are. A new copy has them; no moves, so that every
-  /// transfer keeps to these two rules.
+  /// Leaves icons and functionInt5 as they are, so also where std::swap, sorting, or erasing before
+  /// the end of a vector assigns. A new copy has them; no moves, so that every transfer keeps to
+  /// these two rules.
   COrbFunctionData& operator=(const COrbFunctionData& other);
   virtual ~COrbFunctionData();
 
