@@ -52,12 +52,14 @@ OrbResult OrbCopyFileOverwriteEx(const COrbFilePath& source,
   return Transfer(orb::form::kOrbCopyFileOverwriteEx, {source, folder, name, progress, data});
 }
 
+// NOLINTBEGIN(performance-unnecessary-value-param): the interface takes these by value.
 OrbResult OrbCopyFolder(COrbFilePath source,
                         COrbFilePath folder,
                         const COrbStringData& name,
                         COrbFilePath* result) {
   return Transfer(orb::form::kOrbCopyFolder, {source, folder, &name, nullptr, nullptr, result});
 }
+// NOLINTEND(performance-unnecessary-value-param)
 
 OrbResult OrbCopyFolderEx(const COrbFilePath& source,
                           const COrbFilePath& folder,

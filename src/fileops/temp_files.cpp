@@ -108,6 +108,7 @@ OrbResult OrbCreateTempFile(const COrbFilePath* folder, COrbFilePath* result) {
   return OrbCreateTempFile(folder, result, COrbStringData());
 }
 
+// NOLINTBEGIN(performance-unnecessary-value-param): the interface takes the suffix by value.
 OrbResult OrbCreateTempFile(const COrbFilePath* folder,
                             COrbFilePath* result,
                             COrbStringData suffix) {
@@ -116,3 +117,4 @@ OrbResult OrbCreateTempFile(const COrbFilePath* folder,
   return folder == nullptr ? orb::CreateInProjectFolder(*text, result)
                            : orb::CreateIn(*folder, *text, result);
 }
+// NOLINTEND(performance-unnecessary-value-param)

@@ -24,6 +24,9 @@ class FileHandle {
   static Result<FileHandle> OpenForWriting(const std::string& path);
 
   FileHandle(FileHandle&&) noexcept;
+  FileHandle& operator=(FileHandle&&) = delete;
+  FileHandle(const FileHandle&) = delete;
+  FileHandle& operator=(const FileHandle&) = delete;
   ~FileHandle();
 
   /// Whether both are one file, under whichever names.

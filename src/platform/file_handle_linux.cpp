@@ -17,7 +17,7 @@ namespace orb::platform {
 namespace {
 
 constexpr int kAnyHandle = O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
-constexpr std::size_t kPiece = 64 * 1024;
+constexpr std::size_t kPiece = 65536;
 /// Room for a file that shows no size, as those of /proc do, and to notice the end of others.
 constexpr std::size_t kSpareRoom = 4096;
 

@@ -19,6 +19,9 @@ class FileWriter {
   static Result<FileWriter> Open(const std::string& path);
 
   FileWriter(FileWriter&&) noexcept;
+  FileWriter& operator=(FileWriter&&) = delete;
+  FileWriter(const FileWriter&) = delete;
+  FileWriter& operator=(const FileWriter&) = delete;
   ~FileWriter();
 
   /// Writes the whole block and closes the file: once. A file that has to grow and cannot, because

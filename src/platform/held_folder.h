@@ -23,6 +23,9 @@ class HeldFolder {
                                           const std::vector<std::string>& levels);
 
   HeldFolder(HeldFolder&&) noexcept;
+  HeldFolder& operator=(HeldFolder&&) = delete;
+  HeldFolder(const HeldFolder&) = delete;
+  HeldFolder& operator=(const HeldFolder&) = delete;
   ~HeldFolder();
 
   /// kItemExists when anything is there, also a link that leads nowhere; kInvalidName when it is

@@ -28,6 +28,7 @@ struct StringAccess {
   /// made once for each value and kept.
   static Utf8Text Read(const COrbStringData& s) {
     if (s.value == nullptr) GiveValue(s);
+    // NOLINTNEXTLINE(clang-analyzer-core.NonNullParamChecker): GiveValue() has set it.
     return Read(*s.value);
   }
   static Utf8Text Read(const COrbStringData::COrbStringValue& value) {

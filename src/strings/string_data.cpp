@@ -28,7 +28,7 @@ enum Master : std::uint32_t { kNone = 0, kSystem = 1, kUtf8 = 2, kUnicode = 3 };
 
 /// Up to here a text is converted on the stack and then copied at its size.
 constexpr std::size_t kShort = 256;
-constexpr std::size_t kMostOnStack = 3 * 1024;
+constexpr std::size_t kMostOnStack = 3072;
 
 /// Null without memory.
 void* BlockFor(std::size_t size) noexcept try {

@@ -56,7 +56,7 @@ Status UnlessRefused() { return IsRefusal(errno) ? Status() : Status(LastError()
 template <typename Read>
 Result<std::optional<std::string>> ReadSized(Read read) {
   // Named: g++ 12 warns of a temporary without a value.
-  const std::optional<std::string> nothing;
+  std::optional<std::string> nothing;
   std::string value;
   for (int i = 0; i < kSizeTries; ++i) {
     const ssize_t size = read(nullptr, 0);
