@@ -320,6 +320,14 @@ void ExpectNoFalseWhole(const Files& card, const std::string& day) {
   }
 }
 
+/// The journal stands from before the first file is made until all are whole.
+void WaitUntilUnderWay(pid_t child, const std::string& journal) {
+  siginfo_t ended{};
+  while (!fs::exists(journal) && ended.si_pid == 0) {
+    if (::waitid(P_PID, static_cast<id_t>(child), &ended, WEXITED | WNOHANG | WNOWAIT) != 0) return;
+  }
+}
+
 TEST_F(Import, LeavesNothingShortWhenItIsKilledAtAnyMoment) {
   Files card;
   for (unsigned i = 0; i < 16; ++i) {
@@ -341,7 +349,8 @@ TEST_F(Import, LeavesNothingShortWhenItIsKilledAtAnyMoment) {
   int kills = 0;
   for (unsigned i = 0; i < 40; ++i) {
     const pid_t child = Start({folder_ / "card", folder_ / "photos"});
-    std::this_thread::sleep_for(std::chrono::microseconds(2000 + i * 7919 % 30000));
+    WaitUntilUnderWay(child, journal);
+    std::this_thread::sleep_for(std::chrono::microseconds(i * 7919 % 30000));
     ::kill(child, SIGKILL);
     const Ended ended = Wait(child);
     if (ended.exitCode == 0) {
