@@ -7,6 +7,7 @@
 #include <memory>
 
 #include "platform/linux/place.h"
+#include "platform/linux/spelling.h"
 
 namespace orb::platform {
 namespace {
@@ -60,7 +61,8 @@ Result<bool> IsItemOrAbove(const std::string& candidate, const std::string& path
   if (!status) return status.Reason();
   const auto b = Locate(path);
   if (!b) return b.Reason();
-  const auto same = IsSameEntry(a.Value(), status.Value(), b.Value());
+  auto same = IsSameEntry(a.Value(), status.Value(), b.Value());
+  if (same && !same.Value()) same = IsOneItemInTwoSpellings(a.Value(), b.Value());
   if (!same || same.Value() || !S_ISDIR(status.Value().st_mode)) return same;
   return IsInOrBelow(b.Value().folder.Get(), IdentityOf(status.Value()));
 }

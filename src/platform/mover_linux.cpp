@@ -1,56 +1,21 @@
 // SPDX-License-Identifier: MIT
 #include "platform/mover.h"
 
-#include <fcntl.h>
 #include <sys/random.h>
 
 #include <cstdint>
-#include <optional>
-#include <string_view>
 
-#include "platform/linux/folder_stream.h"
 #include "platform/linux/item_metadata.h"
 #include "platform/linux/move_across.h"
 #include "platform/linux/removal_at.h"
 #include "platform/linux/rename.h"
-#include "platform/transcode.h"
-#include "platform/unicode.h"
+#include "platform/linux/spelling.h"
 
 namespace orb::platform {
 namespace {
 
 /// Names up to here leave room for a suffix on every volume.
 constexpr std::size_t kRoomyName = 200;
-
-bool DifferInCaseOnly(std::string_view a, std::string_view b) {
-  const auto unitsA = Utf16FromUtf8(a);
-  const auto unitsB = Utf16FromUtf8(b);
-  if (a == b || !unitsA || !unitsB) return false;
-  return FormOfRun(Form::kFolded, *unitsA) == FormOfRun(Form::kFolded, *unitsB);
-}
-
-Result<bool> Lists(int folder, std::string_view name) {
-  constexpr int kFlags = O_RDONLY | O_DIRECTORY | O_CLOEXEC;
-  auto entries = FolderStream::Open(UniqueFd(Retry([&] { return ::openat(folder, ".", kFlags); })));
-  if (!entries) return entries.Reason();
-  for (;;) {
-    const auto entry = entries.Value().Next();
-    if (!entry) return entry.Reason();
-    if (entry.Value().name == nullptr) return false;
-    if (entry.Value().name == name) return true;
-  }
-}
-
-/// Whether what was found at the new name is the item itself, found without regard to case. Some
-/// drivers show it as two items then: only the list of names tells.
-bool IsOtherSpelling(const Place& from, const Place& to) {
-  if (!DifferInCaseOnly(from.name, to.name)) return false;
-  const auto folder = IdentityOf(from.folder.Get());
-  const auto newFolder = IdentityOf(to.folder.Get());
-  if (!folder || !newFolder || folder.Value() != newFolder.Value()) return false;
-  const auto listed = Lists(to.folder.Get(), to.name);
-  return listed && !listed.Value();
-}
 
 /// Close to the wanted name: should the machine stop now, that is how the item is found again.
 std::string NameInBetween(const std::string& name) {
@@ -107,7 +72,8 @@ Status MoveItem(const std::string& source, const std::string& destination) {
   if (moved) return moved;
   if (moved.Reason() == ErrorFromErrno(EXDEV)) return MoveAcross(from.Value(), to.Value());
   if (moved.Reason() != kItemExists) return moved;
-  return IsOtherSpelling(from.Value(), to.Value()) ? ChangeCase(folder, name, newName) : moved;
+  const auto itself = IsOneItemInTwoSpellings(from.Value(), to.Value());
+  return itself && itself.Value() ? ChangeCase(folder, name, newName) : moved;
 }
 
 }  // namespace orb::platform

@@ -13,6 +13,7 @@
 #include <set>
 #include <string>
 
+#include "platform/item_relations.h"
 #include "platform/items.h"
 #include "support/faults.h"
 #include "support/temp_folder.h"
@@ -102,6 +103,10 @@ TEST(MoveItem, ChangesTheCaseOfANameOnACard) {
     folder.Write("card/img.jpg", "photo");
     folder.Write("card/other.jpg", "other");
     fs::create_directory(card + "/tree");
+    const auto isOne = orb::platform::IsItemOrAbove(card + "/IMG.JPG", card + "/img.jpg");
+    EXPECT_TRUE(isOne && isOne.Value());  // What removes a destination asks this first.
+    const auto isOther = orb::platform::IsItemOrAbove(card + "/OTHER.jpg", card + "/img.jpg");
+    EXPECT_TRUE(isOther && !isOther.Value());
     EXPECT_EQ(ErrorOf(MoveItem(card + "/img.jpg", card + "/OTHER.jpg")), kItemExists);
     EXPECT_EQ(ErrorOf(MoveItem(card + "/img.jpg", card + "/IMG.jpg")), kDone);
     EXPECT_EQ(ErrorOf(MoveItem(card + "/tree", card + "/Tree")), kDone);
