@@ -105,8 +105,8 @@ BENCHMARK(Drive_OrbCached);
 void Drive_OrbFirst(benchmark::State& state) {
   for (auto _ : state) {
     const auto drives = orb::platform::MakeDrives({});
-    benchmark::DoNotOptimize(drives->VolumeOf(Folder()));
-    benchmark::DoNotOptimize(drives->Read(Folder()));
+    const auto volume = drives->VolumeOf(Folder());
+    benchmark::DoNotOptimize(drives->Read(Folder(), volume.Value()));
   }
 }
 BENCHMARK(Drive_OrbFirst);
@@ -115,8 +115,8 @@ BENCHMARK(Drive_OrbFirst);
 void Drive_OrbNextVolume(benchmark::State& state) {
   const auto drives = orb::platform::MakeDrives({});
   for (auto _ : state) {
-    benchmark::DoNotOptimize(drives->VolumeOf(Folder()));
-    benchmark::DoNotOptimize(drives->Read(Folder()));
+    const auto volume = drives->VolumeOf(Folder());
+    benchmark::DoNotOptimize(drives->Read(Folder(), volume.Value()));
   }
 }
 BENCHMARK(Drive_OrbNextVolume);
