@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: MIT
 #include "platform/drives.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <filesystem>
 #include <string>
@@ -204,6 +206,24 @@ TEST(Drives, LearnOfOneMountWhatTheTableTells) {
   };
   fs::create_directory(folder / "ro");
   ORB_IN_CHILD(test::RunWithPrivateMounts(compare));
+}
+
+TEST(Drives, DoNotWaitForAServerThatDoesNotAnswer) {
+  const test::TempFolder folder;
+  fs::create_directory(folder / "share");
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    const int server = ::open("/dev/fuse", O_RDWR | O_CLOEXEC);
+    const std::string options =
+        "fd=" + std::to_string(server) + ",rootmode=40000,user_id=0,group_id=0";
+    const std::string share = folder / "share";
+    if (::mount("nas:", share.c_str(), "fuse.sshfs", 0, options.c_str()) != 0) return;
+    ::alarm(20);
+    for (const char* below : {"", "/photo.jpg"}) {
+      const auto drives = MakeDrives({});
+      const VolumeId volume = drives->VolumeOf(share + below).Value();
+      EXPECT_TRUE(drives->Read(share + below, volume).Value().remote) << below;
+    }
+  }));
 }
 
 TEST(Drives, BelieveATableThatStandsInForTheKernels) {
