@@ -96,9 +96,10 @@ std::string_view WithoutOneSeparator(std::string_view path) {
 
 }  // namespace
 
-/// What one pass found at a path.
+/// What one pass found at a path, which is the handle's own or another.
 struct COrbFileHandle::Pass {
   std::string_view path;
+  bool isOwn;
   Result<ItemInfo> answer;
 };
 
@@ -142,7 +143,7 @@ OrbResult COrbFileHandle::CollectFileInformatioin() const {
   if (IsEmpty()) return kOrbErrNoSuchFile;
   const char* itemPath = orb::ItemPathInPlace(path);
   if (itemPath == nullptr) return kOrbErrNoSuchFile;
-  const Pass pass{itemPath, Items::Current().Read(itemPath)};
+  const Pass pass{itemPath, true, Items::Current().Read(itemPath)};
   return Exists(itemPath, pass.answer) ? Keep(pass) : kOrbErrNoSuchFile;
 }
 
@@ -150,8 +151,8 @@ OrbResult COrbFileHandle::SetCatalogInfo(CFStringRef fullPath) const {
   COrbStringData text;
   text.InitWithCFString(fullPath);
   const char* itemPath = orb::ItemPathInPlace(text);
-  if (itemPath == nullptr) return Keep({{}, orb::platform::kNoSuchItem});
-  return Keep({itemPath, Items::Current().Read(itemPath)});
+  if (itemPath == nullptr) return Keep({{}, false, orb::platform::kNoSuchItem});
+  return Keep({itemPath, false, Items::Current().Read(itemPath)});
 }
 
 /// A pass that fails half-way keeps what it has found up to there. Whether anything counts as
@@ -167,9 +168,11 @@ OrbResult COrbFileHandle::Keep(const Pass& pass) const {
   fileSize = info.size;
   modificationTime = orb::UtcOf(info.modified);
   creationTime = orb::UtcOf(info.created);
-  actualName = StringAccess::FromUtf8(NameOf(pass.path));
+  const std::string_view name = NameOf(pass.path);
+  actualName.Clear();  // Of the own path it is made when it is asked for.
+  if (!pass.isOwn) actualName = StringAccess::FromUtf8(name);
   const bool hasType = !isFolder && info.kind != ItemKind::kLink;
-  fileType = hasType ? GetFileType(actualName) : eOrbFileType_Unknown;
+  fileType = hasType ? orb::FileTypeOfName(name) : eOrbFileType_Unknown;
   collected = true;
   return kOrbNoErr;
 }
@@ -207,6 +210,8 @@ OrbResult COrbFileHandle::GetDisplayName(COrbStringData& name) const { return Ge
 
 OrbResult COrbFileHandle::GetActualName(COrbStringData& name) const {
   if (EnsureCollected() != kOrbNoErr) return kOrbErrNotFound;
+  if (actualName.IsEmpty())
+    actualName = StringAccess::FromUtf8(NameOf(StringAccess::Read(path).Readable()));
   name = actualName;
   return kOrbNoErr;
 }
@@ -276,7 +281,7 @@ unsigned int COrbFileHandle::GetAttribute(const COrbStringData& fullPath) {
 }
 
 eOrbFileType COrbFileHandle::GetFileType(const COrbStringData& name) {
-  return orb::FileTypeOfName(name);
+  return orb::FileTypeOfName(StringAccess::Read(name).Readable());
 }
 
 eOrbFileType OrbPathFindExtensionType(const COrbStringData& path, bool refuseFolders) {

@@ -129,11 +129,9 @@ eOrbFileType TypeOfExtension(std::string_view dotted) {
 
 namespace orb {
 
-eOrbFileType FileTypeOfName(const COrbStringData& name) {
-  if (name.IsEmpty()) return eOrbFileType_Unknown;
-  const std::string_view text = StringAccess::Read(name).Readable();
-  const std::size_t dot = text.rfind('.');
-  return dot == std::string_view::npos ? eOrbFileType_Unknown : TypeOfExtension(text.substr(dot));
+eOrbFileType FileTypeOfName(std::string_view name) {
+  const std::size_t dot = name.rfind('.');
+  return dot == std::string_view::npos ? eOrbFileType_Unknown : TypeOfExtension(name.substr(dot));
 }
 
 }  // namespace orb

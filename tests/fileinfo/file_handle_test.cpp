@@ -242,10 +242,23 @@ TEST(Collect, TakesReferencesAndTexts) {
   const COrbFileHandle handle;
   EXPECT_EQ(handle.SetCatalogInfo(text), kOrbNoErr);
   EXPECT_EQ(handle.GetFileType(), eOrbFileType_Mov);
+  COrbFileHandle other = HandleOf(folder.Write("b.jpg", ""));
+  COrbStringData name;
+  EXPECT_EQ(other.SetCatalogInfo(text), kOrbNoErr);
+  EXPECT_EQ(other.GetActualName(name), kOrbNoErr);
+  EXPECT_EQ(Text(name), "a.mov");
+  EXPECT_EQ(other.Update(), kOrbNoErr);
+  EXPECT_EQ(other.GetActualName(name), kOrbNoErr);
+  EXPECT_EQ(Text(name), "b.jpg");
   fs::remove(Text(file));
   EXPECT_EQ(handle.SetCatalogInfo(text), kOrbErrNotFound);
   EXPECT_EQ(handle.SetCatalogInfo(nullptr), kOrbErrNotFound);
   CFRelease(text);
+}
+
+TEST(FileType, OfWhatIsNoTextIsUnknown) {
+  EXPECT_EQ(COrbFileHandle::GetFileType(S("a.JPG")), eOrbFileType_Jpeg);
+  EXPECT_EQ(COrbFileHandle::GetFileType(S("\xFF.jpg")), eOrbFileType_Unknown);
 }
 
 TEST(Assignment, CopiesOrForgetsWhatWasCollected) {
