@@ -54,9 +54,9 @@ TEST(TrashText, NumbersNamesAndKeepsThemShort) {
 
 TEST(TrashText, ListsFolderSizesOnce) {
   const auto isThere = [](const std::string& name) { return name != "gone"; };
-  EXPECT_EQ(WithFolderSize("1 2 a%20b\n3 4 gone\n5 6 kept\n", {7, 8, "a b"}, isThere),
+  EXPECT_EQ(WithFolderSizes("1 2 a%20b\n3 4 gone\n5 6 kept\n", {{7, 8, "a b"}}, isThere),
             "5 6 kept\n7 8 a%20b\n");
-  EXPECT_EQ(WithFolderSize("", {7, 8, "%"}, isThere), "7 8 %25\n");
+  EXPECT_EQ(WithFolderSizes("", {{7, 8, "%"}, {9, 9, "a"}}, isThere), "7 8 %25\n9 9 a\n");
 }
 
 bool RunShell(const std::string& command) { return std::system(command.c_str()) == 0; }
