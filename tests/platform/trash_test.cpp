@@ -3,11 +3,14 @@
 
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
+#include <atomic>
 #include <filesystem>
 #include <regex>
 #include <sstream>
 #include <string>
+#include <thread>
 
 #include "platform/items.h"
 #include "platform/trash_text.h"
@@ -431,6 +434,24 @@ TEST_F(TrashOnVolume, IsListedAndRestoredByTrashCli) {
       EXPECT_TRUE(Put(Make(std::string(place) + "twice.jpg", "2")).Ok());
     }
     EXPECT_TRUE(RunShell("test $(trash-list | grep -c /twice.jpg) = 6"));
+  }));
+}
+
+TEST_F(TrashOnVolume, KeepsTheCopyOfWhatSomebodyElseRemoves) {
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    ASSERT_TRUE(Mount());
+    fs::create_directory_symlink(Items(), Own());  // So that only the copy is left.
+    const std::string file = Make("volume/a.jpg", "photo");
+    std::atomic<bool> done = false;
+    std::thread other([&] {
+      while (!done && !fs::exists(Home() + "/files/a.jpg")) std::this_thread::yield();
+      ::unlink(file.c_str());
+    });
+    (void)Put(file);
+    done = true;
+    other.join();
+    EXPECT_EQ(test::ReadAll(Home() + "/files/a.jpg"), "photo");
+    EXPECT_EQ(PathIn(Home(), "a.jpg"), file);
   }));
 }
 
