@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "platform/mover.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -242,6 +243,22 @@ TEST(MoveItem, LosesNothingWhenItIsKilledOnTheWayToAnotherVolume) {
         if (part.path().filename().string().starts_with(".orb-")) fs::remove_all(part);
     }
     EXPECT_TRUE(arrived);
+  }));
+}
+
+// The lease tells when the copy comes to the second file; the first is written to then.
+TEST(MoveItem, KeepsATreeThatWasWrittenToMeanwhile) {
+  const TempFolder folder;
+  static int first, second;
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    MakeVolumes(folder);
+    first = ::open((folder / "a/tree/100%.jpg").c_str(), O_WRONLY | O_APPEND | O_CLOEXEC);
+    second = ::open((folder / "a/tree/sub/big").c_str(), O_RDWR | O_CLOEXEC);
+    ::signal(SIGIO, [](int) { ::close(::write(first, "!", 1) == 1 ? second : first); });
+    ASSERT_EQ(::fcntl(second, F_SETLEASE, F_WRLCK), 0);
+    EXPECT_FALSE(MoveItem(folder / "a/tree", folder / "b/tree"));
+    EXPECT_EQ(ReadAll(folder / "a/tree/100%.jpg"), "photo!");
+    EXPECT_EQ(ReadAll(folder / "b/tree/100%.jpg"), "photo");
   }));
 }
 

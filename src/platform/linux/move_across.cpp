@@ -3,6 +3,7 @@
 
 #include <fcntl.h>
 
+#include <cstdint>
 #include <utility>
 
 #include "platform/linux/copy_at.h"
@@ -53,9 +54,10 @@ class Crossing {
     return target_ ? ExpectFree() : Status(LastError());
   }
 
-  Status ExpectRemovableTree() const {
+  Status ExpectRemovableTree() {
     const auto survey = SurveyTree(from_.folder.Get(), from_.name, SurveyFor::kRemoval);
     if (!survey) return survey.Reason();
+    state_ = survey.Value().state;
     return survey.Value().canBeRemoved ? Status() : kNotPermitted;
   }
 
@@ -104,12 +106,20 @@ class Crossing {
     const timespec& is = now.Value().st_mtim;
     const bool same = IdentityOf(now.Value()) == IdentityOf(source_) && was.tv_sec == is.tv_sec &&
                       was.tv_nsec == is.tv_nsec;
-    return same ? Status() : ErrorFromErrno(ESTALE);
+    if (!same) return ErrorFromErrno(ESTALE);
+    return S_ISDIR(source_.st_mode) ? ExpectUnchangedTree() : Status();
+  }
+
+  Status ExpectUnchangedTree() const {
+    const auto survey = SurveyTree(from_.folder.Get(), from_.name, SurveyFor::kSize);
+    if (!survey) return survey.Reason();
+    return survey.Value().state == state_ ? Status() : ErrorFromErrno(ESTALE);
   }
 
   const Place& from_;
   const Place& to_;
   const struct stat source_;
+  std::uint64_t state_ = 0;  // Of a folder and all it holds, before it was copied.
   UniqueFd target_;
 };
 
