@@ -205,12 +205,16 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
   fs::create_directory_symlink("tree", folder_ / "link");
   folder_.Write("to/old", "old");
   ASSERT_TRUE(Lock(folder_.Write("locked", "x")));
+  fs::create_directory(folder_ / "pinned");
+  folder_.Write("pinned/file", "x");
+  ASSERT_TRUE(Lock(folder_ / "pinned"));
   ASSERT_EQ(::mkfifo((folder_ / "pipe").c_str(), 0600), 0);
   const auto before = Describe(folder_.Path());
   EXPECT_EQ(RunHere("missing", "to", "old"), row_.missing);
   EXPECT_EQ(Run("", folder_ / "to", "old"), row_.missing);
   if (row_.existing == 0) {
     EXPECT_EQ(RunHere(row_.moves == kYes ? "locked" : "pipe", "to", "old"), kDenied);
+    EXPECT_EQ(RunHere(row_.moves == kYes ? "pinned/file" : "pipe", "to", "old"), kDenied);
   }
   EXPECT_EQ(RunHere("tree", "tree", "new"), row_.same);
   EXPECT_EQ(RunHere("tree", "tree/sub", "new"), row_.inside);
