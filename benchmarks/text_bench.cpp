@@ -178,24 +178,24 @@ void Sizes(benchmark::internal::Benchmark* row) {
   for (const std::int64_t size : {1 << 10, 1 << 16, 1 << 20, 1 << 23}) row->Arg(size);
 }
 
-BENCHMARK(FindOrb<Ascii>)->Apply(Sizes);
-BENCHMARK(FindStd<Ascii>)->Apply(Sizes);
-BENCHMARK(FindIcu<Ascii>)->Apply(Sizes);
-BENCHMARK(FindOrb<Cjk>)->Apply(Sizes);
-BENCHMARK(FindStd<Cjk>)->Apply(Sizes);
-BENCHMARK(FindIcu<Cjk>)->Apply(Sizes);
-BENCHMARK(ReplaceOrb<Ascii>)->Apply(Sizes);
-BENCHMARK(ReplaceStd<Ascii>)->Apply(Sizes);
-BENCHMARK(ReplaceOrb<Cjk>)->Apply(Sizes);
-BENCHMARK(ReplaceStd<Cjk>)->Apply(Sizes);
-BENCHMARK(SplitOrb<Ascii>)->Apply(Sizes);
-BENCHMARK(SplitOrb<Cjk>)->Apply(Sizes);
-BENCHMARK(TrimOrb<Ascii>)->Apply(Sizes);
+BENCHMARK(FindOrb<Ascii>)->Name("Find-ASCII/Orb")->Apply(Sizes);
+BENCHMARK(FindStd<Ascii>)->Name("Find-ASCII/std")->Apply(Sizes);
+BENCHMARK(FindIcu<Ascii>)->Name("Find-ASCII/ICU")->Apply(Sizes);
+BENCHMARK(FindOrb<Cjk>)->Name("Find-CJK/Orb")->Apply(Sizes);
+BENCHMARK(FindStd<Cjk>)->Name("Find-CJK/std")->Apply(Sizes);
+BENCHMARK(FindIcu<Cjk>)->Name("Find-CJK/ICU")->Apply(Sizes);
+BENCHMARK(ReplaceOrb<Ascii>)->Name("Replace-ASCII/Orb")->Apply(Sizes);
+BENCHMARK(ReplaceStd<Ascii>)->Name("Replace-ASCII/std")->Apply(Sizes);
+BENCHMARK(ReplaceOrb<Cjk>)->Name("Replace-CJK/Orb")->Apply(Sizes);
+BENCHMARK(ReplaceStd<Cjk>)->Name("Replace-CJK/std")->Apply(Sizes);
+BENCHMARK(SplitOrb<Ascii>)->Name("Split-ASCII/Orb")->Apply(Sizes);
+BENCHMARK(SplitOrb<Cjk>)->Name("Split-CJK/Orb")->Apply(Sizes);
+BENCHMARK(TrimOrb<Ascii>)->Name("Trim-ASCII/Orb")->Apply(Sizes);
 #ifdef ORB_BENCH_QT
-BENCHMARK(FindQt<Ascii>)->Apply(Sizes);
-BENCHMARK(FindQt<Cjk>)->Apply(Sizes);
-BENCHMARK(SplitQt<Ascii>)->Apply(Sizes);
-BENCHMARK(SplitQt<Cjk>)->Apply(Sizes);
+BENCHMARK(FindQt<Ascii>)->Name("Find-ASCII/Qt")->Apply(Sizes);
+BENCHMARK(FindQt<Cjk>)->Name("Find-CJK/Qt")->Apply(Sizes);
+BENCHMARK(SplitQt<Ascii>)->Name("Split-ASCII/Qt")->Apply(Sizes);
+BENCHMARK(SplitQt<Cjk>)->Name("Split-CJK/Qt")->Apply(Sizes);
 #endif
 
 /// 100,000 names as cameras and people give them, in no order.
@@ -240,7 +240,7 @@ void SortOrb(benchmark::State& state) {
   for (const std::string& name : PhotoNames()) names.push_back(Value(name));
   Sort(state, names, OrbStringDataCmpi);
 }
-BENCHMARK(SortOrb)->Unit(benchmark::kMillisecond);
+BENCHMARK(SortOrb)->Name("SortNames/Orb")->Unit(benchmark::kMillisecond);
 
 /// What bounds it: the bytes as they are, reached in the same way.
 void SortOrbBytes(benchmark::State& state) {
@@ -250,7 +250,7 @@ void SortOrbBytes(benchmark::State& state) {
     return orb::StringAccess::Read(a).bytes.compare(orb::StringAccess::Read(b).bytes);
   });
 }
-BENCHMARK(SortOrbBytes)->Unit(benchmark::kMillisecond);
+BENCHMARK(SortOrbBytes)->Name("SortNames/limit-bytes")->Unit(benchmark::kMillisecond);
 
 void SortIcu(benchmark::State& state) {
   std::vector<std::u16string> names;
@@ -265,7 +265,7 @@ void SortIcu(benchmark::State& state) {
                          &status);
   });
 }
-BENCHMARK(SortIcu)->Unit(benchmark::kMillisecond);
+BENCHMARK(SortIcu)->Name("SortNames/ICU")->Unit(benchmark::kMillisecond);
 
 #ifdef ORB_BENCH_QT
 void SortQt(benchmark::State& state) {
@@ -275,7 +275,7 @@ void SortQt(benchmark::State& state) {
     return QString::compare(a, b, Qt::CaseInsensitive);
   });
 }
-BENCHMARK(SortQt)->Unit(benchmark::kMillisecond);
+BENCHMARK(SortQt)->Name("SortNames/Qt")->Unit(benchmark::kMillisecond);
 #endif
 
 }  // namespace
