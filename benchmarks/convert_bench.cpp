@@ -99,19 +99,6 @@ void DeriveUnicodeOrb(benchmark::State& state, Kind kind) {
       [](const COrbStringData& made) { benchmark::DoNotOptimize(made.GetPtrUnicode()); });
 }
 
-/// Of a text whose length is known already.
-void DeriveScannedUnicodeOrb(benchmark::State& state, Kind kind) {
-  const std::string text = SampleBytes(state, kind);
-  const auto make = [&] {
-    COrbStringData made{OrbCharUtf8(text.c_str())};
-    benchmark::DoNotOptimize(made.GetLengthChar());
-    return made;
-  };
-  Derive(state, make, [](const COrbStringData& made) {
-    benchmark::DoNotOptimize(made.GetPtrUnicode());
-  });
-}
-
 void DeriveUtf8Orb(benchmark::State& state, Kind kind) {
   const std::u16string units = SampleUnits(state, kind);
   const OrbCharUnicode from(reinterpret_cast<const unsigned short*>(units.c_str()));
@@ -274,7 +261,6 @@ struct Row {
 
 constexpr Row kRows[] = {
     {"ToUtf16Derive", "Orb", DeriveUnicodeOrb, Clock::kOwn},
-    {"ToUtf16Derive", "Orb-scanned", DeriveScannedUnicodeOrb, Clock::kOwn},
     {"ToUtf16Derive", "limit-zeroed", ZeroedUnicode},
     {"ToUtf16Road", "Orb", RoadUnicodeOrb},
     {"ToUtf16Bare", "Orb", BareUnicodeOrb},

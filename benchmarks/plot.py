@@ -8,9 +8,8 @@ WIDTH, HEIGHT = 330, 260  # Of a panel with all around it.
 LEFT, RIGHT, TOP, BOTTOM = 52, 92, 28, 34  # Around the field of a panel.
 LABEL = 11  # The least distance of two labels.
 
-COLOURS = {"Orb": "#d1242f", "Orb-paths": "#e8710a", "std": "#1f6feb", "std-paths": "#79a8f0",
-           "Qt": "#2da44e", "GLib": "#8250df", "GIO": "#8250df", "ICU": "#0a7d8c", "Boost": "#9a6700",
-           "cp": "#57606a", "rm": "#57606a"}
+COLOURS = {"Orb": "#d1242f", "std": "#1f6feb", "std-string": "#79a8f0", "Qt": "#2da44e", "GLib": "#8250df",
+           "GIO": "#8250df", "ICU": "#0a7d8c", "Boost": "#9a6700", "cp": "#57606a", "rm": "#57606a"}
 LIMIT_COLOUR = "#8c959f"
 
 

@@ -34,7 +34,7 @@ PLOTS = (
     ("conversions", ("ToUtf16Road-ASCII", "ToUtf16Road-Latin", "ToUtf16Road-CJK",
                      "ToUtf8Road-ASCII", "ToUtf8Road-Latin", "ToUtf8Road-CJK")),
     ("texts", ("Find-ASCII", "Replace-ASCII", "Split-ASCII", "Find-CJK", "Replace-CJK", "Split-CJK")),
-    ("vectors", ("GrowVector", "Append")),
+    ("vectors", ("GrowVector", "GrowVector-paths", "Append")),
     ("trees", ("CopyTree@xfs", "CopyTree@ext4", "CopyTree@btrfs",
                "RemoveTree@xfs", "RemoveTree@ext4", "RemoveTree@btrfs")),
     ("names", ("UniqueNames@xfs", "UniqueNames@ext4", "UniqueNames@btrfs")),

@@ -382,9 +382,10 @@ void Growing(benchmark::internal::Benchmark* row) {
   row->RangeMultiplier(10)->Range(1000, 1'000'000)->Unit(benchmark::kMillisecond);
 }
 BENCHMARK(GrowOrb)->Name("GrowVector/Orb")->Apply(Growing);
-BENCHMARK(GrowPathsOrb)->Name("GrowVector/Orb-paths")->Apply(Growing);
+BENCHMARK(GrowPathsOrb)->Name("GrowVector-paths/Orb")->Apply(Growing);
 BENCHMARK(GrowStd)->Name("GrowVector/std")->Apply(Growing);
-BENCHMARK(GrowPathsStd)->Name("GrowVector/std-paths")->Apply(Growing);
+BENCHMARK(GrowStd)->Name("GrowVector-paths/std-string")->Apply(Growing);
+BENCHMARK(GrowPathsStd)->Name("GrowVector-paths/std")->Apply(Growing);
 
 BENCHMARK(FormatOrb)->Name("Format/Orb");
 BENCHMARK(FormatStd)->Name("Format/std");
