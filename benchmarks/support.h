@@ -16,6 +16,7 @@
 #include <filesystem>
 #include <fstream>
 #include <string>
+#include <utility>
 #include <vector>
 
 /// \file
@@ -82,8 +83,8 @@ inline void MakeTree(const std::string& root, int folders, int files, std::size_
   }
 }
 
-/// Runs a program to its end, which must be a good one, its output thrown away, and gives the
-/// largest resident size it had, in KiB.
+/// Runs a program to its end, which must be a good one, its output thrown away. Gives the largest
+/// resident size it had, in KiB, which is at least this program's own: a child begins with it.
 inline long Run(std::vector<std::string> command) {
   std::vector<char*> arguments;
   for (std::string& word : command) arguments.push_back(word.data());
@@ -99,6 +100,16 @@ inline long Run(std::vector<std::string> command) {
   struct rusage used {};
   if (failed != 0 || ::wait4(child, &status, 0, &used) != child || status != 0) std::abort();
   return used.ru_maxrss;
+}
+
+/// The largest resident size of a program, in MiB, as seen from a parent that is tiny.
+inline double PeakMebibytes(std::vector<std::string> command) {
+  const Folder folder;
+  command.insert(command.begin(), {"time", "-f", "%M", "-o", folder / "peak"});
+  Run(std::move(command));
+  double kibibytes = 0;
+  std::ifstream(folder / "peak") >> kibibytes;
+  return kibibytes / 1024;
 }
 
 }  // namespace bench

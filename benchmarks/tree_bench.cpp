@@ -306,7 +306,7 @@ const std::vector<Row> kFileCopies = {
 const std::vector<Row> kStreamCopies = {
     {"Orb", StreamOrbSilent},
     {"Orb-progress", StreamOrbReporting},
-    {"limit-64KiB", StreamBare},
+    {"limit-read-write", StreamBare},
     {"cp", CopyCp},
 };
 
@@ -333,7 +333,7 @@ void RegisterAll() {
     Register("CopyTree", kFiles, system, kTreeCopies, tree);
     Register("RemoveTree", kFiles, system, kRemovals, tree);
     Register("CopyFile", kMebibytes, system, kFileCopies, file);
-    Register("StreamFile", kMebibytes, system, kStreamCopies, file);
+    Register("Stream", kMebibytes, system, kStreamCopies, file);
   }
 }
 
