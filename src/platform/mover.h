@@ -13,8 +13,8 @@ namespace orb::platform {
 ///
 /// To another volume the item is copied, a folder under a hidden name at first, and the source is
 /// removed when the copy is complete, on the device and in its place. A failed copy is taken away
-/// again. If removing the source fails the copy stays; a source that was written to meanwhile is
-/// not removed at all, and the move fails. A process that is killed leaves the source whole, or the
+/// again, also when the source was written to meanwhile. If removing the source fails, or the
+/// source is gone by then, the copy stays. A process that is killed leaves the source whole, or the
 /// copy; it may leave a part of a copied folder under the hidden name.
 ///
 /// kItemExists when anything is at the destination, also a link that leads nowhere. kNotPermitted

@@ -38,7 +38,7 @@ class Crossing {
     const Status copied = S_ISDIR(source_.st_mode) ? CopyTree() : CopyLeaf();
     if (!copied) return copied;
     const Status same = ExpectUnchanged();
-    if (!same) (void)RemoveItemAt(target_.Get(), to_.name);
+    if (!same && IsSourceInItsPlace()) (void)RemoveItemAt(target_.Get(), to_.name);
     return same;
   }
 
@@ -98,7 +98,7 @@ class Crossing {
     return done;
   }
 
-  /// What was written to a file, or put in its place, while it was copied would be lost.
+  /// What was written to the source, or put in its place, while it was copied would be lost.
   Status ExpectUnchanged() const {
     const auto now = ReadStatus(from_);
     if (!now) return now.Reason();
@@ -108,6 +108,12 @@ class Crossing {
                       was.tv_nsec == is.tv_nsec;
     if (!same) return ErrorFromErrno(ESTALE);
     return S_ISDIR(source_.st_mode) ? ExpectUnchangedTree() : Status();
+  }
+
+  /// Otherwise, its medium pulled or the item taken away, the copy may be all that is left.
+  bool IsSourceInItsPlace() const {
+    const auto now = ReadStatus(from_);
+    return now && IdentityOf(now.Value()) == IdentityOf(source_);
   }
 
   Status ExpectUnchangedTree() const {
