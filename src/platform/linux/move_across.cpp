@@ -3,6 +3,7 @@
 
 #include <fcntl.h>
 
+#include <cstdint>
 #include <utility>
 
 #include "platform/linux/copy_at.h"
@@ -37,7 +38,7 @@ class Crossing {
     const Status copied = S_ISDIR(source_.st_mode) ? CopyTree() : CopyLeaf();
     if (!copied) return copied;
     const Status same = ExpectUnchanged();
-    if (!same) (void)RemoveItemAt(target_.Get(), to_.name);
+    if (!same && IsSourceInItsPlace()) (void)RemoveItemAt(target_.Get(), to_.name);
     return same;
   }
 
@@ -54,9 +55,10 @@ class Crossing {
     return target_ ? ExpectFree() : Status(LastError());
   }
 
-  Status ExpectRemovableTree() const {
+  Status ExpectRemovableTree() {
     const auto survey = SurveyTree(from_.folder.Get(), from_.name, SurveyFor::kRemoval);
     if (!survey) return survey.Reason();
+    state_ = survey.Value().state;
     return survey.Value().canBeRemoved ? Status() : kNotPermitted;
   }
 
@@ -96,7 +98,7 @@ class Crossing {
     return done;
   }
 
-  /// What was written to a file, or put in its place, while it was copied would be lost.
+  /// What was written to the source, or put in its place, while it was copied would be lost.
   Status ExpectUnchanged() const {
     const auto now = ReadStatus(from_);
     if (!now) return {};  // The removal will say why. The copy may be the last there is.
@@ -104,12 +106,26 @@ class Crossing {
     const timespec& is = now.Value().st_mtim;
     const bool same = IdentityOf(now.Value()) == IdentityOf(source_) && was.tv_sec == is.tv_sec &&
                       was.tv_nsec == is.tv_nsec;
-    return same ? Status() : ErrorFromErrno(ESTALE);
+    if (!same) return ErrorFromErrno(ESTALE);
+    return S_ISDIR(source_.st_mode) ? ExpectUnchangedTree() : Status();
+  }
+
+  /// Otherwise, its medium pulled or the item taken away, the copy may be all that is left.
+  bool IsSourceInItsPlace() const {
+    const auto now = ReadStatus(from_);
+    return now && IdentityOf(now.Value()) == IdentityOf(source_);
+  }
+
+  Status ExpectUnchangedTree() const {
+    const auto survey = SurveyTree(from_.folder.Get(), from_.name, SurveyFor::kSize);
+    if (!survey) return survey.Reason();
+    return survey.Value().state == state_ ? Status() : ErrorFromErrno(ESTALE);
   }
 
   const Place& from_;
   const Place& to_;
   const struct stat source_;
+  std::uint64_t state_ = 0;  // Of a folder and all it holds, before it was copied.
   UniqueFd target_;
 };
 

@@ -15,6 +15,9 @@ struct TreeSurvey {
   /// False when something inside is locked, on a volume of its own or in a folder that the caller
   /// may not write to: not all of it could be removed.
   bool canBeRemoved = true;
+  /// Of all names, sizes and times of change: another sum tells that something was written, added
+  /// or taken away in between.
+  std::uint64_t state = 0;
 };
 
 enum class SurveyFor { kSize, kRemoval };
