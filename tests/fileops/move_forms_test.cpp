@@ -205,12 +205,16 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
   fs::create_directory_symlink("tree", folder_ / "link");
   folder_.Write("to/old", "old");
   ASSERT_TRUE(Lock(folder_.Write("locked", "x")));
+  fs::create_directory(folder_ / "pinned");
+  folder_.Write("pinned/file", "x");
+  ASSERT_TRUE(Lock(folder_ / "pinned"));
   ASSERT_EQ(::mkfifo((folder_ / "pipe").c_str(), 0600), 0);
   const auto before = Describe(folder_.Path());
   EXPECT_EQ(RunHere("missing", "to", "old"), row_.missing);
   EXPECT_EQ(Run("", folder_ / "to", "old"), row_.missing);
   if (row_.existing == 0) {
     EXPECT_EQ(RunHere(row_.moves == kYes ? "locked" : "pipe", "to", "old"), kDenied);
+    EXPECT_EQ(RunHere(row_.moves == kYes ? "pinned/file" : "pipe", "to", "old"), kDenied);
   }
   EXPECT_EQ(RunHere("tree", "tree", "new"), row_.same);
   EXPECT_EQ(RunHere("tree", "tree/sub", "new"), row_.inside);
@@ -220,8 +224,12 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
   // What is in the source, on disk, is not removed for a move or copy that cannot succeed.
   const OrbResult doomed = row_.existing == 0 ? kInside : kUnknown;
   EXPECT_EQ(RunHere("tree", "link/sub", "old"), doomed);
-  for (const char* name : {"", ".", ".."})
-    EXPECT_EQ(RunHere("file", "to", name), kOrbErrInvalidName);
+  for (const std::string name : {"", ".", "..", "/", "//", "../", "to/.."}) {
+    const bool isLetter = row_.form == std::string("MoveFile") && name.find('/') != name.npos;
+    if (!isLetter) {
+      EXPECT_EQ(RunHere("file", "to", name.c_str()), kOrbErrInvalidName) << name;
+    }
+  }
   EXPECT_EQ(Run(folder_ / "file", "", "old"), kOrbErrEmptyPath);
   EXPECT_EQ(RunHere("file", "missing", "new"), kMissing);
   EXPECT_TRUE(Describe(folder_.Path()) == before);

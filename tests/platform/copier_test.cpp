@@ -302,4 +302,23 @@ TEST(CopyItem, LeavesCompleteCopiesOrNoneWhenTheProcessIsKilled) {
     EXPECT_TRUE(ReadAll(copy.path().string()) == whole) << copy.path();
 }
 
+TEST(CopyItem, KeepsTheLockBesideMoreNamesThanAreListed) {
+  const TempFolder folder;
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(orb::test::MountTmpfs(folder / "many", "size=4m"));
+    const std::string source = folder.Write("many/source", "x");
+    for (int i = 100; i < 400; ++i) {
+      const std::string name = "user." + std::to_string(i) + std::string(240, 'n');
+      ASSERT_EQ(::setxattr(source.c_str(), name.c_str(), "", 0, 0), 0);
+    }
+    ASSERT_TRUE(Items::Current().SetCreated(source, {1000000000, 0}));
+    ASSERT_TRUE(Items::Current().SetLocked(source, true));
+    ASSERT_TRUE(CopyItem(source, folder / "many/copy"));
+    const auto record = Items::Current().ReadRecord(folder / "many/copy");
+    ASSERT_TRUE(record);
+    EXPECT_EQ(record.Value().created.seconds, 1000000000);
+    EXPECT_TRUE(record.Value().locked);
+  }));
+}
+
 }  // namespace

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "platform/mover.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -243,6 +244,33 @@ TEST(MoveItem, LosesNothingWhenItIsKilledOnTheWayToAnotherVolume) {
     }
     EXPECT_TRUE(arrived);
   }));
+}
+
+// The lease tells when the copy comes to the second file: the first is written to, or the tree
+// goes.
+TEST(MoveItem, LosesNothingOfATreeThatChangesMeanwhile) {
+  const TempFolder folder;
+  static int first, second;
+  static std::string tree, away;
+  for (const char* elsewhere : {"", "a/away"}) {
+    ORB_IN_CHILD(RunWithPrivateMounts([&] {
+      MakeVolumes(folder);
+      tree = folder / "a/tree";
+      away = *elsewhere == '\0' ? "" : folder / elsewhere;
+      first = ::open((tree + "/100%.jpg").c_str(), O_WRONLY | O_APPEND | O_CLOEXEC);
+      second = ::open((tree + "/sub/big").c_str(), O_RDWR | O_CLOEXEC);
+      ::signal(SIGIO, [](int) {
+        const bool done =
+            away.empty() ? ::write(first, "!", 1) == 1 : ::rename(tree.c_str(), away.c_str()) == 0;
+        ::close(done ? second : first);
+      });
+      ASSERT_EQ(::fcntl(second, F_SETLEASE, F_WRLCK), 0);
+      EXPECT_FALSE(MoveItem(tree, folder / "b/tree"));
+      EXPECT_EQ(ReadAll((away.empty() ? tree : away) + "/100%.jpg"),
+                away.empty() ? "photo!" : "photo");
+      EXPECT_EQ(ReadAll(folder / "b/tree/100%.jpg"), away.empty() ? "" : "photo");
+    }));
+  }
 }
 
 }  // namespace

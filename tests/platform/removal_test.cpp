@@ -13,6 +13,7 @@
 #include "platform/item_relations.h"
 #include "platform/items.h"
 #include "support/faults.h"
+#include "support/refused_calls.h"
 #include "support/temp_folder.h"
 #include "support/trees.h"
 
@@ -29,6 +30,7 @@ using orb::platform::RemoveItem;
 using orb::platform::ResolvedPath;
 using orb::platform::UnlinkItem;
 using orb::test::ReadAll;
+using orb::test::RunInChild;
 using orb::test::RunWithPrivateMounts;
 using orb::test::TempFolder;
 
@@ -72,6 +74,27 @@ TEST(RemoveItem, RefusesLockedItemsAndPathsThatNameNoEntry) {
   }
   ASSERT_TRUE(Items::Current().SetLocked(folder / "tree/sub/file", true));
   EXPECT_EQ(ErrorOf(UnlinkItem(folder / "tree/sub/file")), kNotPermitted);
+}
+
+// As kernels before 6.13 and sandboxes answer that do not know the call.
+TEST(RemoveItem, FindsLocksWhereTheKernelCannotLookThemUpInAFolder) {
+  constexpr long kGetAttributeAt = 464;
+  for (const int error : {ENOSYS, EPERM}) {
+    const TempFolder folder;
+    fs::create_directories(folder / "tree");
+    folder.Write("tree/file", "x");
+    ORB_IN_CHILD(RunInChild(
+        [&] {
+          return orb::test::RefuseCalls({{kGetAttributeAt, error}});
+        },
+        [&] {
+          ASSERT_TRUE(Items::Current().SetLocked(folder / "tree/file", true));
+          EXPECT_EQ(ErrorOf(RemoveItem(folder / "tree")), kNotPermitted);
+          ASSERT_TRUE(Items::Current().SetLocked(folder / "tree/file", false));
+          EXPECT_TRUE(RemoveItem(folder / "tree"));
+        }));
+    EXPECT_FALSE(fs::exists(folder / "tree"));
+  }
 }
 
 TEST(RemoveItem, DoesNotEnterAVolumeMountedInside) {
@@ -145,6 +168,18 @@ TEST(IsItemOrAbove, KnowsItemsUnderEveryPathButNotTheirHardLinks) {
             fs::canonical(folder.Path()).string() + "/link");
   EXPECT_EQ(ResolvedPath("/").Value(), "/");
   EXPECT_EQ(ResolvedPath("/tmp").Value(), "/tmp");
+}
+
+TEST(RemoveItem, GoesOnWhenSomebodyElseRemovesSomeOfIt) {
+  const TempFolder folder;
+  fs::create_directory(folder / "tree");
+  for (int i = 0; i < 3'000; ++i) folder.Write("tree/" + std::to_string(i), "");
+  std::thread other([&] {
+    std::error_code ignored;
+    for (int i = 3'000; --i >= 0;) fs::remove(folder / ("tree/" + std::to_string(i)), ignored);
+  });
+  EXPECT_TRUE(RemoveItem(folder / "tree"));
+  other.join();
 }
 
 }  // namespace

@@ -3,11 +3,14 @@
 
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
+#include <atomic>
 #include <filesystem>
 #include <regex>
 #include <sstream>
 #include <string>
+#include <thread>
 
 #include "platform/items.h"
 #include "platform/trash_text.h"
@@ -54,9 +57,9 @@ TEST(TrashText, NumbersNamesAndKeepsThemShort) {
 
 TEST(TrashText, ListsFolderSizesOnce) {
   const auto isThere = [](const std::string& name) { return name != "gone"; };
-  EXPECT_EQ(WithFolderSize("1 2 a%20b\n3 4 gone\n5 6 kept\n", {7, 8, "a b"}, isThere),
+  EXPECT_EQ(WithFolderSizes("1 2 a%20b\n3 4 gone\n5 6 kept\n", {{7, 8, "a b"}}, isThere),
             "5 6 kept\n7 8 a%20b\n");
-  EXPECT_EQ(WithFolderSize("", {7, 8, "%"}, isThere), "7 8 %25\n");
+  EXPECT_EQ(WithFolderSizes("", {{7, 8, "%"}, {9, 9, "a"}}, isThere), "7 8 %25\n9 9 a\n");
 }
 
 bool RunShell(const std::string& command) { return std::system(command.c_str()) == 0; }
@@ -352,6 +355,7 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
     const std::string sticky = Make("volume/sticky/a.jpg");
     fs::permissions(Volume() + "/sticky", fs::perms(01777));
     const std::string closed = Make("volume/closed/a.jpg");
+    const std::string burnt = Make("volume/in/from a disc/a.jpg");
     ASSERT_EQ(::setresuid(65534, 65534, 65534), 0);
     EXPECT_TRUE(Put(file).Ok());
     EXPECT_FALSE(fs::exists(file));
@@ -359,7 +363,8 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
     fs::remove_all(Home());
     EXPECT_FALSE(Put(sticky).Ok());
     EXPECT_FALSE(Put(closed).Ok());
-    EXPECT_TRUE(fs::exists(sticky) && fs::exists(closed));
+    EXPECT_FALSE(Put(fs::path(burnt).parent_path()).Ok());
+    EXPECT_TRUE(fs::exists(sticky) && fs::exists(closed) && fs::exists(burnt));
     EXPECT_TRUE(IsEmpty(Home()));
   }));
 }
@@ -370,6 +375,7 @@ TEST_F(TrashOnVolume, CopiesWhereTheVolumeDoesNotRename) {
     for (const char* layer : {"upper", "work"})
       fs::create_directories(folder_ / ("layers/" + std::string(layer)));
     Make("layers/lower/trip/a.jpg", "below");
+    Make("layers/lower/tour/a.jpg", "below");
     fs::create_directory(Volume());
     const std::string options = "lowerdir=" + (folder_ / "layers/lower") +
                                 ",redirect_dir=off,upperdir=" + (folder_ / "layers/upper") +
@@ -381,6 +387,10 @@ TEST_F(TrashOnVolume, CopiesWhereTheVolumeDoesNotRename) {
     EXPECT_FALSE(fs::exists(Volume() + "/trip"));
     EXPECT_EQ(test::ReadAll(Home() + "/files/trip/a.jpg"), "below");
     EXPECT_TRUE(IsEmpty(Own()));
+
+    const test::ScopedVariable data("XDG_DATA_HOME", Volume() + "/data");
+    EXPECT_TRUE(Put(Volume() + "/tour").Ok()) << "nor the volume of the home";
+    EXPECT_EQ(test::ReadAll(Volume() + "/data/Trash/files/tour/a.jpg"), "below");
   }));
 }
 
@@ -424,6 +434,24 @@ TEST_F(TrashOnVolume, IsListedAndRestoredByTrashCli) {
       EXPECT_TRUE(Put(Make(std::string(place) + "twice.jpg", "2")).Ok());
     }
     EXPECT_TRUE(RunShell("test $(trash-list | grep -c /twice.jpg) = 6"));
+  }));
+}
+
+TEST_F(TrashOnVolume, KeepsTheCopyOfWhatSomebodyElseRemoves) {
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    ASSERT_TRUE(Mount());
+    fs::create_directory_symlink(Items(), Own());  // So that only the copy is left.
+    const std::string file = Make("volume/a.jpg", "photo");
+    std::atomic<bool> done = false;
+    std::thread other([&] {
+      while (!done && !fs::exists(Home() + "/files/a.jpg")) std::this_thread::yield();
+      ::unlink(file.c_str());
+    });
+    (void)Put(file);
+    done = true;
+    other.join();
+    EXPECT_EQ(test::ReadAll(Home() + "/files/a.jpg"), "photo");
+    EXPECT_EQ(PathIn(Home(), "a.jpg"), file);
   }));
 }
 

@@ -7,6 +7,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cstdint>
 #include <memory>
 
 #include "platform/linux/posix.h"
@@ -111,8 +112,10 @@ Status CopySmall(int from, int to, std::size_t size) {
   return WriteBlock(to, std::span(block).first(size));
 }
 
-/// A file system that does not tell of holes has one stretch of data.
+/// A file system that does not tell of holes has one stretch of data. The copy has its length from
+/// the start: XFS fills holes at the end of a growing file with room for more.
 Status CopyStretches(int from, int to, off_t size) {
+  if (Status sized = SetLength(to, size); !sized) return sized;
   Carrier carrier(from, to);
   for (off_t offset = 0; offset < size;) {
     const off_t data = ::lseek(from, offset, SEEK_DATA);
@@ -125,21 +128,21 @@ Status CopyStretches(int from, int to, off_t size) {
   }
   struct stat now;
   if (::fstat(from, &now) != 0) return LastError();
-  return now.st_size < size ? EndedEarly() : SetLength(to, size);
+  return now.st_size < size ? EndedEarly() : Status();
 }
 
-bool MayHaveHoles(const struct stat& source) {
-  constexpr off_t kStatUnit = 512;
-  return source.st_blocks < source.st_size / kStatUnit;
+bool MayHaveHoles(const StatusRecord& source) {
+  constexpr std::uint64_t kStatUnit = 512;
+  return source.stx_blocks < source.stx_size / kStatUnit;
 }
 
 }  // namespace
 
-Status CopyFileData(int from, int to, const struct stat& source) {
-  const off_t size = source.st_size;
+Status CopyFileData(int from, int to, const StatusRecord& source, off_t cloneAbove) {
+  const auto size = static_cast<off_t>(source.stx_size);
   if (size == 0) return CopyUntilEnd(from, to);
+  if (size > cloneAbove && ::ioctl(to, FICLONE, from) == 0) return TrimClone(to, size);
   if (size <= kSmallFile) return CopySmall(from, to, static_cast<std::size_t>(size));
-  if (::ioctl(to, FICLONE, from) == 0) return TrimClone(to, size);
   return MayHaveHoles(source) ? CopyStretches(from, to, size) : Carrier(from, to).Carry(0, size);
 }
 

@@ -50,8 +50,12 @@ Status Flush(int file) {
   return second && second.Close() ? Status() : Status(LastError());
 }
 
-Result<NewFile> NewFile::Create(int folder, mode_t mode) {
+Result<NewFile> NewFile::Create(int folder, mode_t mode, mode_t hiddenMode) {
   if (UniqueFd file = OpenNameless(folder, mode)) return NewFile(folder, std::move(file), {});
+  return CreateHidden(folder, hiddenMode);
+}
+
+Result<NewFile> NewFile::CreateHidden(int folder, mode_t mode) {
   for (int i = 0; i < kNameTries; ++i) {
     std::string name = RandomHiddenName();
     if (UniqueFd file = OpenExclusively(folder, name, mode))
@@ -68,13 +72,21 @@ NewFile::~NewFile() {
   if (file_ && !hiddenName_.empty()) ::unlinkat(folder_, hiddenName_.c_str(), 0);
 }
 
-Status NewFile::Publish(const char* name) {
-  if (Status flushed = Flush(file_.Get()); !flushed) return flushed;
+Status NewFile::Publish(const char* name, Closing closing) {
+  const Status flushed = closing == Closing::kMayFail ? Flush(file_.Get()) : Status();
+  if (!flushed) return flushed;
   const Status published =
       hiddenName_.empty() ? LinkNameless(file_.Get(), folder_, name)
                           : RenameWithoutReplacing(folder_, hiddenName_.c_str(), folder_, name);
   if (published) hiddenName_.clear();
   return published;
+}
+
+Status NewFile::Replace(const char* name) {
+  const char* const hidden = hiddenName_.c_str();
+  if (Retry([&] { return ::renameat(folder_, hidden, folder_, name); }) != 0) return LastError();
+  hiddenName_.clear();
+  return {};
 }
 
 }  // namespace orb::platform

@@ -4,6 +4,7 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 
+#include <functional>
 #include <optional>
 #include <utility>
 #include <vector>
@@ -18,6 +19,17 @@ namespace {
 
 /// Of the units in which the kernel counts.
 constexpr std::uint64_t kBlock = 512;
+
+/// Sums of these do not depend on the order in which a folder is listed.
+std::uint64_t StateOf(std::string entry, const struct stat& status) {
+  for (const auto value : {status.st_size,
+                           status.st_mtim.tv_sec,
+                           status.st_mtim.tv_nsec,
+                           status.st_ctim.tv_sec,
+                           status.st_ctim.tv_nsec})
+    entry.append(1, '/').append(std::to_string(value));
+  return std::hash<std::string>()(entry);
+}
 
 class Surveyor {
  public:
@@ -40,6 +52,7 @@ class Surveyor {
     if (!device_) device_ = status.st_dev;
     survey_.bytes += static_cast<std::uint64_t>(status.st_blocks) * kBlock;
     survey_.canBeRemoved &= status.st_dev == *device_;
+    survey_.state += StateOf(path, status);
     if (S_ISDIR(status.st_mode)) pending_.push_back(path);
     return purpose_ == SurveyFor::kRemoval ? LookForLock(path) : Status();
   }
@@ -54,15 +67,22 @@ class Surveyor {
     return {};
   }
 
+  /// Only a folder that is not empty needs it.
+  void LookForPermission(int folder) {
+    if (purpose_ != SurveyFor::kRemoval) return;
+    survey_.canBeRemoved &= ::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) == 0;
+  }
+
   Status VisitEntries(const std::string& path) {
     constexpr int kFlags = O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
     auto entries = FolderStream::Open(
         UniqueFd(Retry([&] { return ::openat(folder_, path.c_str(), kFlags); })));
     if (!entries) return entries.Reason();
-    while (true) {
+    for (bool isFirst = true;; isFirst = false) {
       const auto entry = entries.Value().Next();
       if (!entry) return entry.Reason();
       if (entry.Value().name == nullptr) return {};
+      if (isFirst) LookForPermission(entries.Value().Descriptor());
       const Status visited = Visit(path + '/' + entry.Value().name);
       if (!visited) return visited;
     }
