@@ -56,7 +56,7 @@ struct MountReply {
   std::uint32_t subtype;
   std::uint32_t source;
   std::array<std::byte, 384> later;
-  std::array<char, 3 * 4096> texts;
+  std::array<char, 12'288> texts;
 };
 static_assert(offsetof(MountReply, texts) == 512);
 
