@@ -146,6 +146,12 @@ void Report::AddShortage(const Shortage& shortage) {
        << FormatBytes(shortage.available) << (options_.dryRun ? "" : "; nothing was copied")
        << ". --fill copies what fits.\n"
        << std::flush;
+  if (!options_.json) return;
+  JsonLine line;
+  line.Text("status", "failed").Path("destination", shortage.folder);
+  line.Number("bytes", shortage.needed).Number("room", shortage.available);
+  line.Text("code", CodeName(kOrbErrDiskFull)).Text("reason", CodeMeaning(kOrbErrDiskFull));
+  out_ << line.Finished() << std::flush;
 }
 
 std::uint64_t Report::Copied() const {

@@ -131,7 +131,7 @@ constexpr CodeRow kCodes[] = {
     ORB_CODE(kOrbErrCanceled, "cancelled"),
     ORB_CODE(kOrbErrOutOfMemory, "out of memory"),
     ORB_CODE(kOrbErrEmptyPath, "empty path"),
-    ORB_CODE(kOrbErrDiskFull, "the destination is full"),
+    ORB_CODE(kOrbErrDiskFull, "there is no room in the destination"),
     ORB_CODE(kOrbErrUnknown, "failed for an unknown reason"),
     ORB_CODE(kOrbErrNotFound, "not found"),
     ORB_CODE(kOrbErrPathTooLong, "the path is too long"),
