@@ -1,9 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "clearing.h"
 
-#include <algorithm>
-#include <ranges>
-
 #include "interrupt.h"
 #include "paths.h"
 #include "text.h"
@@ -34,10 +31,10 @@ OrbResult ClearFile(const std::string& source) {
 void ClearShot(const Work& work, const ShotPlan& shot) {
   OrbResult code = CheckShot(work, shot);
   // The main file last: as long as it is there, the next import knows where the others belong.
-  for (const Step& step : shot.steps | std::views::reverse) {
-    if (code < kOrbErrFirst) code = ClearFile(work.SourceOf(step));
+  for (auto step = shot.steps.rbegin(); step != shot.steps.rend(); ++step) {
+    if (code < kOrbErrFirst) code = ClearFile(work.SourceOf(*step));
     const Status status = code < kOrbErrFirst ? Status::kTrashed : Status::kKept;
-    work.report.Add(status, work.items[step.item], shot.PathOf(step), code);
+    work.report.Add(status, work.items[step->item], shot.PathOf(*step), code);
     if (code >= kOrbErrFirst) code = kImportErrShotIncomplete;
   }
 }
