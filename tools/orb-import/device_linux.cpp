@@ -108,7 +108,7 @@ OrbResult CodeOfErrno() {
 
 /// Flushes the copy and forgets what memory keeps of it.
 OrbResult Settle(int copy) {
-  if (::fsync(copy) != 0) return CodeOfErrno();
+  if (::fsync(copy) != 0 && errno != EINVAL) return CodeOfErrno();  // Such as on a volume of a disc.
   ::posix_fadvise(copy, 0, 0, POSIX_FADV_DONTNEED);
   return kOrbNoErr;
 }

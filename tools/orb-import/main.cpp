@@ -63,7 +63,8 @@ class Run {
     const auto shortage = FindShortage(plans, scan_.items, options_.destination);
     if (options_.dryRun) ShowPlans(plans);
     if (shortage && !options_.fill) report_.AddShortage(*shortage);
-    if (options_.dryRun || plans.empty() || (shortage && !options_.fill)) return kDone;
+    if (options_.dryRun || (shortage && !options_.fill)) return kDone;
+    if (plans.empty() && promises.empty()) return kDone;
     if (!journal_.Open(options_.destination)) {
       return Complain(kSomeFailed,
                       "another import into " + Quote(options_.destination) + " is at work");
