@@ -138,7 +138,7 @@ TEST_F(Import, LeavesNothingOfAPhotoForWhichThereIsNoRoom) {
   EXPECT_EQ(Tree(), (Files{{"2024/2024-05-01/small.jpg", "small"}}));
 }
 
-/// A file that takes long to copy and no room on the card.
+/// A file that takes long to copy and no room on the card. There need not be any for the copy.
 void PutHole(const std::string& path) {
   fs::resize_file(path, 8ull << 30);
   SetTime(path, kMayFirst);
@@ -156,7 +156,7 @@ TEST_F(Import, StopsAtOnceOnCtrlC) {
   PutHole(Put("b.mov", "b"));
   Put("b.xmp", "b");
   const std::string day = Photos("2024/2024-05-01/");
-  const pid_t child = Start({folder_ / "card", folder_ / "photos"});
+  const pid_t child = Start({"--fill", folder_ / "card", folder_ / "photos"});
   Await([&] { return fs::exists(day + "b.mov") && fs::file_size(day + "b.mov") > 0; });
   const Ended second = Run();  // Meanwhile nobody else may work there.
   ::kill(child, SIGINT);
@@ -176,7 +176,7 @@ TEST_F(Import, DrawsABarOnATerminal) {
     ::setenv("TERM", "xterm", 1);
     ::setenv("NO_COLOR", "1", 1);
     const std::string card = folder_ / "card";
-    ::execl(ORB_IMPORT, ORB_IMPORT, card.c_str(), Photos().c_str(), nullptr);
+    ::execl(ORB_IMPORT, ORB_IMPORT, "--fill", card.c_str(), Photos().c_str(), nullptr);
     ::_exit(127);
   }
   const auto start = std::chrono::steady_clock::now();

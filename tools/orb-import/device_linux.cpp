@@ -28,6 +28,8 @@ class Descriptor {
   Descriptor(const std::string& path, int flags)
       : number_(::open(path.c_str(), flags | O_RDONLY | O_NONBLOCK | O_CLOEXEC)) {}
   Descriptor(Descriptor&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
+  Descriptor(const Descriptor&) = delete;
+  Descriptor& operator=(const Descriptor&) = delete;
   Descriptor& operator=(Descriptor&&) = delete;
   ~Descriptor() {
     if (number_ >= 0) ::close(number_);
@@ -108,7 +110,8 @@ OrbResult CodeOfErrno() {
 
 /// Flushes the copy and forgets what memory keeps of it.
 OrbResult Settle(int copy) {
-  if (::fsync(copy) != 0 && errno != EINVAL) return CodeOfErrno();  // Such as on a volume of a disc.
+  if (::fsync(copy) != 0 && errno != EINVAL)
+    return CodeOfErrno();  // Such as on a volume of a disc.
   ::posix_fadvise(copy, 0, 0, POSIX_FADV_DONTNEED);
   return kOrbNoErr;
 }
