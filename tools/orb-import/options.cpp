@@ -26,9 +26,9 @@ Options:
                         (default: %Y/%Y-%m-%d)
       --verify          read each copy back from the device and compare it with its
                         source; a copy that differs is taken away again
-      --move            --verify, and then put what came through into the trash of
-                        its volume, shot by shot; files that were in DESTINATION
-                        before go there only when all their bytes are the same
+      --move            --verify, and then put the files that came through into the
+                        trash of their volume, shot by shot; those that DESTINATION
+                        had before only when all bytes are the same
       --fill            where there is no room for all, copy what fits
   -n, --dry-run         print what would be done and do nothing
       --json            print one JSON object a line and item
