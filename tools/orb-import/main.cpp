@@ -60,10 +60,8 @@ class Run {
     Planner planner(scan_.items, options_.layout, view);
     std::vector<ShotPlan> plans = PlanAll(planner);
     if (InterruptingSignal() != 0) return kDone;
-    const auto shortage = FindShortage(plans, scan_.items, options_.destination);
     if (options_.dryRun) ShowPlans(plans);
-    if (shortage && !options_.fill) report_.AddShortage(*shortage);
-    if (options_.dryRun || (shortage && !options_.fill)) return kDone;
+    if (IsTooMuch(plans) || options_.dryRun) return kDone;
     if (plans.empty() && promises.empty()) return kDone;
     if (!journal_.Open(options_.destination)) {
       return Complain(kSomeFailed,
@@ -89,6 +87,14 @@ class Run {
       plans.push_back(planner.Plan(shots_[i], i));
     }
     return plans;
+  }
+
+  /// Tells so, too.
+  bool IsTooMuch(const std::vector<ShotPlan>& plans) {
+    if (options_.fill) return false;
+    const auto shortage = FindShortage(plans, scan_.items, options_.destination);
+    if (shortage) report_.AddShortage(*shortage);
+    return shortage.has_value();
   }
 
   void ShowPlans(const std::vector<ShotPlan>& plans) {
