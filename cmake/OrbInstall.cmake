@@ -4,7 +4,7 @@ set(orb_package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/OrbRTL)
 
 install(TARGETS OrbRTL EXPORT OrbRTLTargets FILE_SET HEADERS)
 if(TARGET orb-import)
-  install(TARGETS orb-import)
+  install(TARGETS orb-import orb-rename)
 endif()
 install(EXPORT OrbRTLTargets NAMESPACE OrbRTL:: DESTINATION ${orb_package_dir})
 

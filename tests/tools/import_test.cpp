@@ -1,122 +1,15 @@
 // SPDX-License-Identifier: MIT
-#include <fcntl.h>
-#include <gtest/gtest.h>
 #include <pty.h>
 #include <sys/resource.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 #include <chrono>
 #include <csignal>
-#include <filesystem>
-#include <fstream>
-#include <functional>
-#include <map>
-#include <sstream>
 #include <thread>
 
-#include "importer.h"
-#include "support/temp_folder.h"
+#include "import_fixture.h"
 
 namespace orbimport {
 namespace {
-
-namespace fs = std::filesystem;
-using orb::test::TempFolder;
-
-std::string ReadAll(const std::string& path) {
-  std::ostringstream bytes;
-  bytes << std::ifstream(path, std::ios::binary).rdbuf();
-  return bytes.str();
-}
-
-constexpr std::time_t kMayFirst = 1714557600;  // 2024-05-01 10:00:00 UTC.
-
-void SetTime(const std::string& path, std::time_t seconds) {
-  const timespec times[2] = {{seconds, 250'000'000}, {seconds, 250'000'000}};
-  ASSERT_EQ(::utimensat(AT_FDCWD, path.c_str(), times, AT_SYMLINK_NOFOLLOW), 0);
-}
-
-std::time_t TimeOf(const std::string& path) {
-  struct stat status = {};
-  EXPECT_EQ(::lstat(path.c_str(), &status), 0) << path;
-  return status.st_mtime;
-}
-
-/// Bytes that differ from file to file and from place to place.
-std::string Bytes(std::size_t count, unsigned seed) {
-  std::string bytes(count, '\0');
-  for (char& c : bytes) c = static_cast<char>((seed = seed * 1664525 + 1013904223) >> 24);
-  return bytes;
-}
-
-struct Ended {
-  int exitCode = -1;  // -1 for a process that a signal killed.
-  std::string out, err;
-};
-
-/// A card, a destination and the tool between them, in UTC.
-class Import : public testing::Test {
- protected:
-  std::string Card(const std::string& name) const { return folder_ / ("card/" + name); }
-  std::string Photos(const std::string& name = "") const { return folder_ / ("photos/" + name); }
-
-  std::string Put(const std::string& name, const std::string& bytes, std::time_t time = kMayFirst) {
-    const std::string path = Card(name);
-    fs::create_directories(fs::path(path).parent_path());
-    folder_.Write("card/" + name, bytes);
-    SetTime(path, time);
-    return path;
-  }
-
-  pid_t Start(
-      std::vector<std::string> args, const std::function<void()>& prepare = [] {}) {
-    args.insert(args.begin(), ORB_IMPORT);
-    std::vector<char*> argv;
-    for (std::string& arg : args) argv.push_back(arg.data());
-    argv.push_back(nullptr);
-    const pid_t child = ::fork();
-    if (child != 0) return child;
-    ::setenv("TZ", "UTC0", 1);
-    constexpr int kFlags = O_WRONLY | O_CREAT | O_TRUNC;
-    ::dup2(::open((folder_ / "out").c_str(), kFlags, 0644), STDOUT_FILENO);
-    ::dup2(::open((folder_ / "err").c_str(), kFlags, 0644), STDERR_FILENO);
-    prepare();
-    ::execv(ORB_IMPORT, argv.data());
-    ::_exit(127);
-  }
-
-  Ended Wait(pid_t child) {
-    int status = 0;
-    EXPECT_EQ(::waitpid(child, &status, 0), child);
-    return {WIFEXITED(status) ? WEXITSTATUS(status) : -1,
-            ReadAll(folder_ / "out"),
-            ReadAll(folder_ / "err")};
-  }
-
-  Ended Run(const std::vector<std::string>& options = {}) {
-    std::vector<std::string> args = options;
-    args.insert(args.end(), {folder_ / "card", folder_ / "photos"});
-    return Wait(Start(args));
-  }
-
-  /// What is below the destination: the files' paths, each with its bytes.
-  std::map<std::string, std::string> Tree() const {
-    std::map<std::string, std::string> tree;
-    if (!fs::exists(Photos())) return tree;
-    for (const auto& entry : fs::recursive_directory_iterator(Photos())) {
-      if (!entry.is_directory()) {
-        tree[entry.path().lexically_relative(Photos()).string()] = ReadAll(entry.path().string());
-      }
-    }
-    return tree;
-  }
-
-  TempFolder folder_;
-};
-
-using Files = std::map<std::string, std::string>;
 
 TEST_F(Import, BringsEverythingOnceWithItsTime) {
   Put("DCIM/100/IMG_1.CR2", Bytes(200'000, 1));
@@ -245,7 +138,7 @@ TEST_F(Import, LeavesNothingOfAPhotoForWhichThereIsNoRoom) {
   EXPECT_EQ(Tree(), (Files{{"2024/2024-05-01/small.jpg", "small"}}));
 }
 
-/// A file that takes long to copy and no room on the card.
+/// A file that takes long to copy and no room on the card. There need not be any for the copy.
 void PutHole(const std::string& path) {
   fs::resize_file(path, 8ull << 30);
   SetTime(path, kMayFirst);
@@ -263,7 +156,7 @@ TEST_F(Import, StopsAtOnceOnCtrlC) {
   PutHole(Put("b.mov", "b"));
   Put("b.xmp", "b");
   const std::string day = Photos("2024/2024-05-01/");
-  const pid_t child = Start({folder_ / "card", folder_ / "photos"});
+  const pid_t child = Start({"--fill", folder_ / "card", folder_ / "photos"});
   Await([&] { return fs::exists(day + "b.mov") && fs::file_size(day + "b.mov") > 0; });
   const Ended second = Run();  // Meanwhile nobody else may work there.
   ::kill(child, SIGINT);
@@ -283,7 +176,7 @@ TEST_F(Import, DrawsABarOnATerminal) {
     ::setenv("TERM", "xterm", 1);
     ::setenv("NO_COLOR", "1", 1);
     const std::string card = folder_ / "card";
-    ::execl(ORB_IMPORT, ORB_IMPORT, card.c_str(), Photos().c_str(), nullptr);
+    ::execl(ORB_IMPORT, ORB_IMPORT, "--fill", card.c_str(), Photos().c_str(), nullptr);
     ::_exit(127);
   }
   const auto start = std::chrono::steady_clock::now();
@@ -317,14 +210,6 @@ void ExpectNoFalseWhole(const Files& card, const std::string& day) {
     const std::string path = day + name;
     if (!fs::exists(path) || fs::file_size(path) != bytes.size()) continue;
     EXPECT_TRUE(TimeOf(path) != kMayFirst || ReadAll(path) == bytes) << path;
-  }
-}
-
-/// The journal stands from before the first file is made until all are whole.
-void WaitUntilUnderWay(pid_t child, const std::string& journal) {
-  siginfo_t ended{};
-  while (!fs::exists(journal) && ended.si_pid == 0) {
-    if (::waitid(P_PID, static_cast<id_t>(child), &ended, WEXITED | WNOHANG | WNOWAIT) != 0) return;
   }
 }
 
@@ -397,44 +282,6 @@ TEST_F(Import, TakesOnlyItsOwnUnfinishedFilesAway) {
                              {"2024/2024-05-01/gone.jpg", "of another card"}}));
   EXPECT_EQ(TimeOf(folder_ / (day + "whole.jpg")), kMayFirst);
 }
-
-/// Runs the parts of the tool with something happening between the plan and its execution.
-class Meanwhile : public Import {
- protected:
-  bool RunWith(const std::function<void()>& happens) {
-    Options options;
-    options.source = folder_ / "card";
-    options.destination = folder_ / "photos";
-    std::string why;
-    options.layout.Set("D", why);
-    const ScanResult scan = Scan(options.source, options.destination, [] { return false; });
-    const std::vector<Shot> shots = MakeShots(scan.items);
-    Journal journal;
-    EXPECT_TRUE(journal.Open(options.destination));
-    FolderView view(options.source, options.destination, journal.Old());
-    Planner planner(scan.items, options.layout, view);
-    std::vector<ShotPlan> plans;
-    for (std::size_t i = 0; i < shots.size(); ++i) plans.push_back(planner.Plan(shots[i], i));
-    happens();
-    std::ostringstream out;
-    Report report(options, out, out);
-    Progress progress(Progress::Form::kNone);
-    const Work work{options.source,
-                    options.destination,
-                    scan.items,
-                    shots,
-                    planner,
-                    view,
-                    journal,
-                    progress,
-                    report};
-    Importer importer(work);
-    importer.Run(std::move(plans));
-    journal.Remove();
-    EXPECT_TRUE(importer.Left().empty());
-    return !report.HasFailures();
-  }
-};
 
 TEST_F(Meanwhile, AShotMovesOnTogetherWhenOneOfItsNamesIsTaken) {
   Put("I.CR2", "raw");

@@ -64,6 +64,8 @@ TEST(Format, BytesDurationsTypesAndCodes) {
   EXPECT_EQ(TypeName(eOrbFileType_Unknown), "other");
   EXPECT_EQ(CodeName(kOrbErrDiskFull), "kOrbErrDiskFull");
   EXPECT_EQ(CodeName(0x1999), "0x1999");
+  EXPECT_EQ(DriveText(eOrbDriveType_Removable), "a removable medium");
+  EXPECT_EQ(DriveText(eOrbDriveType_RemovableReadOnly), "a write-protected medium");
 }
 
 }  // namespace

@@ -4,6 +4,7 @@
 #include <algorithm>
 
 #include "interrupt.h"
+#include "paths.h"
 #include "text.h"
 
 namespace orbimport {
@@ -27,18 +28,6 @@ bool OnPiece(void* data) {
   return InterruptingSignal() == 0;
 }
 
-/// A source that vanished meanwhile copies as nothing, and one that grew or shrank is no photo yet:
-/// only what still is as it was planned counts.
-OrbResult CheckUnchanged(const std::string& source, const Item& item, const std::string& copy) {
-  const COrbFileHandle now(OrbPath(source));
-  COrbTime modified;
-  const OrbResult read = now.GetUpdateTime(&modified);
-  if (read >= kOrbErrFirst) return read;
-  const bool isSame = now.GetFileSize() == item.size && modified == item.modified &&
-                      COrbFileHandle(OrbPath(copy)).GetFileSize() == item.size;
-  return isSame ? kOrbNoErr : kOrbErrUnknown;
-}
-
 bool NeedsWork(const ShotPlan& plan) {
   return std::any_of(plan.steps.begin(), plan.steps.end(), [](const Step& step) {
     return step.action != Action::kLeave;
@@ -56,6 +45,17 @@ std::vector<Promise> PromisesOf(const ShotPlan& plan, const std::vector<Item>& i
 }
 
 }  // namespace
+
+/// A source that vanished meanwhile copies as nothing, and one that grew or shrank is no photo yet.
+OrbResult CheckUnchanged(const std::string& source, const Item& item, const std::string& copy) {
+  const COrbFileHandle now(OrbPath(source));
+  COrbTime modified;
+  const OrbResult read = now.GetUpdateTime(&modified);
+  if (read >= kOrbErrFirst) return read;
+  const bool isSame = now.GetFileSize() == item.size && modified == item.modified &&
+                      COrbFileHandle(OrbPath(copy)).GetFileSize() == item.size;
+  return isSame ? kOrbNoErr : OrbResult{kImportErrSourceChanged};
+}
 
 Totals TotalsOf(const std::vector<ShotPlan>& plans, const std::vector<Item>& items) {
   Totals totals;
@@ -90,16 +90,30 @@ OrbResult Importer::Promise(const std::vector<ShotPlan>& plans) {
 void Importer::ImportShot(ShotPlan& plan, OrbResult promised) {
   OrbResult prepared = promised;
   if (promised < kOrbErrFirst && NeedsWork(plan)) prepared = Prepare(plan);
+  std::vector<Step> whole;
   for (const Step& step : plan.steps) {
     if (InterruptingSignal() != 0) break;
-    if (step.action == Action::kLeave)
-      Finish(Status::kPresent, plan, step, kOrbNoErr);
-    else if (prepared >= kOrbErrFirst)
-      Finish(Status::kFailed, plan, step, prepared);
-    else
-      CarryOut(plan, step);
+    const bool isReady = step.action == Action::kLeave || prepared < kOrbErrFirst;
+    const OrbResult code = isReady ? CarryOut(plan, step) : prepared;
+    if (code == kOrbErrCanceled) break;
+    Finish(plan, step, code);
+    if (code < kOrbErrFirst) whole.push_back(step);
   }
   ReleaseAll();
+  NoteShot(plan, whole);
+}
+
+void Importer::NoteShot(const ShotPlan& plan, const std::vector<Step>& whole) {
+  if (!whole.empty()) folders_.insert(work_.options.destination + "/" + plan.folder);
+  if (!work_.options.move || InterruptingSignal() != 0) return;
+  if (whole.size() == plan.steps.size()) {
+    safe_.push_back(plan);
+    return;
+  }
+  for (const Step& step : whole) {
+    const Item& item = work_.items[step.item];
+    work_.report.Add(Status::kKept, item, plan.PathOf(step), kImportErrShotIncomplete);
+  }
 }
 
 /// Reserves the names of a shot. When another program was quicker, all names of the shot are
@@ -107,7 +121,7 @@ void Importer::ImportShot(ShotPlan& plan, OrbResult promised) {
 OrbResult Importer::Prepare(ShotPlan& plan) {
   for (int tries = 0; tries < kMostPlans; ++tries) {
     const std::string folder = plan.folder.empty() ? "" : "/" + plan.folder;
-    OrbResult code = MakeFolder(work_.destination + folder);
+    OrbResult code = MakeFolder(work_.options.destination + folder);
     if (code >= kOrbErrFirst) return code;
     const Reserved reserved = ReserveAll(plan, code);
     if (reserved == Reserved::kYes) return kOrbNoErr;
@@ -132,7 +146,7 @@ Importer::Reserved Importer::ReserveAll(const ShotPlan& plan, OrbResult& code) {
 }
 
 Importer::Reserved Importer::Reserve(const ShotPlan& plan, const Step& step, OrbResult& code) {
-  const std::string wanted = FullPath(plan, step);
+  const std::string wanted = work_.CopyOf(plan, step);
   if (step.action == Action::kReplaceUnfinished) {
     const Found found = work_.view.LookNow(plan.PathOf(step), work_.items[step.item]);
     if (found != Found::kUnfinished) return Reserved::kTaken;
@@ -147,20 +161,30 @@ Importer::Reserved Importer::Reserve(const ShotPlan& plan, const Step& step, Orb
   return reserved_.back() == wanted ? Reserved::kYes : Reserved::kTaken;
 }
 
-void Importer::CarryOut(const ShotPlan& plan, const Step& step) {
-  const OrbResult code =
-      step.Copies() ? Fill(plan, step) : SetTimes(FullPath(plan, step), work_.items[step.item]);
-  if (code == kOrbErrCanceled) return;
-  Finish(code < kOrbErrFirst ? Status::kCopied : Status::kFailed, plan, step, code);
+OrbResult Importer::CarryOut(const ShotPlan& plan, const Step& step) {
+  if (step.action == Action::kLeave) return CheckPresent(plan, step);
+  if (step.Copies()) return Fill(plan, step);
+  const OrbResult verified = Verify(plan, step);
+  if (verified >= kOrbErrFirst) return verified;
+  return SetTimes(work_.CopyOf(plan, step), work_.items[step.item]);
+}
+
+/// Size and time say that a file is there already. Before the card's goes away its bytes have to.
+OrbResult Importer::CheckPresent(const ShotPlan& plan, const Step& step) {
+  if (!work_.options.move || IsSameFile(work_.SourceOf(step), work_.CopyOf(plan, step)))
+    return kOrbNoErr;
+  const OrbResult code = Verify(plan, step);
+  return code == kImportErrCopyDiffers ? OrbResult{kImportErrPresentDiffers} : code;
 }
 
 OrbResult Importer::Fill(const ShotPlan& plan, const Step& step) {
   const Item& item = work_.items[step.item];
   // What did not fit once is not tried again; smaller photos may still find room.
   if (item.size >= tooLarge_) return kOrbErrDiskFull;
-  const std::string path = FullPath(plan, step);
+  const std::string path = work_.CopyOf(plan, step);
   OrbResult code = Copy(plan, step);
-  if (code < kOrbErrFirst) code = CheckUnchanged(work_.source + "/" + item.path, item, path);
+  if (code < kOrbErrFirst) code = CheckUnchanged(work_.SourceOf(step), item, path);
+  if (code < kOrbErrFirst) code = Verify(plan, step);
   if (code < kOrbErrFirst) code = SetTimes(path, item);
   if (code < kOrbErrFirst) std::erase(reserved_, path);
   if (code == kOrbErrDiskFull) tooLarge_ = item.size;
@@ -168,14 +192,23 @@ OrbResult Importer::Fill(const ShotPlan& plan, const Step& step) {
 }
 
 OrbResult Importer::Copy(const ShotPlan& plan, const Step& step) {
-  const Item& item = work_.items[step.item];
-  const std::string path = FullPath(plan, step);
-  Filling filling{work_.progress, item.size};
-  return OrbCopyFileEx(OrbPath(work_.source + "/" + item.path),
+  const std::string path = work_.CopyOf(plan, step);
+  Filling filling{work_.progress, work_.items[step.item].size};
+  return OrbCopyFileEx(OrbPath(work_.SourceOf(step)),
                        OrbPath(path.substr(0, path.rfind('/'))),
                        OrbText(step.name),
                        OnPiece,
                        &filling);
+}
+
+OrbResult Importer::Verify(const ShotPlan& plan, const Step& step) {
+  if (!work_.options.verify) return kOrbNoErr;
+  const OrbResult code = work_.compare(work_.SourceOf(step), work_.CopyOf(plan, step), [&] {
+    work_.progress.Advance(0);
+    return InterruptingSignal() == 0;
+  });
+  if (code < kOrbErrFirst) work_.report.AddVerified();
+  return code;
 }
 
 /// The modification time last: it says that the file is whole.
@@ -193,16 +226,19 @@ void Importer::ReleaseAll() {
 void Importer::Release(const std::string& path) {
   if (OrbDeleteFile(OrbPath(path)) < kOrbErrFirst || !COrbFileHandle(OrbPath(path)).IsExist())
     return;
-  left_.push_back(path.substr(work_.destination.size() + 1));
+  left_.push_back(path.substr(work_.options.destination.size() + 1));
 }
 
-void Importer::Finish(Status status, const ShotPlan& plan, const Step& step, OrbResult code) {
+void Importer::Finish(const ShotPlan& plan, const Step& step, OrbResult code) {
   const Item& item = work_.items[step.item];
   const std::string path = plan.PathOf(step);
+  const bool isPresent = step.action == Action::kLeave;
+  const bool failed = code >= kOrbErrFirst;
   if (work_.report.PrintsItems()) work_.progress.Hide();
-  work_.report.Add(status, item, status == Status::kFailed ? "" : path, code);
-  const std::string failure = code < kOrbErrFirst ? "" : " failed: " + CodeName(code);
-  if (step.Copies()) work_.progress.EndFile(item.size, Quote(path) + failure);
+  const Status status = failed ? Status::kFailed : isPresent ? Status::kPresent : Status::kCopied;
+  work_.report.Add(status, item, failed && !isPresent ? "" : path, code);
+  if (!step.Copies()) return;
+  work_.progress.EndFile(item.size, Quote(path) + (failed ? " failed: " + CodeName(code) : ""));
 }
 
 }  // namespace orbimport

@@ -1,19 +1,18 @@
 // SPDX-License-Identifier: MIT
-#include <fcntl.h>
-#include <unistd.h>
-
 #include <exception>
-#include <filesystem>
 #include <iostream>
-#include <system_error>
 
+#include "clearing.h"
+#include "device_linux.h"
 #include "importer.h"
 #include "interrupt.h"
 #include "journal.h"
 #include "options.h"
+#include "paths.h"
 #include "plan.h"
 #include "progress.h"
 #include "report.h"
+#include "room.h"
 #include "scan.h"
 #include "shots.h"
 #include "text.h"
@@ -22,71 +21,12 @@
 namespace orbimport {
 namespace {
 
-namespace fs = std::filesystem;
-
 enum ExitCode : int { kDone = 0, kSomeFailed = 1, kUsage = 2, kSignalBase = 128 };
 
 int Complain(int exitCode, const std::string& what) {
   std::cerr << "orb-import: " << what << '\n';
   if (exitCode == kUsage) std::cerr << "Try 'orb-import --help'.\n";
   return exitCode;
-}
-
-std::string WithoutSlash(std::string path) {
-  while (path.size() > 1 && path.back() == '/') path.pop_back();
-  return path;
-}
-
-/// What is wrong with a path, for the user.
-std::string NoFolder(const char* role, const std::string& path, const std::error_code& error) {
-  const std::string reason = error ? ": " + error.message() : "";
-  return std::string(role) + " is no folder: " + Quote(path) + reason;
-}
-
-bool ResolveSource(std::string& source, std::string& why) {
-  std::error_code error;
-  const fs::path resolved = fs::canonical(source, error);
-  if (error || !fs::is_directory(resolved, error)) {
-    why = NoFolder("SOURCE", source, error);
-    return false;
-  }
-  source = resolved.string();
-  return true;
-}
-
-/// DESTINATION need not be there yet.
-bool ResolveDestination(std::string& destination, std::string& why) {
-  std::error_code error;
-  const fs::path resolved = fs::weakly_canonical(fs::absolute(destination, error), error);
-  const bool isTaken = !error && fs::exists(resolved, error) && !fs::is_directory(resolved, error);
-  if (error || destination.empty() || isTaken) {
-    why = NoFolder("DESTINATION", destination, error);
-    return false;
-  }
-  destination = WithoutSlash(resolved.string());
-  return true;
-}
-
-/// Makes both paths absolute, without links and dots, so that they can be told apart. False when
-/// they cannot be used; `why` then says so.
-bool ResolvePaths(Options& options, std::string& why) {
-  if (!ResolveSource(options.source, why) || !ResolveDestination(options.destination, why))
-    return false;
-  if (options.source == options.destination) {
-    why = "SOURCE and DESTINATION are the same folder";
-  } else if (!IsUtf8(options.source) || !IsUtf8(options.destination)) {
-    why = "the paths of SOURCE and DESTINATION must be UTF-8";
-  }
-  return why.empty();
-}
-
-/// So that the photos are on the device, and not only in memory, when the tool says so.
-bool FlushToDevice(const std::string& folder) {
-  const int descriptor = ::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-  if (descriptor < 0) return false;
-  const bool flushed = ::syncfs(descriptor) == 0;
-  ::close(descriptor);
-  return flushed;
 }
 
 class Run {
@@ -100,7 +40,8 @@ class Run {
     scan_ = Scan(options_.source, options_.destination, [] { return InterruptingSignal() != 0; });
     for (const Skip& skip : scan_.skips) report_.AddSkip(skip);
     for (const Failure& failure : scan_.failures) report_.AddFailure(failure);
-    const int exitCode = options_.dryRun ? ShowPlan() : Import();
+    shots_ = MakeShots(scan_.items);
+    const int exitCode = PlanAndImport();
     if (exitCode != kDone) return exitCode;
     const int signal = InterruptingSignal();
     report_.Close(signal != 0);
@@ -111,6 +52,35 @@ class Run {
   }
 
  private:
+  /// What is planned holds the names as they were a moment ago; the importer looks again. So the
+  /// journal is opened only when something is going to be done, and nothing is written before.
+  int PlanAndImport() {
+    const auto promises = Journal::Read(options_.destination);
+    FolderView view(options_.source, options_.destination, promises);
+    Planner planner(scan_.items, options_.layout, view);
+    std::vector<ShotPlan> plans = PlanAll(planner);
+    if (InterruptingSignal() != 0) return kDone;
+    if (options_.dryRun) ShowPlans(plans);
+    if (IsTooMuch(plans) || options_.dryRun) return kDone;
+    if (plans.empty() && promises.empty()) return kDone;
+    if (!journal_.Open(options_.destination)) {
+      return Complain(kSomeFailed,
+                      "another import into " + Quote(options_.destination) + " is at work");
+    }
+    if (journal_.Old() == promises)
+      CarryOut(planner, view, std::move(plans));
+    else
+      ImportAnew();
+    return kDone;
+  }
+
+  /// For when another import ended between our reading its journal and our opening it.
+  void ImportAnew() {
+    FolderView view(options_.source, options_.destination, journal_.Old());
+    Planner planner(scan_.items, options_.layout, view);
+    CarryOut(planner, view, PlanAll(planner));
+  }
+
   std::vector<ShotPlan> PlanAll(Planner& planner) {
     std::vector<ShotPlan> plans;
     for (std::size_t i = 0; i < shots_.size() && InterruptingSignal() == 0; ++i) {
@@ -119,57 +89,45 @@ class Run {
     return plans;
   }
 
-  int ShowPlan() {
-    const auto promises = Journal::Read(options_.destination);
-    FolderView view(options_.source, options_.destination, promises);
-    shots_ = MakeShots(scan_.items);
-    Planner planner(scan_.items, options_.layout, view);
-    for (const ShotPlan& plan : PlanAll(planner)) {
+  /// Tells so, too.
+  bool IsTooMuch(const std::vector<ShotPlan>& plans) {
+    if (options_.fill) return false;
+    const auto shortage = FindShortage(plans, scan_.items, options_.destination);
+    if (shortage) report_.AddShortage(*shortage);
+    return shortage.has_value();
+  }
+
+  void ShowPlans(const std::vector<ShotPlan>& plans) {
+    for (const ShotPlan& plan : plans) {
       for (const Step& step : plan.steps) {
         const Status status = step.action == Action::kLeave ? Status::kPresent : Status::kPlanned;
         report_.Add(status, scan_.items[step.item], plan.PathOf(step), kOrbNoErr);
       }
     }
-    return kDone;
-  }
-
-  /// kDone when it could be tried at all.
-  int Import() {
-    if (scan_.items.empty() || InterruptingSignal() != 0) return kDone;
-    if (!journal_.Open(options_.destination)) {
-      return Complain(kSomeFailed,
-                      "another import into " + Quote(options_.destination) + " is at work");
-    }
-    FolderView view(options_.source, options_.destination, journal_.Old());
-    shots_ = MakeShots(scan_.items);
-    Planner planner(scan_.items, options_.layout, view);
-    CarryOut(planner, view, PlanAll(planner));
-    return kDone;
   }
 
   void CarryOut(Planner& planner, FolderView& view, std::vector<ShotPlan> plans) {
     progress_.Begin(TotalsOf(plans, scan_.items));
-    const Work work{options_.source,
-                    options_.destination,
-                    scan_.items,
-                    shots_,
-                    planner,
-                    view,
-                    journal_,
-                    progress_,
-                    report_};
+    const Work work{options_, scan_.items, shots_, planner, view, journal_, progress_, report_};
     Importer importer(work);
     importer.Run(std::move(plans));
-    const bool interrupted = InterruptingSignal() != 0;
-    if (report_.Copied() > 0 && !interrupted) {
-      progress_.Say("Writing to the device...");
-      flushed_ = FlushToDevice(options_.destination);
-    }
+    if (InterruptingSignal() == 0) Secure(work, importer);
     progress_.Hide();
     std::vector<std::string> unfinished = view.Unfinished();
     unfinished.insert(unfinished.end(), importer.Left().begin(), importer.Left().end());
     for (const std::string& path : unfinished) report_.AddUnfinished(path);
     if (unfinished.empty() && flushed_) journal_.Remove();
+  }
+
+  /// So that the photos are on the device, and not only in memory, when the tool says so, and
+  /// before their sources go anywhere.
+  void Secure(const Work& work, const Importer& importer) {
+    if (report_.Copied() == 0 && importer.Safe().empty()) return;
+    progress_.Say("Writing to the device...");
+    flushed_ = FlushVolumes(importer.Folders());
+    if (!flushed_ || importer.Safe().empty()) return;
+    progress_.Say("Moving to the trash...");
+    ClearSource(work, importer.Safe());
   }
 
   const Options& options_;

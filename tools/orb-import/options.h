@@ -12,6 +12,9 @@ struct Options {
   std::string destination;
   Layout layout;
   bool dryRun = false;
+  bool verify = false;
+  bool move = false;  // Then `verify` as well.
+  bool fill = false;
   bool json = false;
   bool quiet = false;
   bool verbose = false;

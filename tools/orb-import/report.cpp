@@ -7,6 +7,7 @@
 #include <ostream>
 #include <string_view>
 
+#include "paths.h"
 #include "text.h"
 
 namespace orbimport {
@@ -41,6 +42,10 @@ const char* NameOf(Status status) {
       return "present";
     case Status::kPlanned:
       return "planned";
+    case Status::kTrashed:
+      return "trashed";
+    case Status::kKept:
+      return "kept";
     default:
       return "failed";
   }
@@ -81,6 +86,11 @@ std::string UtcText(const COrbTime& time) {
   return text;
 }
 
+/// Why a file stays that is no failure of its own.
+bool IsHarmless(OrbResult code) {
+  return code == kImportErrShotIncomplete || code == kOrbErrSamePath;
+}
+
 std::string Counted(std::uint64_t count, const char* what) {
   return std::to_string(count) + " " + what + (count == 1 ? "" : "s");
 }
@@ -98,10 +108,18 @@ void Report::Add(Status status, const Item& item, const std::string& destination
     case Status::kPresent:
       ++tally.present;
       break;
+    case Status::kTrashed:
+      ++trashed_;
+      trashedBytes_ += item.size;
+      break;
+    case Status::kKept:
+      ++kept_;
+      break;
     case Status::kFailed:
       ++tally.failed;
-      failures_.push_back({options_.source + "/" + item.path, code});
   }
+  if (code >= kOrbErrFirst && !IsHarmless(code))
+    failures_.push_back({options_.source + "/" + item.path, code});
   if (PrintsItems()) PrintItem(NameOf(status), item, destination, code);
 }
 
@@ -119,6 +137,21 @@ void Report::AddSkip(const Skip& skip) {
 
 void Report::AddUnfinished(const std::string& destination) {
   unfinished_.push_back(options_.destination + "/" + destination);
+}
+
+void Report::AddShortage(const Shortage& shortage) {
+  isShort_ = true;
+  err_ << "orb-import: kOrbErrDiskFull " << Quote(shortage.folder) << ": "
+       << FormatBytes(shortage.needed) << " to copy, and room for "
+       << FormatBytes(shortage.available) << (options_.dryRun ? "" : "; nothing was copied")
+       << ". --fill copies what fits.\n"
+       << std::flush;
+  if (!options_.json) return;
+  JsonLine line;
+  line.Text("status", "failed").Path("destination", shortage.folder);
+  line.Number("bytes", shortage.needed).Number("room", shortage.available);
+  line.Text("code", CodeName(kOrbErrDiskFull)).Text("reason", CodeMeaning(kOrbErrDiskFull));
+  out_ << line.Finished() << std::flush;
 }
 
 std::uint64_t Report::Copied() const {
@@ -168,8 +201,10 @@ void Report::Close(bool interrupted) {
   PrintProblems();
   if (options_.quiet) return;
   std::ostream& to = options_.json ? err_ : out_;
+  PrintPlaces(to);
   PrintTable(to);
   PrintSkips(to);
+  PrintSafety(to);
   if (interrupted) to << "Stopped before the end. The same command goes on from here.\n";
   to << std::flush;
 }
@@ -188,6 +223,14 @@ void Report::PrintProblems() {
     }
   }
   err_ << std::flush;
+}
+
+void Report::PrintPlaces(std::ostream& to) const {
+  const auto drive = [](const std::string& folder) {
+    return DriveText(COrbFileHandle(OrbPath(folder)).GetDriveType());
+  };
+  to << "From " << Quote(options_.source) << ", " << drive(options_.source) << "\nTo   "
+     << Quote(options_.destination) << ", " << drive(NearestFolder(options_.destination)) << '\n';
 }
 
 void Report::PrintTable(std::ostream& to) const {
@@ -225,6 +268,15 @@ void Report::PrintSkips(std::ostream& to) const {
     text += (text.empty() ? "" : ", ") + Counted(found->second, what);
   }
   if (!text.empty()) to << "Passed over: " << text << '\n';
+}
+
+void Report::PrintSafety(std::ostream& to) const {
+  if (verified_ > 0) to << "Read back and found equal: " << Counted(verified_, "file") << '\n';
+  if (trashed_ > 0) {
+    to << "Put into the trash: " << Counted(trashed_, "file") << ", " << FormatBytes(trashedBytes_)
+       << ", whose room is free when the trash is emptied\n";
+  }
+  if (kept_ > 0) to << "Imported, but left in SOURCE: " << Counted(kept_, "file") << '\n';
 }
 
 }  // namespace orbimport

@@ -131,7 +131,7 @@ constexpr CodeRow kCodes[] = {
     ORB_CODE(kOrbErrCanceled, "cancelled"),
     ORB_CODE(kOrbErrOutOfMemory, "out of memory"),
     ORB_CODE(kOrbErrEmptyPath, "empty path"),
-    ORB_CODE(kOrbErrDiskFull, "the destination is full"),
+    ORB_CODE(kOrbErrDiskFull, "there is no room in the destination"),
     ORB_CODE(kOrbErrUnknown, "failed for an unknown reason"),
     ORB_CODE(kOrbErrNotFound, "not found"),
     ORB_CODE(kOrbErrPathTooLong, "the path is too long"),
@@ -145,6 +145,12 @@ constexpr CodeRow kCodes[] = {
     ORB_CODE(kOrbErrSamePath, "source and destination are the same"),
     ORB_CODE(kOrbErrInsideSource, "the destination is inside the source"),
     ORB_CODE(kOrbErrInvalidTime, "invalid time"),
+    ORB_CODE(kImportErrCopyDiffers, "the copy, read back, is not what the source holds"),
+    ORB_CODE(kImportErrCopyUnreadable, "the copy cannot be read back"),
+    ORB_CODE(kImportErrPresentDiffers, "what is in its place already holds other bytes"),
+    ORB_CODE(kImportErrSourceChanged, "the file changed meanwhile"),
+    ORB_CODE(kImportErrNotTrashed, "the trash did not take it, so it stays"),
+    ORB_CODE(kImportErrShotIncomplete, "stays with what is left of its shot"),
 };
 #undef ORB_CODE
 
@@ -231,6 +237,21 @@ std::string TypeName(eOrbFileType type) {
   std::string name = extensions.front().GetPtrUtf8() + 1;
   for (char& c : name) c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
   return name;
+}
+
+std::string DriveText(unsigned int driveType) {
+  switch (driveType) {
+    case eOrbDriveType_Optical:
+      return "a CD or DVD";
+    case eOrbDriveType_Removable:
+      return "a removable medium";
+    case eOrbDriveType_RemovableReadOnly:
+      return "a write-protected medium";
+    case eOrbDriveType_Remote:
+      return "a network volume";
+    default:
+      return "a fixed disk";
+  }
 }
 
 std::string CodeName(OrbResult code) {

@@ -11,6 +11,16 @@
 /// Texts for people and programs. Names are bytes as the file system has them.
 namespace orbimport {
 
+/// What an import finds out by itself, beside the library's codes and above them all.
+enum ImportResult : OrbResult {
+  kImportErrCopyDiffers = 0x10001,
+  kImportErrCopyUnreadable,
+  kImportErrPresentDiffers,
+  kImportErrSourceChanged,
+  kImportErrNotTrashed,
+  kImportErrShotIncomplete,
+};
+
 /// Whether a name can be given to the library at all.
 bool IsUtf8(std::string_view bytes);
 
@@ -34,6 +44,8 @@ std::string FormatDuration(std::uint64_t seconds);
 
 /// JPEG, CR2, ...: the first extension of the type, in capitals.
 std::string TypeName(eOrbFileType type);
+/// A fixed disk, a network volume, ...: what COrbFileHandle::GetDriveType() says, for people.
+std::string DriveText(unsigned int driveType);
 /// kOrbErrDiskFull and the like, or the number of a code without a name.
 std::string CodeName(OrbResult code);
 /// What the code means, in a few words.
