@@ -163,7 +163,7 @@ class ORB_EXPORT COrbStringData::COrbStringValue {
                                          std::size_t length);
   class Hold;
   const COrbCriticalSection& Lock() const noexcept;
-  const COrbCriticalSection& MakeLock() const noexcept;
+  [[gnu::cold, gnu::noinline]] const COrbCriticalSection& MakeLock() const noexcept;
   template <typename Store>
   ORB_LOCAL OrbResult InitOnce(const void* text, std::uint8_t encoding, Store store);
   ORB_LOCAL const char* DeriveSystem() const;
@@ -222,7 +222,10 @@ inline void COrbStringData::Share(const COrbStringData& other) {
   COrbStringValue* const theirs = other.value;
   if (theirs == nullptr) return;
   const COrbStringValue::Hold hold(*theirs);
-  theirs->shared.store(true, std::memory_order_relaxed);
+  // Written once, so that the owners on other processors keep the value in their caches.
+  if (!theirs->shared.load(std::memory_order_relaxed)) {
+    theirs->shared.store(true, std::memory_order_relaxed);
+  }
   COrbStringData* const behind = other.next.load(std::memory_order_relaxed);
   value = theirs;
   prev.store(const_cast<COrbStringData*>(&other), std::memory_order_relaxed);
