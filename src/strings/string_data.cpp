@@ -18,9 +18,11 @@
 namespace {
 
 using orb::TextBuffer;
+using orb::platform::AsciiFromUtf16;
 using orb::platform::kNotUtf8;
 using orb::platform::kSlack;
 using orb::platform::MacRomanFromUtf16;
+using orb::platform::Utf16FromAscii;
 using orb::platform::Utf16FromUtf8;
 using orb::platform::Utf16Length;
 using orb::platform::Utf16LengthOfValid;
@@ -32,6 +34,8 @@ enum Master : std::uint8_t { kNone = 0, kSystem = 1, kUtf8 = 2, kUnicode = 3 };
 /// Up to here a text is converted on the stack and then copied at its size.
 constexpr std::size_t kShort = 256;
 constexpr std::size_t kMostOnStack = 3072;
+/// How much of a text is looked at before it is taken for ASCII.
+constexpr std::size_t kFirstLook = 64;
 
 /// Null without memory.
 void* BlockFor(std::size_t size) noexcept try {
@@ -103,6 +107,37 @@ Copy<unsigned short> Terminated(unsigned short* text, std::size_t length) {
   return {text, length};
 }
 
+/// Nothing where the text is not ASCII alone. Most texts that are not show it where they begin, and
+/// what others have cost by then is little.
+std::optional<Copy<unsigned short>> UnicodeFromAscii(std::string_view utf8) {
+  std::array<char16_t, kFirstLook> head;
+  const std::string_view first = utf8.substr(0, kFirstLook);
+  if (Utf16FromAscii(first, head.data()) != first.size()) return std::nullopt;
+  auto* made = Buffer<unsigned short>(UnicodeSize(utf8.size()));
+  if (made == nullptr) return std::nullopt;
+  const std::size_t length = Utf16FromAscii(utf8, reinterpret_cast<char16_t*>(made));
+  if (length == utf8.size()) return Terminated(made, length);
+  TextBuffer::Free(made);
+  return std::nullopt;
+}
+
+std::optional<Copy<char>> Utf8FromAscii(std::u16string_view units) {
+  std::array<char, kFirstLook> head;
+  const std::u16string_view first = units.substr(0, kFirstLook);
+  if (AsciiFromUtf16(first, head.data()) != first.size()) return std::nullopt;
+  auto* made = Buffer<char>(units.size() + 1);
+  if (made == nullptr) return std::nullopt;
+  made[units.size()] = '\0';
+  if (AsciiFromUtf16(units, made) == units.size()) return Copy<char>{made, units.size()};
+  TextBuffer::Free(made);
+  return std::nullopt;
+}
+
+Copy<char> Utf8From(std::u16string_view units) {
+  if (const auto ascii = Utf8FromAscii(units)) return *ascii;
+  return Written(3 * units.size(), [&](char* out) { return Utf8FromUtf16(units, out); });
+}
+
 Copy<unsigned short> ShortUnicode(std::string_view utf8) {
   std::array<char16_t, kShort + kSlack> units;
   std::size_t length = Utf16FromUtf8(utf8, units.data());
@@ -116,6 +151,7 @@ Copy<unsigned short> ShortUnicode(std::string_view utf8) {
 /// The second half of the room takes what the conversion overwrites. A text with fewer units than a
 /// third of its bytes is no UTF-8, and one with more has that much room.
 Copy<unsigned short> UnicodeFrom(std::string_view utf8) {
+  if (const auto ascii = UnicodeFromAscii(utf8)) return *ascii;
   if (utf8.size() <= kShort) return ShortUnicode(utf8);
   static_assert(kShort / 3 > kSlack);
   const std::size_t most = Utf16LengthOfValid(utf8);
@@ -257,8 +293,7 @@ const char* COrbStringData::COrbStringValue::DeriveUtf8() const {
   const auto* unicode = reinterpret_cast<const char16_t*>(unicodeText.load());
   const char* system = systemText.load();
   if (master == kUnicode && unicode != nullptr) {
-    const std::size_t length = TextBuffer::Length(unicode);
-    copy = Written(3 * length, [&](char* out) { return Utf8FromUtf16({unicode, length}, out); });
+    copy = Utf8From({unicode, TextBuffer::Length(unicode)});
   } else if (master == kSystem && system != nullptr) {
     const std::size_t length = TextBuffer::Length(system);
     copy = Written(3 * length, [&](char* out) { return Utf8FromMacRoman({system, length}, out); });
