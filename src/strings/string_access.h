@@ -42,9 +42,14 @@ struct StringAccess {
     const auto kind = static_cast<TextKind>(known - 1);
     return {text, {kind, length != kTooLong ? length : CountUnits(text)}};
   }
+  /// Has the memory behind the value come, where its text most likely lies, while the value itself
+  /// is still on its way.
+  static void Prefetch(const COrbStringData& s) {
+    __builtin_prefetch(reinterpret_cast<const char*>(s.value) + kCacheLine);
+  }
   /// A new value from bytes that need no terminating zero, with one allocation. They must not hold
-  /// a zero byte.
-  static COrbStringData FromUtf8(std::string_view text);
+  /// a zero byte. `more` follows them.
+  static COrbStringData FromUtf8(std::string_view text, std::string_view more = {});
 
  private:
   static void GiveValue(const COrbStringData& s);
@@ -53,6 +58,7 @@ struct StringAccess {
 
   /// Four billion units are not kept but counted each time.
   static constexpr std::uint32_t kTooLong = UINT32_MAX;
+  static constexpr std::size_t kCacheLine = 64;
 };
 
 }  // namespace orb

@@ -195,23 +195,24 @@ constinit Reserve reserve;
 
 // A value behind which its text lies: one allocation. Where there is no memory for both, the value
 // stands alone, its text missing.
-COrbStringData::COrbStringValue* COrbStringData::COrbStringValue::Make(std::uint32_t encoding,
-                                                                       const void* text,
-                                                                       std::size_t length) {
-  const std::size_t size = encoding == kUnicode ? length * sizeof(unsigned short) : length;
-  const std::size_t end = encoding == kUnicode ? sizeof(unsigned short) : 1;
-  void* block = BlockFor(sizeof(COrbStringValue) + sizeof(std::size_t) + size + end);
+COrbStringData::COrbStringValue* COrbStringData::COrbStringValue::Make(std::uint8_t encoding,
+                                                                       std::string_view bytes,
+                                                                       std::string_view more) {
+  const std::size_t unit = encoding == kUnicode ? sizeof(unsigned short) : 1;
+  const std::size_t size = bytes.size() + more.size();
+  void* block = BlockFor(sizeof(COrbStringValue) + sizeof(std::size_t) + size + unit);
   auto* made = block == nullptr ? new COrbStringValue : ::new (block) COrbStringValue;
-  made->master.store(static_cast<std::uint8_t>(encoding), std::memory_order_relaxed);
+  made->master.store(encoding, std::memory_order_relaxed);
   if (block == nullptr) return made;
-  made->inBlock = static_cast<std::uint8_t>(encoding);
+  made->inBlock = encoding;
   auto* copy = reinterpret_cast<char*>(made + 1) + sizeof(std::size_t);
-  if (size != 0) std::memcpy(copy, text, size);
-  std::memset(copy + size, 0, end);
-  if (encoding == kSystem) Stored(made->systemText, {copy, length});
-  if (encoding == kUtf8) Stored(made->utf8Text, {copy, length});
+  bytes.copy(copy, bytes.size());
+  more.copy(copy + bytes.size(), more.size());
+  std::memset(copy + size, 0, unit);
+  if (encoding == kSystem) Stored(made->systemText, {copy, size});
+  if (encoding == kUtf8) Stored(made->utf8Text, {copy, size});
   if (encoding == kUnicode) {
-    Stored(made->unicodeText, {reinterpret_cast<unsigned short*>(copy), length});
+    Stored(made->unicodeText, {reinterpret_cast<unsigned short*>(copy), size / unit});
   }
   return made;
 }
@@ -401,9 +402,9 @@ Utf8Text StringAccess::Scan(const COrbStringData::COrbStringValue& value) {
   return {text, scan};
 }
 
-COrbStringData StringAccess::FromUtf8(std::string_view text) {
+COrbStringData StringAccess::FromUtf8(std::string_view text, std::string_view more) {
   COrbStringData made;
-  made.value = COrbStringData::COrbStringValue::Make(kUtf8, text.data(), text.size());
+  made.value = COrbStringData::COrbStringValue::Make(kUtf8, text, more);
   return made;
 }
 
@@ -464,9 +465,10 @@ void COrbStringData::TakeNeighboursOf(COrbStringData& other) noexcept {
 }
 
 // The new value is complete before the old one goes, so its text may come from there.
-OrbResult COrbStringData::Init(std::uint32_t encoding, const void* text, std::size_t length) {
+OrbResult COrbStringData::Init(std::uint8_t encoding, const void* text, std::size_t size) {
   const bool isText = text != nullptr;
-  auto* made = isText ? COrbStringValue::Make(encoding, text, length) : new COrbStringValue;
+  auto* made = isText ? COrbStringValue::Make(encoding, {static_cast<const char*>(text), size}, {})
+                      : new COrbStringValue;
   Clear();
   value = made;
   return isText ? kOrbNoErr : kOrbErrUnknown;
@@ -486,7 +488,7 @@ OrbResult COrbStringData::InitWithUtf8(const char* text) {
 }
 
 OrbResult COrbStringData::InitWithUnicode(const unsigned short* text) {
-  return Init(kUnicode, text, text == nullptr ? 0 : Utf16Length(text));
+  return Init(kUnicode, text, text == nullptr ? 0 : sizeof *text * Utf16Length(text));
 }
 
 OrbResult COrbStringData::InitWithChar(const OrbCharSystem& text) {

@@ -11,6 +11,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <new>
+#include <string_view>
 
 namespace orb {
 struct StringAccess;
@@ -111,7 +112,7 @@ class ORB_EXPORT COrbStringData {
   void TakeNeighboursOf(COrbStringData& other) noexcept;
   /// Whether this was the last owner.
   ORB_LOCAL bool LeaveChain(const COrbStringValue& left);
-  ORB_LOCAL OrbResult Init(std::uint32_t encoding, const void* text, std::size_t length);
+  ORB_LOCAL OrbResult Init(std::uint8_t encoding, const void* text, std::size_t size);
   ORB_LOCAL COrbStringValue* EnsureValue() const;
 
   // Every owner of one value stands in a chain, changed under the value's lock alone. An owner
@@ -158,9 +159,9 @@ class ORB_EXPORT COrbStringData::COrbStringValue {
   friend class COrbStringData;
   friend struct orb::StringAccess;
 
-  ORB_LOCAL static COrbStringValue* Make(std::uint32_t encoding,
-                                         const void* text,
-                                         std::size_t length);
+  ORB_LOCAL static COrbStringValue* Make(std::uint8_t encoding,
+                                         std::string_view bytes,
+                                         std::string_view more);
   class Hold;
   const COrbCriticalSection& Lock() const noexcept;
   [[gnu::cold, gnu::noinline]] const COrbCriticalSection& MakeLock() const noexcept;
