@@ -12,6 +12,7 @@
 #include "strings/text_compare.h"
 #include "strings/text_edit.h"
 #include "strings/text_search.h"
+#include "strings/text_utf8.h"
 
 namespace {
 
@@ -52,7 +53,13 @@ COrbStringData Cut(const COrbStringData& s, std::size_t start, std::size_t count
     start = std::min(start, text.bytes.size());
     return StringAccess::FromUtf8(text.bytes.substr(start, count));
   }
-  return StringAccess::FromUtf8(orb::Middle(text.Readable(), start, count));
+  const std::string_view readable = text.Readable();
+  const orb::UnitPlace from = orb::PlaceOfUnit(readable, start);
+  const orb::UnitPlace to = orb::PlaceOfUnit(readable, count, from.at);
+  if (from.insidePair || to.insidePair) {
+    return StringAccess::FromUtf8(orb::Middle(readable, start, count));
+  }
+  return StringAccess::FromUtf8(readable.substr(from.at, to.at - from.at));
 }
 
 /// Calls `compare(a, b)` on the two texts; 0 when either is not UTF-8.

@@ -254,6 +254,8 @@ TEST(Oracle, ComparisonsAgreeWithIcu) {
     const int order = unorm_compare(
         x.data(), Size(x), y.data(), Size(y), U_COMPARE_IGNORE_CASE | U_FOLD_CASE_DEFAULT, &status);
     ASSERT_EQ(OrbStringDataCmpi(a, b), Sign(order));
+    const bool isInside = n < x.size();
+    ASSERT_EQ(isInside ? Text(a.Mid(n, 3)) : "", isInside ? Text(FromUnits(x.substr(n, 3))) : "");
     const std::u16string p = x.substr(0, n);
     const std::u16string q = y.substr(0, n);
     const int literal =
