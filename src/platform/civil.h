@@ -36,28 +36,41 @@ constexpr std::int64_t SecondsFromCivil(const CivilTime& civil) {
          civil.second;
 }
 
-constexpr CivilTime CivilFromSeconds(std::int64_t seconds) {
-  std::int64_t days = seconds / kSecondsPerDay;
-  std::int64_t secondOfDay = seconds % kSecondsPerDay;
-  if (secondOfDay < 0) {
-    secondOfDay += kSecondsPerDay;
-    --days;
-  }
-  days += 719468;  // From 0000-03-01.
-  const std::int64_t era = (days >= 0 ? days : days - 146096) / 146097;
-  const auto dayOfEra = static_cast<unsigned>(days - era * 146097);
-  const unsigned yearOfEra =
-      (dayOfEra - dayOfEra / 1460 + dayOfEra / 36524 - dayOfEra / 146096) / 365;
-  const unsigned dayOfYear = dayOfEra - (365 * yearOfEra + yearOfEra / 4 - yearOfEra / 100);
-  const unsigned monthFromMarch = (5 * dayOfYear + 2) / 153;
-  const auto second = static_cast<unsigned>(secondOfDay);
+/// Seconds from 0000-03-01 to 1970-01-01, and those of 400 years.
+constexpr std::int64_t kSecondsToEpoch = 719468 * kSecondsPerDay;
+constexpr std::int64_t kSecondsPerEra = 146097 * kSecondsPerDay;
+
+/// The date of a day, counted from 0000-03-01. Centuries, years and months have lengths that are
+/// all but even, so each comes from one linear function: the months of a year that begins in March
+/// lie 30.59 days apart, which is 2^16 / 2141 parts.
+constexpr CivilTime DateOfDay(std::uint64_t day) {
+  constexpr std::uint32_t kYearParts = 2939745;  // 2^32 / 1461, rounded up: parts of a quarter day.
+  const std::uint64_t century = (4 * day + 3) / 146097;
+  const auto quarter = static_cast<std::uint32_t>((4 * day + 3) % 146097 | 3);
+  const std::uint64_t years = std::uint64_t{quarter} * kYearParts;
+  const std::uint32_t dayOfYear = static_cast<std::uint32_t>(years) / kYearParts / 4;
+  const std::uint32_t months = 2141 * dayOfYear + 197913;
+  const bool isNextYear = dayOfYear >= 306;  // January and February.
   CivilTime civil;
-  civil.month = monthFromMarch < 10 ? monthFromMarch + 3 : monthFromMarch - 9;
-  civil.year = era * 400 + yearOfEra + (civil.month <= 2 ? 1 : 0);
-  civil.day = dayOfYear - (153 * monthFromMarch + 2) / 5 + 1;
-  civil.hour = second / 3600;
-  civil.minute = second / 60 % 60;
-  civil.second = second % 60;
+  civil.year = static_cast<std::int64_t>(100 * century + (years >> 32) + (isNextYear ? 1 : 0));
+  civil.month = (months >> 16) - (isNextYear ? 12 : 0);
+  civil.day = (months & 0xFFFF) / 2141 + 1;
+  return civil;
+}
+
+/// The instant may be any within 290 billion years.
+constexpr CivilTime CivilFromSeconds(std::int64_t seconds) {
+  // Before the year 0 the calendar is read as many times 400 years later.
+  const std::int64_t eras =
+      seconds >= -kSecondsToEpoch ? 0 : 1 - (seconds + kSecondsToEpoch) / kSecondsPerEra;
+  const auto counted =
+      static_cast<std::uint64_t>(seconds + kSecondsToEpoch + eras * kSecondsPerEra);
+  const auto secondOfDay = static_cast<unsigned>(counted % kSecondsPerDay);
+  CivilTime civil = DateOfDay(counted / kSecondsPerDay);
+  civil.year -= 400 * eras;
+  civil.hour = secondOfDay / 3600;
+  civil.minute = secondOfDay / 60 % 60;
+  civil.second = secondOfDay % 60;
   return civil;
 }
 

@@ -7,7 +7,9 @@
 #include <cstdint>
 #include <string_view>
 
+#include "strings/text_buffer.h"
 #include "strings/text_scan.h"
+#include "strings/text_utf8.h"
 
 namespace orb {
 
@@ -32,18 +34,31 @@ struct StringAccess {
     return Read(*s.value);
   }
   static Utf8Text Read(const COrbStringData::COrbStringValue& value) {
-    if (value.scan.load(std::memory_order_relaxed) == 0) Scan(value);
-    const TextScan scan = TextScan::Unpack(value.scan.load(std::memory_order_acquire));
-    return {{value.utf8Text.load(std::memory_order_relaxed), value.utf8Length}, scan};
+    const std::uint8_t known = value.scannedKind.load(std::memory_order_acquire);
+    if (known == 0) return Scan(value);
+    const char* bytes = value.utf8Text.load(std::memory_order_relaxed);
+    const std::string_view text(bytes, TextBuffer::Length(bytes));
+    const std::uint32_t length = value.scannedLength.load(std::memory_order_relaxed);
+    const auto kind = static_cast<TextKind>(known - 1);
+    return {text, {kind, length != kTooLong ? length : CountUnits(text)}};
+  }
+  /// Has the memory behind the value come, where its text most likely lies, while the value itself
+  /// is still on its way.
+  static void Prefetch(const COrbStringData& s) {
+    __builtin_prefetch(reinterpret_cast<const char*>(s.value) + kCacheLine);
   }
   /// A new value from bytes that need no terminating zero, with one allocation. They must not hold
-  /// a zero byte.
-  static COrbStringData FromUtf8(std::string_view text);
+  /// a zero byte. `more` follows them.
+  static COrbStringData FromUtf8(std::string_view text, std::string_view more = {});
 
  private:
   static void GiveValue(const COrbStringData& s);
   /// Leaves an empty text when there is no memory for the UTF-8 copy.
-  static void Scan(const COrbStringData::COrbStringValue& value);
+  static Utf8Text Scan(const COrbStringData::COrbStringValue& value);
+
+  /// Four billion units are not kept but counted each time.
+  static constexpr std::uint32_t kTooLong = UINT32_MAX;
+  static constexpr std::size_t kCacheLine = 64;
 };
 
 }  // namespace orb

@@ -12,6 +12,7 @@
 #include "strings/text_compare.h"
 #include "strings/text_edit.h"
 #include "strings/text_search.h"
+#include "strings/text_utf8.h"
 
 namespace {
 
@@ -26,15 +27,15 @@ COrbStringData TailFrom(const Utf8Text& text, std::size_t at) {
   return StringAccess::FromUtf8(text.bytes.substr(at));
 }
 
-std::string Joined(const COrbStringData& a, const COrbStringData& b) {
+std::string_view Utf8Of(const COrbStringData& s) {
   // Reading comes first: it gives a string without value one, whose length can then be asked.
-  const char* first = a.GetPtrUtf8();
-  const char* second = b.GetPtrUtf8();
-  std::string text;
-  text.reserve(a.GetLengthByteUtf8() + b.GetLengthByteUtf8());
-  text.append(first, a.GetLengthByteUtf8());
-  text.append(second, b.GetLengthByteUtf8());
-  return text;
+  const char* text = s.GetPtrUtf8();
+  return {text, s.GetLengthByteUtf8()};
+}
+
+COrbStringData Joined(const COrbStringData& a, const COrbStringData& b) {
+  const std::string_view first = Utf8Of(a);
+  return StringAccess::FromUtf8(first, Utf8Of(b));
 }
 
 /// Reads `s`, through `copy` where that would give a string without value one.
@@ -52,12 +53,20 @@ COrbStringData Cut(const COrbStringData& s, std::size_t start, std::size_t count
     start = std::min(start, text.bytes.size());
     return StringAccess::FromUtf8(text.bytes.substr(start, count));
   }
-  return StringAccess::FromUtf8(orb::Middle(text.Readable(), start, count));
+  const std::string_view readable = text.Readable();
+  const orb::UnitPlace from = orb::PlaceOfUnit(readable, start);
+  const orb::UnitPlace to = orb::PlaceOfUnit(readable, count, from.at);
+  if (from.insidePair || to.insidePair) {
+    return StringAccess::FromUtf8(orb::Middle(readable, start, count));
+  }
+  return StringAccess::FromUtf8(readable.substr(from.at, to.at - from.at));
 }
 
 /// Calls `compare(a, b)` on the two texts; 0 when either is not UTF-8.
 template <typename Compare>
 int Compared(const COrbStringData& a, const COrbStringData& b, Compare compare) {
+  StringAccess::Prefetch(a);
+  StringAccess::Prefetch(b);
   const Utf8Text left = StringAccess::Read(a);
   const Utf8Text right = StringAccess::Read(b);
   return IsValid(left) && IsValid(right) ? compare(left.bytes, right.bytes) : 0;
@@ -93,16 +102,15 @@ COrbStringData COrbStringData::Mid(unsigned long start, unsigned long count) con
 }
 
 COrbStringData COrbStringData::operator+(const COrbStringData& other) const {
-  return StringAccess::FromUtf8(Joined(*this, other));
+  return Joined(*this, other);
 }
 
 COrbStringData& COrbStringData::operator+=(const COrbStringData& other) {
-  InitWithUtf8(Joined(*this, other).c_str());
-  return *this;
+  return *this = Joined(*this, other);
 }
 
 COrbStringData OrbStringDataCat(const COrbStringData& a, const COrbStringData& b) {
-  return StringAccess::FromUtf8(Joined(a, b));
+  return Joined(a, b);
 }
 
 COrbStringData OrbStringDataInc(const COrbStringData& s, unsigned long m) {

@@ -3,6 +3,7 @@
 #undef _FORTIFY_SOURCE
 #include <orb/strings/string_functions.h>
 
+#include <array>
 #include <cstdarg>
 #include <cstdio>
 #include <cstdlib>
@@ -17,13 +18,29 @@ namespace {
 
 using orb::platform::ErrnoKeeper;
 
-COrbStringData Formatted(const char* format, std::va_list arguments) {
-  const ErrnoKeeper errnoKeeper;
+/// A text that is too long for the room on the stack.
+COrbStringData LongFormatted(const char* format, std::va_list arguments) {
   char* text = nullptr;
   if (::vasprintf(&text, format, arguments) < 0) return {};
   COrbStringData result;
   result.InitWithUtf8(text);
   std::free(text);
+  return result;
+}
+
+COrbStringData Formatted(const char* format, std::va_list arguments) {
+  const ErrnoKeeper errnoKeeper;
+  std::array<char, 512> text;
+  std::va_list again;
+  va_copy(again, arguments);
+  const int length = std::vsnprintf(text.data(), text.size(), format, arguments);
+  COrbStringData result;
+  if (length >= static_cast<int>(text.size())) {
+    result = LongFormatted(format, again);
+  } else if (length >= 0) {
+    result.InitWithUtf8(text.data());  // Up to a zero among the arguments.
+  }
+  va_end(again);
   return result;
 }
 

@@ -119,7 +119,27 @@ TEST(Calendar, NoticesAnotherZoneWhereverItStands) {
   entries[0] = tokyo;  // Emptied and filled again in the same place, TZ=UTC behind its end.
   entries[1] = nullptr;
   EXPECT_EQ(LocalFromInstant(0).hour, 9u);
+
+  for (std::size_t end = 1; end < 40; ++end) {
+    std::vector<char*> many(40, other);
+    many.insert(many.end(), {utc, nullptr});
+    environ = many.data();
+    EXPECT_EQ(LocalFromInstant(0).hour, 0u);
+    many[0] = tokyo;
+    many[end] = nullptr;
+    EXPECT_EQ(LocalFromInstant(0).hour, 9u) << end;
+  }
   environ = old;
+}
+
+TEST(Calendar, FieldsOfDaysNearAndFarAreThoseOfTheSystem) {
+  const TimeZone zone("UTC");
+  std::mt19937_64 random(1904);
+  for (std::int64_t day = -750'000; day < 150'000; day += 3) {
+    ASSERT_EQ(CivilFromSeconds(day * 86400 + 86399), SystemFields(day * 86400 + 86399)) << day;
+    const auto any = static_cast<std::int64_t>(random()) >> 9;
+    ASSERT_EQ(CivilFromSeconds(any), SystemFields(any)) << any;
+  }
 }
 
 TEST(Calendar, ReachesFarYears) {
