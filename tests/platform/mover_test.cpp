@@ -196,6 +196,10 @@ TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
       MakeObstacle(folder, c.obstacle);
       const auto before = orb::test::Describe(folder / "a");
       ASSERT_EQ(::seteuid(*c.obstacle == 's' ? 65534 : 0), 0);
+      if (*c.obstacle == 'l') {
+        EXPECT_EQ(ErrorOf(orb::platform::ExpectMovableTo(folder / "a/tree", folder / "b/x")),
+                  kNotPermitted);
+      }
       EXPECT_EQ(ErrorOf(MoveItem(folder / c.from, folder / c.to)), c.expected);
       ASSERT_EQ(::seteuid(0), 0);
       EXPECT_TRUE(orb::test::Describe(folder / "a") == before);

@@ -18,7 +18,7 @@
 /// read, and for a socket, pipe or device. Nor is anything removed when the destination
 /// is the source, one of its folders or something inside it, by its text or on disk:
 /// kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed; a folder may then have lost
-/// some of its content.
+/// some of its content, unless something in it is locked.
 ///
 /// Every form may give kOrbErrAccessDenied for a source that is not valid UTF-8, and forms that
 /// take a folder and a name kOrbErrInvalidName for a name that is, or whose last component is, "",
