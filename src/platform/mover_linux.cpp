@@ -58,6 +58,18 @@ Result<Place> LocateDestination(const std::string& path, const Place& source) {
   return open ? std::move(place) : open.Reason();
 }
 
+/// What a copy to another volume, and the removal after it, ask of an item.
+Status ExpectCrossing(const Place& from, mode_t mode) {
+  const int folder = from.folder.Get();
+  if (S_ISLNK(mode)) return {};
+  if (!S_ISDIR(mode) && !S_ISREG(mode)) return kNotPermitted;
+  if (::faccessat(folder, from.name.c_str(), R_OK, AT_EACCESS) != 0) return LastError();
+  if (S_ISREG(mode)) return {};
+  const auto survey = SurveyTree(folder, from.name, SurveyFor::kRemoval);
+  if (!survey) return survey.Reason();
+  return survey.Value().canBeRemoved ? Status() : kNotPermitted;
+}
+
 }  // namespace
 
 Status ExpectMovable(const std::string& source) {
@@ -84,10 +96,7 @@ Status ExpectMovableTo(const std::string& source, const std::string& destination
   const auto folder = IdentityOf(to.Value().folder.Get());
   if (!folder) return folder.Reason();
   const bool stays = folder.Value().device == status.Value().st_dev;
-  if (stays || !S_ISDIR(status.Value().st_mode)) return {};
-  const auto survey = SurveyTree(from.Value().folder.Get(), from.Value().name, SurveyFor::kRemoval);
-  if (!survey) return survey.Reason();
-  return survey.Value().canBeRemoved ? Status() : kNotPermitted;
+  return stays ? Status() : ExpectCrossing(from.Value(), status.Value().st_mode);
 }
 
 Status MoveItem(const std::string& source, const std::string& destination) {
