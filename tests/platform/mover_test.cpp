@@ -152,6 +152,9 @@ TEST(MoveItem, BringsFilesLinksAndTreesToAnotherVolume) {
     EXPECT_EQ(NamesIn(folder / "b"), std::set<std::string>{"tree"});
     EXPECT_EQ(NamesIn(folder / "a"), std::set<std::string>());
     EXPECT_EQ(before.size(), tree.size() + 1);
+    ASSERT_TRUE(orb::test::MakeChain(folder / "a", 2100));  // Deeper than a path can tell.
+    EXPECT_EQ(ErrorOf(MoveItem(folder / "a/d", folder / "b/d")), kDone);
+    EXPECT_EQ(orb::test::ChainDepth(folder / "b"), 2101);
     EXPECT_EQ(orb::test::OpenDescriptors(), descriptors);
   }));
 }
