@@ -63,8 +63,8 @@ ORB_EXPORT OrbResult OrbCopyFile(const COrbFilePath& source,
 /// kOrbErrEmptyPath for an empty folder; the codes of OrbMakeFilePath; kOrbErrCanceled;
 /// kOrbErrSamePath when source and destination are one file, under whichever names;
 /// kOrbErrNotFound, kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrInvalidName, kOrbErrFileExists
-/// (somebody else made the destination meanwhile) and kOrbErrUnknown for what failed. A source that
-/// is empty or does not exist copies nothing, makes nothing and gives 0.
+/// (somebody else made the destination meanwhile) and kOrbErrUnknown for what failed. An empty
+/// source makes an empty destination; one that does not exist makes nothing and gives 0.
 ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
                                    const COrbFilePath& folder,
                                    const COrbStringData& name,
