@@ -116,6 +116,7 @@ TEST(CopyItem, KeepsWhatLiesBesideTheContent) {
   EXPECT_EQ(StatusOf(copy).st_mtim.tv_sec, 1400000000);
   EXPECT_EQ(StatusOf(copy).st_mtim.tv_nsec, 987654321);
   EXPECT_EQ(StatusOf(copy).st_atim.tv_nsec, 123456789);
+  EXPECT_EQ(StatusOf(source).st_atim.tv_nsec, 123456789);  // Copying is no use of the source.
   EXPECT_EQ(Attribute(copy, "user.rating"), "5");
   EXPECT_EQ(Attribute(copy, "user.empty"), "");
   EXPECT_EQ(Attribute(copy, "system.posix_acl_access").size(), sizeof acl - 1);

@@ -352,6 +352,7 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
     const std::string sticky = Make("volume/sticky/a.jpg");
     fs::permissions(Volume() + "/sticky", fs::perms(01777));
     const std::string closed = Make("volume/closed/a.jpg");
+    const std::string burnt = Make("volume/in/from a disc/a.jpg");
     ASSERT_EQ(::setresuid(65534, 65534, 65534), 0);
     EXPECT_TRUE(Put(file).Ok());
     EXPECT_FALSE(fs::exists(file));
@@ -359,7 +360,8 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
     fs::remove_all(Home());
     EXPECT_FALSE(Put(sticky).Ok());
     EXPECT_FALSE(Put(closed).Ok());
-    EXPECT_TRUE(fs::exists(sticky) && fs::exists(closed));
+    EXPECT_FALSE(Put(fs::path(burnt).parent_path()).Ok());
+    EXPECT_TRUE(fs::exists(sticky) && fs::exists(closed) && fs::exists(burnt));
     EXPECT_TRUE(IsEmpty(Home()));
   }));
 }

@@ -90,6 +90,12 @@ class Surveyor {
     return {};
   }
 
+  /// Only a folder that is not empty needs it.
+  void LookForPermission(int folder) {
+    if (purpose_ != SurveyFor::kRemoval) return;
+    survey_.canBeRemoved &= ::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) == 0;
+  }
+
   Status Proceed() {
     Level& level = levels_.back();
     if (level.pending.empty()) return Leave();
@@ -115,10 +121,11 @@ class Surveyor {
     auto entries =
         FolderStream::Open(UniqueFd(Retry([&] { return ::openat(folder, ".", kFlags); })));
     if (!entries) return entries.Reason();
-    while (true) {
+    for (bool isFirst = true;; isFirst = false) {
       const auto entry = entries.Value().Next();
       if (!entry) return entry.Reason();
       if (entry.Value().name == nullptr) return {};
+      if (isFirst) LookForPermission(folder);
       const auto isFolder = Visit(folder, entry.Value().name, level->path);
       if (!isFolder) return isFolder.Reason();
       if (isFolder.Value()) level->pending.emplace_back(entry.Value().name);
