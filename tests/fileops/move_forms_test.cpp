@@ -5,6 +5,7 @@
 #include <sys/stat.h>
 
 #include <cstdint>
+#include <cstdlib>
 #include <filesystem>
 #include <functional>
 #include <map>
@@ -208,6 +209,9 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
   fs::create_directory(folder_ / "pinned");
   folder_.Write("pinned/file", "x");
   ASSERT_TRUE(Lock(folder_ / "pinned"));
+  fs::create_directories(folder_ / "to/full");
+  for (const char* name : {"to/full/a", "to/full/b", "to/full/c"}) folder_.Write(name, name);
+  ASSERT_TRUE(Lock(folder_ / "to/full/b"));
   ASSERT_EQ(::mkfifo((folder_ / "pipe").c_str(), 0600), 0);
   const auto before = Describe(folder_.Path());
   EXPECT_EQ(RunHere("missing", "to", "old"), row_.missing);
@@ -224,6 +228,7 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
   // What is in the source, on disk, is not removed for a move or copy that cannot succeed.
   const OrbResult doomed = row_.existing == 0 ? kInside : kUnknown;
   EXPECT_EQ(RunHere("tree", "link/sub", "old"), doomed);
+  EXPECT_EQ(RunHere("file", "to", "full"), row_.existing == 0 ? kDenied : kUnknown);
   for (const std::string name : {"", ".", "..", "/", "//", "../", "to/.."}) {
     const bool isLetter = row_.form == std::string("MoveFile") && name.find('/') != name.npos;
     if (!isLetter) {
@@ -346,6 +351,19 @@ TEST(FormsWithoutAName, AreNotSupported) {
   EXPECT_EQ(OrbCopyFolderEx(from, to, Progress::Call, &progress), kOrbErrNotSupported);
   EXPECT_EQ(progress.calls, 0);
   EXPECT_FALSE(fs::exists(folder / "b"));
+}
+
+TEST(MoveFileOverwrite, MakesNoWayForAnImmutableItem) {
+  const TempFolder folder;
+  fs::create_directory(folder / "to");
+  folder.Write("to/name", "old");
+  const std::string flag = "chattr +i " + folder.Write("file", "new") + " 2>/dev/null";
+  if (std::system(flag.c_str()) != 0) GTEST_SKIP() << "no such flag here";
+  const COrbStringData name = S("name");
+  EXPECT_EQ(OrbMoveFileOverwrite(PathOf(folder / "file"), PathOf(folder / "to"), &name, nullptr),
+            kDenied);
+  EXPECT_EQ(ReadAll(folder / "to/name"), "old");
+  EXPECT_EQ(std::system(("chattr -i " + (folder / "file")).c_str()), 0);
 }
 
 }  // namespace

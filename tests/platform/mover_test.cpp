@@ -24,6 +24,8 @@ namespace {
 
 namespace fs = std::filesystem;
 using orb::platform::Error;
+using orb::platform::ExpectMovable;
+using orb::platform::ExpectMovableTo;
 using orb::platform::Items;
 using orb::platform::kInvalidName;
 using orb::platform::kItemExists;
@@ -150,6 +152,9 @@ TEST(MoveItem, BringsFilesLinksAndTreesToAnotherVolume) {
     EXPECT_EQ(NamesIn(folder / "b"), std::set<std::string>{"tree"});
     EXPECT_EQ(NamesIn(folder / "a"), std::set<std::string>());
     EXPECT_EQ(before.size(), tree.size() + 1);
+    ASSERT_TRUE(orb::test::MakeChain(folder / "a", 2100));  // Deeper than a path can tell.
+    EXPECT_EQ(ErrorOf(MoveItem(folder / "a/d", folder / "b/d")), kDone);
+    EXPECT_EQ(orb::test::ChainDepth(folder / "b"), 2101);
     EXPECT_EQ(orb::test::OpenDescriptors(), descriptors);
   }));
 }
@@ -186,7 +191,9 @@ TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
       {"locked", "a/tree", "b/tree", kNotPermitted},
       {"locked", "a/tree/obstacle", "b/file", kNotPermitted},
       {"pipe", "a/tree", "b/tree", kNotPermitted},
+      {"pipe", "a/tree/obstacle", "b/file", kNotPermitted},
       {"secret", "a/tree", "b/tree", kNotPermitted},
+      {"secret", "a/tree/obstacle", "b/file", kNotPermitted},
   };
   ASSERT_EQ(::chmod(folder.Path().c_str(), 0777), 0);
   for (const auto& c : kCases) {
@@ -196,6 +203,11 @@ TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
       MakeObstacle(folder, c.obstacle);
       const auto before = orb::test::Describe(folder / "a");
       ASSERT_EQ(::seteuid(*c.obstacle == 's' ? 65534 : 0), 0);
+      // What makes way for the item asks before.
+      const bool foreseen = *c.obstacle == 'l' || std::string(c.from).ends_with("obstacle");
+      const auto movable = ExpectMovable(folder / c.from);
+      const auto leaves = ExpectMovableTo(folder / c.from, folder / "b/new");
+      EXPECT_EQ(movable && leaves, !foreseen);
       EXPECT_EQ(ErrorOf(MoveItem(folder / c.from, folder / c.to)), c.expected);
       ASSERT_EQ(::seteuid(0), 0);
       EXPECT_TRUE(orb::test::Describe(folder / "a") == before);

@@ -11,12 +11,16 @@
 #include <thread>
 
 #include "platform/copier.h"
+#include "platform/file_handle.h"
+#include "platform/file_writer.h"
 #include "support/faults.h"
 #include "support/temp_folder.h"
 
 namespace {
 
 using orb::platform::CopyItem;
+using orb::platform::FileHandle;
+using orb::platform::FileWriter;
 using orb::platform::InputStream;
 using orb::platform::kItemExists;
 using orb::platform::OutputStream;
@@ -51,6 +55,9 @@ TEST(Streams, WaitForAFileThatIsLeased) {
                             };
                             lease([&] { EXPECT_TRUE(InputStream::Open(photo)); });
                             lease([&] { EXPECT_TRUE(OutputStream::Append(photo)); });
+                            lease([&] { EXPECT_TRUE(FileHandle::OpenForReading(photo)); });
+                            lease([&] { EXPECT_TRUE(FileHandle::OpenForWriting(photo)); });
+                            lease([&] { EXPECT_TRUE(FileWriter::Open(photo)); });
                             lease([&] { EXPECT_TRUE(CopyItem(photo, folder / "copy")); });
                           }));
 }
