@@ -203,8 +203,10 @@ TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
       MakeObstacle(folder, c.obstacle);
       const auto before = orb::test::Describe(folder / "a");
       ASSERT_EQ(::seteuid(*c.obstacle == 's' ? 65534 : 0), 0);
-      // What makes way for the item asks before.
-      const bool foreseen = *c.obstacle == 'l' || std::string(c.from).ends_with("obstacle");
+      // What makes way for the item asks before. It does not look for pipes in a tree.
+      const std::string obstacle = c.obstacle;
+      const bool foreseen =
+          !obstacle.empty() && (obstacle != "pipe" || std::string(c.from).ends_with("obstacle"));
       const auto movable = ExpectMovable(folder / c.from);
       const auto leaves = ExpectMovableTo(folder / c.from, folder / "b/new");
       EXPECT_EQ(movable && leaves, !foreseen);
