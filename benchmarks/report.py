@@ -23,6 +23,7 @@ SECTIONS = (
     ("fileinfo", "File information"),
     ("copy", "Copies of files"),
     ("tree", "Trees and big files: copying and removing"),
+    ("whole", "Whole programs: copying and removing"),
     ("temp", "Unique names"),
     ("trash", "Trash and drives"),
     ("start", "Start of a program that does nothing"),
@@ -35,8 +36,9 @@ PLOTS = (
                      "ToUtf8Road-ASCII", "ToUtf8Road-Latin", "ToUtf8Road-CJK")),
     ("texts", ("Find-ASCII", "Replace-ASCII", "Split-ASCII", "Find-CJK", "Replace-CJK", "Split-CJK")),
     ("vectors", ("GrowVector", "GrowVector-paths", "Append")),
-    ("trees", ("CopyTree@xfs", "CopyTree@ext4", "CopyTree@btrfs",
-               "RemoveTree@xfs", "RemoveTree@ext4", "RemoveTree@btrfs")),
+    ("trees", ("WholeCopyTree@xfs-noreflink", "WholeRemoveTree@xfs-noreflink",
+               "WholeCopyFile@xfs-noreflink",
+               "WholeCopyTree@ext4", "WholeRemoveTree@ext4", "WholeCopyFile@ext4")),
     ("names", ("UniqueNames@xfs", "UniqueNames@ext4", "UniqueNames@btrfs")),
     ("dry-run", ("DryRun",)),
 )
@@ -174,6 +176,8 @@ def compare(groups, workload, size, goal):
         rows = groups.get((workload, int(other)), {})
         if row not in rows:
             return goal.against, None
+        if goal.what != "time":
+            return goal.against, ours / rows[row].of(goal.what)
         return goal.against, cost(groups[workload, size][goal.ours], size) / cost(rows[row], int(other))
     names = [row for row in rows if is_peer(row)] if goal.against == "best" else \
         [row for row in goal.against.split(",") if row in rows]
@@ -194,7 +198,8 @@ def lines_of(groups, goals):
     for (workload, size), rows in sorted(groups.items(), key=lambda group: (group[0][0], group[0][1] or 0)):
         for ours in sorted(row for row in rows if row.startswith("Orb")):
             fitting = [goal for goal in goals if goal.ours == ours and goal.fits(workload, size)]
-            for goal in fitting or [None]:
+            timed = any(goal.what == "time" for goal in fitting)
+            for goal in fitting if timed else [None, *fitting]:
                 asked = goal or Goal(workload, "*", ours, "best", None, "time", "")
                 against, ratio = compare(groups, workload, size, asked)
                 lines.append(Line(workload, size, ours, goal, against, ratio))
@@ -224,8 +229,8 @@ def value_text(figures, what):
     return time_text(value) if what == "time" else f"{value:.3g} {what.partition('_')[2]}"
 
 
-def ratio_text(ratio):
-    return "–" if ratio is None else f"{ratio:.2f}"
+def ratio_text(line):
+    return "–" if line.ratio is None else f"{line.ratio:.2f} × {line.against}"
 
 
 def row_cells(groups, line):
@@ -246,8 +251,7 @@ def row_cells(groups, line):
     if what != "time":
         workload += f", {what.partition('_')[0]}"
     return [workload, size_text(line.size), value_text(rows[line.ours], what), listed(is_peer),
-            listed(lambda row: row.startswith("limit")), f"{ratio_text(line.ratio)} × {line.against}",
-            goal, verdict]
+            listed(lambda row: row.startswith("limit")), ratio_text(line), goal, verdict]
 
 
 HEAD = ("workload", "size", "ours", "peers, quickest first", "limits", "ratio", "goal", "")
@@ -286,7 +290,7 @@ def summary(lines):
         yield from table(
             ("workload", "size", "ratio", "goal"),
             [[line.workload + ("" if line.ours == "Orb" else f" ({line.ours})"), size_text(line.size),
-              f"{ratio_text(line.ratio)} × {line.against}", f"≤ {line.goal.at_most:g}"]
+              ratio_text(line), f"≤ {line.goal.at_most:g}"]
              for line in sorted(missed, key=lambda line: -line.ratio / line.goal.at_most)])
 
 

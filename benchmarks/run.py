@@ -45,6 +45,7 @@ PROGRAMS = (
     Program("temp", on=("xfs", "ext4", "btrfs")),
     Program("copy", on=("xfs-noreflink", "xfs", "ext4", "btrfs")),
     Program("tree", own_rounds=True, quick="@ext4"),
+    Program("whole", on=("xfs-noreflink", "ext4")),
     Program("import"),
 )
 
@@ -203,7 +204,7 @@ def main():
     parser.add_argument("build", type=lambda path: pathlib.Path(path).resolve())
     parser.add_argument("--quick", action="store_true")
     parser.add_argument("programs", nargs="*")
-    options = parser.parse_args()
+    options = parser.parse_intermixed_args()
 
     runner = Runner(options.build, QUICK if options.quick else FULL, options.quick)
     for old in runner.results.iterdir():
