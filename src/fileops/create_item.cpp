@@ -11,13 +11,19 @@
 #include "fileops/numbered_name.h"
 #include "fileops/path_in.h"
 #include "platform/folder_names.h"
+#include "platform/held_folder.h"
 #include "platform/items.h"
+#include "platform/taken_runs.h"
 #include "strings/string_access.h"
 
 namespace orb {
 namespace {
 
+using platform::HeldFolder;
 using platform::Items;
+using platform::Result;
+using platform::Status;
+using platform::TakenRun;
 
 /// So many names are tried one by one before the folder is listed: mostly one is free.
 constexpr std::uint32_t kProbes = 4;
@@ -34,36 +40,53 @@ TakenNumbers ReadTakenNumbers(const std::string& folder, const NumberedName& nam
 /// Tries names and lets the creation itself decide which is free.
 class UniqueFile {
  public:
-  UniqueFile(const std::string& folder, const COrbStringData& name)
-      : folder_(folder), names_(name) {}
+  UniqueFile(const std::string& path, const COrbStringData& name)
+      : folderPath_(path), names_(name), folder_(HeldFolder::Open(path)) {}
 
   OrbResult Create(COrbFilePath* result) {
-    std::uint32_t number = 0;
-    while (number < kProbes && IsTaken(number)) ++number;
-    if (number == kProbes) CreateBeyondProbes();
-    return created_ ? Deliver(path_, result) : DiagnoseCreation(created_, path_);
+    const bool canRemember = folder_ && names_.AreOfEntries();
+    TakenRun run = canRemember ? platform::RecallRun(folder_.Value(), names_.With(0)) : TakenRun();
+    const std::uint32_t probesEnd = run.end + kProbes;
+    while (run.end < probesEnd && IsTaken(run.end)) ++run.end;
+    if (run.end == probesEnd) {
+      if (canRemember)
+        run.ticket = platform::WatchRun(folder_.Value(), names_.With(0), names_.Stem());
+      run.end = CreateBeyond(run.end);
+    }
+    if (!created_) return DiagnoseCreation(created_, path_);
+    platform::KeepRun({run.end + 1, run.ticket});
+    return Deliver(path_, result);
   }
 
  private:
-  void CreateBeyondProbes() {
-    const TakenNumbers taken = ReadTakenNumbers(folder_, names_);
-    std::uint32_t number = taken.NextFree(kProbes);
+  /// Gives the number that is free.
+  std::uint32_t CreateBeyond(std::uint32_t start) {
+    const TakenNumbers taken = ReadTakenNumbers(folderPath_, names_);
+    std::uint32_t number = taken.NextFree(start);
     while (IsTaken(number)) number = taken.NextFree(number + 1);
+    return number;
   }
 
   /// Where nothing may be made a name that is there counts as taken too: the diagnosis needs one
   /// that is free.
   bool IsTaken(std::uint32_t number) {
-    path_ = JoinPath(folder_, names_.With(number));
-    created_ = Items::Current().CreateEmptyFile(path_);
+    const std::string name = names_.With(number);
+    path_ = JoinPath(folderPath_, name);
+    created_ = CreateAs(name);
     if (created_) return false;
     return created_.Reason() == platform::kItemExists || Items::Current().Exists(path_);
   }
 
-  const std::string& folder_;
+  Status CreateAs(const std::string& name) const {
+    if (!names_.AreOfEntries()) return Items::Current().CreateEmptyFile(path_);
+    return folder_ ? folder_.Value().CreateEmptyFile(name) : Status(folder_.Reason());
+  }
+
+  const std::string& folderPath_;
   NumberedName names_;
+  const Result<HeldFolder> folder_;
   std::string path_;
-  platform::Status created_;
+  Status created_;
 };
 
 }  // namespace

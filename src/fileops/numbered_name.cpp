@@ -49,6 +49,11 @@ std::optional<std::uint32_t> NumberedName::NumberOf(std::string_view name) const
   return ParseNumber(name.substr(stem_.size(), name.size() - fixed));
 }
 
+bool NumberedName::AreOfEntries() const {
+  const bool isSpecial = name_.empty() || name_ == "." || name_ == "..";
+  return !isSpecial && name_.find('/') == std::string::npos;
+}
+
 TakenNumbers::TakenNumbers(const std::vector<std::uint32_t>& numbers) : taken_(numbers.size() + 2) {
   for (const std::uint32_t number : numbers) {
     if (number < taken_.size()) taken_[number] = true;

@@ -20,6 +20,10 @@ class NumberedName {
   std::string With(std::uint32_t number) const;
   /// The number from 1 up that gives a name; nothing for any other name.
   std::optional<std::uint32_t> NumberOf(std::string_view name) const;
+  /// What all the names begin with.
+  std::string Stem() const { return stem_.substr(0, stem_.size() - 1); }
+  /// Whether all of them can be names of entries. One with a "/" leads into another folder.
+  bool AreOfEntries() const;
 
  private:
   std::string name_;

@@ -32,6 +32,9 @@ class HeldFolder {
   /// not the name of an entry.
   Status CreateEmptyFile(const std::string& name) const;
 
+  /// For the other services of this layer. It stays the folder's.
+  int Descriptor() const;
+
  private:
   struct State;
   explicit HeldFolder(std::unique_ptr<State> state);

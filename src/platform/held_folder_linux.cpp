@@ -77,6 +77,8 @@ Status HeldFolder::CreateEmptyFile(const std::string& name) const {
   return file ? Status() : Status(LastError());
 }
 
+int HeldFolder::Descriptor() const { return state_->folder.Get(); }
+
 Status RemoveOwnFolder(const std::string& base, const std::vector<std::string>& levels) {
   const ErrnoKeeper errnoKeeper;
   const std::span above(levels.data(), levels.size() - 1);

@@ -5,12 +5,16 @@
 #include <orb/fileops/path_relations.h>
 
 #include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <random>
 #include <set>
 #include <string>
 #include <thread>
 #include <vector>
 
 #include "fileops/numbered_name.h"
+#include "platform/taken_runs.h"
 #include "support/faults.h"
 #include "support/paths.h"
 #include "support/temp_folder.h"
@@ -62,6 +66,97 @@ TEST(CreateUniqueFile, TakesTheLowestFreeNumberOfMany) {
   fs::create_symlink("nowhere", folder / "p_300.jpg");  // Taken, although it leads nowhere.
   for (const char* made : {"p_7.jpg", "p_120.jpg", "p_301.jpg"})
     EXPECT_EQ(Unique(folder.Path(), "p.jpg"), made);
+}
+
+/// The name that trying one after the other gives.
+std::string FirstFree(const std::string& folder, const std::string& stem, const std::string& end) {
+  std::string name = stem + end;
+  for (int i = 1; fs::exists(fs::symlink_status(fs::path(folder) / name)); ++i)
+    name = stem + "_" + std::to_string(i) + end;
+  return name;
+}
+
+/// What other programs do to a numbered name, and to the folder.
+void Disturb(const fs::path& folder, int number, int kind) {
+  const fs::path name = folder / ("p_" + std::to_string(number) + ".jpg");
+  std::error_code ignored;
+  if (kind == 0) fs::remove(name, ignored);
+  if (kind == 1) fs::rename(name, folder / "elsewhere", ignored);
+  if (kind == 2) fs::rename(name, folder / "p_5.jpg", ignored);
+  if (kind == 3) std::ofstream(name).put('x');
+  if (kind == 4) fs::remove(folder / "p.jpg", ignored);
+  if (kind == 5 && number > 35) fs::remove_all(folder, ignored);
+  fs::create_directory(folder, ignored);
+}
+
+void CompareWithFirstFree(const std::string& folder) {
+  std::mt19937 random(7);
+  fs::create_directory(folder);
+  for (int i = 0; i < 500; ++i) {
+    const std::string stem = random() % 3 == 0 ? "q" : "p";
+    const std::string expected = FirstFree(folder, stem, ".jpg");
+    ASSERT_EQ(Unique(folder, stem + ".jpg"), expected) << i;
+    if (random() % 4 == 0)
+      Disturb(folder, static_cast<int>(random() % 40), static_cast<int>(random() % 6));
+  }
+}
+
+TEST(CreateUniqueFile, GivesTheFirstFreeNameWhateverOthersDo) {
+  const TempFolder folder;
+  CompareWithFirstFree(folder / "usual");
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    const std::string unwatched = folder / "unwatched";
+    fs::create_directory(unwatched);
+    ASSERT_EQ(::mount("orb-test", unwatched.c_str(), "ramfs", 0, nullptr), 0);
+    CompareWithFirstFree(unwatched + "/folder");
+  }));
+}
+
+TEST(CreateUniqueFile, SeesInAChildAndBesideItWhatTheOtherRemoves) {
+  const TempFolder folder;
+  const auto child = [&] {
+    fs::remove(folder / "p_3.jpg");
+    EXPECT_EQ(Unique(folder.Path(), "p.jpg"), "p_3.jpg");
+    fs::remove(folder / "p_4.jpg");
+    EXPECT_EQ(Unique(folder.Path(), "p.jpg"), "p_4.jpg");
+    fs::remove(folder / "p_5.jpg");
+    Unique(folder.Path(), "other.jpg");  // Looks at what has happened.
+  };
+  for (int i = 0; i < 20; ++i) Unique(folder.Path(), "p.jpg");
+  ORB_IN_CHILD(orb::test::RunInChild([] { return true; }, child));
+  EXPECT_EQ(Unique(folder.Path(), "p.jpg"), "p_5.jpg");
+}
+
+TEST(CreateUniqueFile, HoldsAtMostOneDescriptor) {
+  const auto count = [] {
+    return std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator());
+  };
+  const auto before = count();
+  for (int i = 0; i < 12; ++i) {
+    const TempFolder folder;
+    for (int j = 0; j < 7; ++j) Unique(folder.Path(), "p.jpg");
+  }
+  EXPECT_LE(count(), before + 1);
+}
+
+TEST(TakenRuns, AreEndedByWhatMayBeAnotherSpelling) {
+  const struct {
+    const char* name;
+    const char* stem;
+    bool may;
+  } kCases[] = {
+      {"photo_7.jpg", "photo", true},
+      {"PHOTO_7.JPG", "photo", true},
+      {"pho", "photo", true},
+      {"photo_7.jpg", "", true},
+      {"\u212Bnn", "photo", true},  // What such a letter folds to only the volume knows.
+      {"phot\u200bo_7", "photo", true},
+      {"k_7", "\u212A", true},
+      {".orb-0123456789abcdef", "photo", false},
+      {"phone_7.jpg", "photo", false},
+  };
+  for (const auto& c : kCases)
+    EXPECT_EQ(orb::platform::MayBeginWith(c.name, c.stem), c.may) << c.name;
 }
 
 TEST(CreateUniqueFile, EndsWhereNoNumberCanHelp) {
