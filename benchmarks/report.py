@@ -21,7 +21,6 @@ SECTIONS = (
     ("types", "Type by extension"),
     ("records", "Record copies"),
     ("fileinfo", "File information"),
-    ("copy", "Copies of files"),
     ("tree", "Trees and big files: copying and removing"),
     ("whole", "Whole programs: copying and removing"),
     ("temp", "Unique names"),

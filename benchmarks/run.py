@@ -43,7 +43,6 @@ PROGRAMS = (
     Program("fileinfo", on=("ext4",)),
     Program("trash", on=("xfs", "ext4")),
     Program("temp", on=("xfs", "ext4", "btrfs")),
-    Program("copy", on=("xfs-noreflink", "xfs", "ext4", "btrfs")),
     Program("tree", own_rounds=True, quick="@ext4"),
     Program("whole", on=("xfs-noreflink", "ext4")),
     Program("import"),

@@ -370,6 +370,7 @@ TEST_F(TrashOnVolume, CopiesWhereTheVolumeDoesNotRename) {
     for (const char* layer : {"upper", "work"})
       fs::create_directories(folder_ / ("layers/" + std::string(layer)));
     Make("layers/lower/trip/a.jpg", "below");
+    Make("layers/lower/tour/a.jpg", "below");
     fs::create_directory(Volume());
     const std::string options = "lowerdir=" + (folder_ / "layers/lower") +
                                 ",redirect_dir=off,upperdir=" + (folder_ / "layers/upper") +
@@ -381,6 +382,10 @@ TEST_F(TrashOnVolume, CopiesWhereTheVolumeDoesNotRename) {
     EXPECT_FALSE(fs::exists(Volume() + "/trip"));
     EXPECT_EQ(test::ReadAll(Home() + "/files/trip/a.jpg"), "below");
     EXPECT_TRUE(IsEmpty(Own()));
+
+    const test::ScopedVariable data("XDG_DATA_HOME", Volume() + "/data");
+    EXPECT_TRUE(Put(Volume() + "/tour").Ok()) << "nor the volume of the home";
+    EXPECT_EQ(test::ReadAll(Volume() + "/data/Trash/files/tour/a.jpg"), "below");
   }));
 }
 

@@ -32,12 +32,13 @@ class Crossing {
   Crossing(const Place& from, const Place& to, const struct stat& source)
       : from_(from), to_(to), source_(source) {}
 
-  Status Move() {
+  Status Copy() {
     if (Status possible = Prepare(); !possible) return possible;
     const Status copied = S_ISDIR(source_.st_mode) ? CopyTree() : CopyLeaf();
     if (!copied) return copied;
-    if (Status same = ExpectUnchanged(); !same) return same;
-    return RemoveItemAt(from_.folder.Get(), from_.name);
+    const Status same = ExpectUnchanged();
+    if (!same) (void)RemoveItemAt(target_.Get(), to_.name);
+    return same;
   }
 
  private:
@@ -75,14 +76,13 @@ class Crossing {
   }
 
   Status CopyTree() const {
-    Place hidden;
-    hidden.folder = UniqueFd(::fcntl(to_.folder.Get(), F_DUPFD_CLOEXEC, 0));
-    if (!hidden.folder) return LastError();
-    hidden.name = RandomHiddenName();
-    Status copied = CopyItemAt(from_, hidden);
+    const auto hidden = EntryOf(to_.folder.Get(), RandomHiddenName());
+    if (!hidden) return hidden.Reason();
+    const std::string& name = hidden.Value().name;
+    Status copied = CopyItemAt(from_, hidden.Value());
     if (copied) copied = AfterSync(::syncfs(target_.Get()));
-    if (copied) copied = Publish(hidden.name);
-    if (!copied) (void)RemoveItemAt(target_.Get(), hidden.name);
+    if (copied) copied = Publish(name);
+    if (!copied) (void)RemoveItemAt(target_.Get(), name);
     return copied;
   }
 
@@ -115,10 +115,15 @@ class Crossing {
 
 }  // namespace
 
-Status MoveAcross(const Place& from, const Place& to) {
+Status CopyAcross(const Place& from, const Place& to) {
   const auto status = ReadStatus(from);
   if (!status) return status.Reason();
-  return Crossing(from, to, status.Value()).Move();
+  return Crossing(from, to, status.Value()).Copy();
+}
+
+Status MoveAcross(const Place& from, const Place& to) {
+  const Status copied = CopyAcross(from, to);
+  return copied ? RemoveItemAt(from.folder.Get(), from.name) : copied;
 }
 
 }  // namespace orb::platform
