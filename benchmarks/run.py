@@ -1,7 +1,7 @@
 # SPDX-License-Identifier: MIT
 """Runs the benchmark programs of a build and keeps what they say in BUILD/results/*.json.
 
-usage: run.py BUILD [--quick] [program ...]
+usage: run.py BUILD [--quick] [--rounds N] [program ...]
 
 With the right to mount, and in a name space of its own, everything happens in a new tmpfs.
 """
@@ -16,7 +16,7 @@ import re
 import subprocess
 import sys
 import time
-from dataclasses import dataclass
+from dataclasses import dataclass, replace
 
 
 @dataclass(frozen=True)
@@ -59,14 +59,13 @@ MAKE = {
 @dataclass(frozen=True)
 class Effort:
     repetitions: int
-    rounds: int
-    own_rounds: int
+    rounds: int  # On file systems.
     seconds: float  # The least time that one repetition of a row in memory runs.
     file_systems: tuple
 
 
-FULL = Effort(9, 5, 5, 0.02, tuple(MAKE))
-QUICK = Effort(3, 1, 1, 0.002, ("ext4",))
+FULL = Effort(7, 3, 0.02, tuple(MAKE))
+QUICK = Effort(3, 1, 0.002, ("ext4",))
 
 
 @contextlib.contextmanager
@@ -141,7 +140,7 @@ class Runner:
         elif program.on:
             self.run_on_file_systems(program, scratch)
         elif program.own_rounds:
-            self.run(program, scratch, repetitions=self.effort.own_rounds, min_time=0)
+            self.run(program, scratch, repetitions=self.effort.rounds, min_time=0)
         else:
             self.run(program, scratch, repetitions=self.effort.repetitions,
                      min_time=self.effort.seconds)
@@ -204,10 +203,13 @@ def main():
     parser = argparse.ArgumentParser()
     parser.add_argument("build", type=lambda path: pathlib.Path(path).resolve())
     parser.add_argument("--quick", action="store_true")
+    parser.add_argument("--rounds", type=int)
     parser.add_argument("programs", nargs="*")
     options = parser.parse_intermixed_args()
 
-    runner = Runner(options.build, QUICK if options.quick else FULL, options.quick)
+    effort = QUICK if options.quick else FULL
+    effort = replace(effort, rounds=options.rounds or effort.rounds)
+    runner = Runner(options.build, effort, options.quick)
     for old in runner.results.iterdir():
         old.unlink()
     about = machine(options.build) | {"run": "quick" if options.quick else "full"}
