@@ -97,8 +97,8 @@ BENCHMARK(Drive_OrbCached)->Name("DriveCached/Orb");
 void Drive_OrbFirst(benchmark::State& state) {
   for (auto _ : state) {
     const auto drives = orb::platform::MakeDrives({});
-    benchmark::DoNotOptimize(drives->VolumeOf(Folder()));
-    benchmark::DoNotOptimize(drives->Read(Folder()));
+    const auto volume = drives->VolumeOf(Folder());
+    benchmark::DoNotOptimize(drives->Read(Folder(), volume.Value()));
   }
 }
 BENCHMARK(Drive_OrbFirst)->Name("DriveFirst/Orb");
@@ -107,8 +107,8 @@ BENCHMARK(Drive_OrbFirst)->Name("DriveFirst/Orb");
 void Drive_OrbNextVolume(benchmark::State& state) {
   const auto drives = orb::platform::MakeDrives({});
   for (auto _ : state) {
-    benchmark::DoNotOptimize(drives->VolumeOf(Folder()));
-    benchmark::DoNotOptimize(drives->Read(Folder()));
+    const auto volume = drives->VolumeOf(Folder());
+    benchmark::DoNotOptimize(drives->Read(Folder(), volume.Value()));
   }
 }
 BENCHMARK(Drive_OrbNextVolume)->Name("DriveNextVolume/Orb");

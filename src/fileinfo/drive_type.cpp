@@ -60,7 +60,7 @@ eOrbDriveType FindType(const std::string& path) {
   if (!volume) return eOrbDriveType_Fixed;
   if (const auto kept = DriveTypeCache::Instance().Find(volume.Value())) return *kept;
   // Outside the lock: two threads may find out the same.
-  const auto traits = Drives::Current().Read(path);
+  const auto traits = Drives::Current().Read(path, volume.Value());
   if (!traits) return eOrbDriveType_Fixed;
   const eOrbDriveType type = TypeOf(traits.Value());
   DriveTypeCache::Instance().Add(volume.Value(), type);

@@ -42,7 +42,8 @@ class Drives {
 
   /// The volume of the item itself; a link is not followed.
   virtual Result<VolumeId> VolumeOf(const std::string& path) const = 0;
-  virtual Result<DriveTraits> Read(const std::string& path) const = 0;
+  /// Of the volume that VolumeOf() has just given for the path.
+  virtual Result<DriveTraits> Read(const std::string& path, const VolumeId& volume) const = 0;
 };
 
 /// Where the system tells of itself; tests lay out machines of their own.

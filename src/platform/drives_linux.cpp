@@ -2,7 +2,9 @@
 #include "platform/drives.h"
 
 #include <fcntl.h>
+#include <linux/magic.h>
 #include <sys/stat.h>
+#include <sys/vfs.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -18,8 +20,8 @@
 #include <utility>
 #include <vector>
 
+#include "platform/linux/mount_number.h"
 #include "platform/linux/posix.h"
-#include "platform/linux/system_file.h"
 #include "platform/mount_table.h"
 
 namespace orb::platform {
@@ -84,22 +86,6 @@ struct Device {
   std::string path;
 };
 
-std::optional<Device> FindDevice(const std::string& folder) {
-  std::array<char, PATH_MAX> target;
-  const ssize_t size = ::readlink(folder.c_str(), target.data(), target.size());
-  if (size < 0 && errno != EINVAL) return std::nullopt;  // EINVAL: a folder, and no link.
-  Device device{folder, folder, size < 0 ? folder : std::string(target.data(), std::size_t(size))};
-  const bool isPartition = ::access((folder + "/partition").c_str(), F_OK) == 0;
-  if (isPartition) device.disk += "/..";
-  return device;
-}
-
-/// Empty when there is none.
-std::string ReadAttribute(const std::string& folder, const char* name) {
-  const Result<std::string> text = ReadSystemFile(folder + '/' + name);
-  return text ? text.Value().substr(0, text.Value().find('\n')) : std::string();
-}
-
 /// Whether a component of the path is the word and a number, as in usb1 and fw0.
 bool HasNumbered(std::string_view path, std::string_view word) {
   const auto isDigit = [](char c) { return c >= '0' && c <= '9'; };
@@ -111,6 +97,50 @@ bool HasNumbered(std::string_view path, std::string_view word) {
     if (begins && !digits.empty() && std::ranges::all_of(digits, isDigit)) return true;
   }
   return false;
+}
+
+bool IsTakenOut(const Device& device) {
+  return HasNumbered(device.path, "usb") || HasNumbered(device.path, "fw");
+}
+
+/// By their drivers, which know no media that are changed. What a virtual SCSI adapter shows is
+/// another matter.
+bool IsNeverTakenOut(const Device& device) {
+  if (IsTakenOut(device)) return false;
+  const std::string_view above =
+      std::string_view(device.path).substr(0, device.path.find("/block/"));
+  const std::size_t last = above.rfind('/');
+  return HasNumbered(device.path, "nvme") ||
+         (last != above.npos && HasNumbered(above.substr(last), "virtio"));
+}
+
+/// A disk lies in a folder "block", and its partitions in that of the disk; where the path does not
+/// show it, an attribute does.
+bool IsPartition(const Device& device) {
+  const std::string_view path = device.path;
+  const std::string_view above = path.substr(0, path.rfind('/'));
+  if (path.find("/devices/") != path.npos && above.ends_with("/block")) return false;
+  return ::access((device.folder + "/partition").c_str(), F_OK) == 0;
+}
+
+std::optional<Device> FindDevice(const std::string& folder) {
+  std::array<char, PATH_MAX> target;
+  const ssize_t size = ::readlink(folder.c_str(), target.data(), target.size());
+  if (size < 0 && errno != EINVAL) return std::nullopt;  // EINVAL: a folder, and no link.
+  Device device{folder, folder, size < 0 ? folder : std::string(target.data(), std::size_t(size))};
+  if (!IsNeverTakenOut(device) && IsPartition(device)) device.disk += "/..";
+  return device;
+}
+
+/// Empty when there is none.
+std::string ReadAttribute(const std::string& folder, const char* name) {
+  const std::string path = folder + '/' + name;
+  const UniqueFd file(Retry([&] { return ::open(path.c_str(), O_RDONLY | O_CLOEXEC); }));
+  if (!file) return {};
+  std::array<char, 64> text;
+  const ssize_t size = Retry([&] { return ::read(file.Get(), text.data(), text.size()); });
+  const std::string_view line(text.data(), static_cast<std::size_t>(std::max<ssize_t>(size, 0)));
+  return std::string(line.substr(0, line.find('\n')));
 }
 
 /// Only devices that the kernel makes of others stand on some.
@@ -132,10 +162,14 @@ std::vector<Device> Slaves(const Device& device) {
 
 /// Of a SCSI device its kind, where 5 is an optical drive; of a card "SD", or "MMC" for one that is
 /// soldered in.
-std::string TypeOf(const Device& device) { return ReadAttribute(device.disk, "device/type"); }
+std::string TypeOf(const Device& device) {
+  const std::string_view name = std::string_view(device.path).substr(device.path.rfind('/') + 1);
+  if (name.starts_with("sd")) return {};  // A SCSI disk: the kernel calls optical drives sr.
+  return ReadAttribute(device.disk, "device/type");
+}
 
 bool IsEjectable(const Device& device, const std::string& type, int depth = 0) {
-  if (HasNumbered(device.path, "usb") || HasNumbered(device.path, "fw")) return true;
+  if (IsTakenOut(device)) return true;
   if (type.starts_with("SD") || ReadAttribute(device.disk, "removable") == "1") return true;
   if (IsPhysical(device) || depth == kMostSlaves) return false;
   return std::ranges::any_of(Slaves(device), [&](const auto& slave) {
@@ -191,7 +225,7 @@ DriveTraits TraitsOf(const Mount& mount, const std::string& sysfs) {
   constexpr std::string_view kScsiOptical = "5";
   if (IsRemote(mount)) return {.remote = true};
   const std::optional<Device> device = FindDevice(sysfs, mount);
-  if (!device) return {};
+  if (!device || IsNeverTakenOut(*device)) return {};
   DriveTraits traits;
   const std::string type = TypeOf(*device);
   traits.optical = type == kScsiOptical;
@@ -228,6 +262,12 @@ class RecentMountTable {
  public:
   explicit RecentMountTable(std::string file) : file_(std::move(file)) {}
 
+  /// Whether it has been read so lately that it serves for now.
+  bool IsFresh() {
+    const std::lock_guard lock(mutex_);
+    return freshUntil_ && Clock::now() < *freshUntil_;
+  }
+
   /// The network mount that a path is on by its text. What ".." means only the kernel knows.
   std::optional<Mount> FindRemote(std::string_view path) {
     if (path.find("/..") != std::string_view::npos) return std::nullopt;
@@ -263,21 +303,33 @@ class RecentMountTable {
   std::optional<Clock::time_point> freshUntil_;
 };
 
+/// Without the table an answer takes longer, but reading the table takes as long as many answers.
+constexpr int kMostWithoutTable = 16;
+
 class SystemDrives final : public Drives {
  public:
   explicit SystemDrives(SystemRoots roots)
-      : sysfs_(std::move(roots.sysfs)), mounts_(std::move(roots.mountTable)) {}
+      : sysfs_(std::move(roots.sysfs)),
+        isOfKernel_(IsOfKernel(roots.mountTable)),
+        mounts_(std::move(roots.mountTable)) {}
 
   Result<VolumeId> VolumeOf(const std::string& path) const override {
     const ErrnoKeeper errnoKeeper;
+    if (MayDoWithoutTable()) {
+      if (const auto number = MountNumberInMemory(path)) return VolumeId{*number, 0};
+    }
     if (const auto remote = mounts_.FindRemote(path)) return IdOf(remote->id, remote->device);
     const Result<StatusRecord> status = ReadMountId(path, kUniqueMountId);
     if (!status) return status.Reason();
     return IdOf(status.Value());
   }
 
-  Result<DriveTraits> Read(const std::string& path) const override {
+  Result<DriveTraits> Read(const std::string& path, const VolumeId& volume) const override {
     const ErrnoKeeper errnoKeeper;
+    const bool hasUniqueNumber = volume.device == 0;
+    if (isOfKernel_ && hasUniqueNumber) {
+      if (const auto mount = ReadMount(volume.mount)) return TraitsOf(*mount, sysfs_);
+    }
     if (mounts_.FindRemote(path)) return DriveTraits{.remote = true};
     const Result<StatusRecord> status = ReadMountId(path, STATX_MNT_ID);
     if (!status) return status.Reason();
@@ -289,8 +341,23 @@ class SystemDrives final : public Drives {
   }
 
  private:
+  /// Where something else has been put in the table's place, the kernel does not know of it.
+  static bool IsOfKernel(const std::string& mountTable) {
+    struct statfs volume;
+    return ::statfs(mountTable.c_str(), &volume) == 0 && volume.f_type == PROC_SUPER_MAGIC;
+  }
+
+  bool MayDoWithoutTable() const {
+    if (!isOfKernel_ || mounts_.IsFresh()) return false;
+    if (withoutTable_.fetch_add(1, std::memory_order_relaxed) < kMostWithoutTable) return true;
+    withoutTable_.store(0, std::memory_order_relaxed);
+    return false;
+  }
+
   const std::string sysfs_;
+  const bool isOfKernel_;
   mutable RecentMountTable mounts_;
+  mutable std::atomic<int> withoutTable_ = 0;
 };
 
 constinit std::atomic<const Drives*> currentDrives = nullptr;

@@ -27,7 +27,7 @@ class OneVolume final : public orb::platform::Drives {
     if (path == "/gone") return orb::platform::kNoSuchItem;
     return VolumeId{number_, 1};
   }
-  Result<DriveTraits> Read(const std::string&) const override {
+  Result<DriveTraits> Read(const std::string&, const VolumeId&) const override {
     ++reads;
     return traits_;
   }

@@ -1,12 +1,16 @@
 // SPDX-License-Identifier: MIT
 #include "platform/drives.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <filesystem>
 #include <string>
 
+#include "platform/linux/mount_number.h"
+#include "platform/mount_table.h"
 #include "support/faults.h"
 #include "support/temp_folder.h"
 
@@ -65,7 +69,9 @@ class Machine {
 
   std::string KindOf(const std::string& path) const {
     const auto drives = MakeDrives({folder_ / "mountinfo", folder_ / "sys"});
-    const Result<DriveTraits> read = drives->Read(path);
+    const auto volume = drives->VolumeOf(path);
+    if (!volume) return "nothing";
+    const Result<DriveTraits> read = drives->Read(path, volume.Value());
     if (!read) return "nothing";
     const DriveTraits& traits = read.Value();
     if (traits.remote) return "remote";
@@ -107,6 +113,10 @@ TEST(Drives, TellTheDisksOfAMachineApart) {
   machine.AddDevice("pci0/ata3/block/sr0", "11:0");
   machine.SetAttribute("pci0/ata3/block/sr0", "removable", "1");
   machine.SetAttribute("pci0/ata3/block/sr0", "device/type", "5");
+  machine.AddDevice("pci0/nvme/nvme0/nvme0n1/nvme0n1p1", "259:1");
+  machine.AddDevice("pci0/virtio1/block/vda", "254:0");
+  machine.AddDevice("pci0/virtio2/host2/block/sr1", "11:1");
+  machine.SetAttribute("pci0/virtio2/host2/block/sr1", "device/type", "5");
   machine.AddDevice("virtual/block/loop0", "7:0");
   machine.AddDevice("virtual/block/dm-0", "253:0");
   machine.SetAttribute("virtual/block/dm-0", "dm/name", "vault");
@@ -124,6 +134,9 @@ TEST(Drives, TellTheDisksOfAMachineApart) {
     const char* kind;
   } kCases[] = {
       {"disk", "8:2", "ext4", "/dev/sda2", "rw", "fixed"},
+      {"flash disk", "259:1", "ext4", "/dev/nvme0n1p1", "rw", "fixed"},
+      {"virtual disk", "254:0", "ext4", "/dev/vda", "rw", "fixed"},
+      {"virtual dvd", "11:1", "iso9660", "/dev/sr1", "ro", "optical"},
       {"stick", "8:17", "vfat", "/dev/sdb1", "rw", "removable"},
       {"stick in ro", "8:17", "vfat", "/dev/sdb1", "ro,nosuid", "read-only"},
       {"switched stick", "8:48", "exfat", "/dev/sdd", "rw", "read-only"},
@@ -167,6 +180,63 @@ TEST(Drives, DoNotLookAtWhatIsBelowANetworkMount) {
             drives->VolumeOf(share + "/b/c").Value());
 }
 
+/// All that a table tells but the number, which is of another kind.
+std::string Describe(const Mount& mount) {
+  return mount.folder + '|' + mount.type + '|' + mount.source + '|' +
+         std::to_string(mount.device.major) + ':' + std::to_string(mount.device.minor) +
+         (mount.readOnly ? "|ro" : "|rw");
+}
+
+TEST(Drives, LearnOfOneMountWhatTheTableTells) {
+  const test::TempFolder folder;
+  const auto compare = [&] {
+    const std::string odd = folder / "a b\nc";
+    ASSERT_TRUE(test::MountTmpfs(odd, "size=1m"));
+    ASSERT_TRUE(test::MakeReadOnlyVolume(folder / "ro"));
+    const MountTable table = MountTable::Read("/proc/self/mountinfo").Value();
+    int compared = 0;
+    for (const Mount& listed : table.Mounts()) {
+      const auto number = MountNumberInMemory(listed.folder);
+      const auto mount = number ? ReadMount(*number) : std::nullopt;
+      if (!mount || mount->folder != listed.folder) continue;  // Another one hides it.
+      EXPECT_EQ(Describe(*mount), Describe(*table.FindByPath(listed.folder)));
+      ++compared;
+    }
+    EXPECT_TRUE(compared >= 3 || !MountNumberInMemory("/")) << compared;
+  };
+  fs::create_directory(folder / "ro");
+  ORB_IN_CHILD(test::RunWithPrivateMounts(compare));
+}
+
+TEST(Drives, DoNotWaitForAServerThatDoesNotAnswer) {
+  const test::TempFolder folder;
+  fs::create_directory(folder / "share");
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    const int server = ::open("/dev/fuse", O_RDWR | O_CLOEXEC);
+    const std::string options =
+        "fd=" + std::to_string(server) + ",rootmode=40000,user_id=0,group_id=0";
+    const std::string share = folder / "share";
+    if (::mount("nas:", share.c_str(), "fuse.sshfs", 0, options.c_str()) != 0) return;
+    ::alarm(20);
+    for (const char* below : {"", "/photo.jpg"}) {
+      const auto drives = MakeDrives({});
+      const VolumeId volume = drives->VolumeOf(share + below).Value();
+      EXPECT_TRUE(drives->Read(share + below, volume).Value().remote) << below;
+    }
+  }));
+}
+
+TEST(Drives, BelieveATableThatStandsInForTheKernels) {
+  Machine machine;
+  const std::string share = machine.Mount("share", "0:55", "nfs", "nas:/photos");
+  const std::string table = machine.Folder() / "mountinfo";
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    ASSERT_TRUE(test::BindMount(table, "/proc/self/mountinfo"));
+    const auto drives = MakeDrives({});
+    EXPECT_TRUE(drives->Read(share, drives->VolumeOf(share).Value()).Value().remote);
+  }));
+}
+
 TEST(Drives, GiveNothingWhereNothingIs) {
   Machine machine;
   const std::string disk = machine.Mount("disk", "8:2", "ext4", "/dev/sda2");
@@ -190,7 +260,7 @@ TEST(Drives, KnowARealMountByItsNumber) {
     const VolumeId first = volumeOf(inner);
     EXPECT_NE(first, before);
     EXPECT_EQ(volumeOf(folder / "link"), before) << "the link itself is asked about";
-    EXPECT_TRUE(Drives::Current().Read(inner).Ok()) << "newer than the table that was read";
+    EXPECT_TRUE(Drives::Current().Read(inner, first).Ok()) << "newer than the table that was read";
     ::umount(inner.c_str());
     ASSERT_TRUE(test::BindMount(folder.Path(), inner));
     EXPECT_NE(volumeOf(inner), first);
