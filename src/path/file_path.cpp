@@ -59,6 +59,11 @@ void COrbFilePath::Free() { path.Clear(); }
 bool COrbFilePath::IsEmpty() const { return path.IsEmpty(); }
 
 OrbResult COrbFilePath::Initialize(const COrbStringData* fullPath) {
+  if (path.IsEmpty() && fullPath != &path) {
+    Free();
+    path = *fullPath;
+    return kOrbNoErr;
+  }
   COrbStringData kept = *fullPath;  // Free() may end the text that was handed in.
   Free();
   path = std::move(kept);

@@ -207,6 +207,20 @@ std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
   return static_cast<std::size_t>(out - begin);
 }
 
+std::size_t Utf16FromAscii(std::string_view text, char16_t* out) {
+  std::size_t at = 0;
+  for (; at < text.size() && static_cast<unsigned char>(text[at]) < 0x80; ++at) {
+    out[at] = static_cast<unsigned char>(text[at]);
+  }
+  return at;
+}
+
+std::size_t AsciiFromUtf16(std::u16string_view text, char* out) {
+  std::size_t at = 0;
+  for (; at < text.size() && text[at] < 0x80; ++at) out[at] = static_cast<char>(text[at]);
+  return at;
+}
+
 std::size_t Utf16LengthOfValid(std::string_view text) {
   std::size_t length = 0;
   for (const char byte : text) {
@@ -233,6 +247,80 @@ std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
 
 #if defined(__SSE2__)
 
+namespace {
+
+constexpr std::size_t kBlock = sizeof(__m128i);
+
+template <typename T>
+__m128i Load(const T* from) {
+  return _mm_loadu_si128(reinterpret_cast<const __m128i*>(from));
+}
+
+template <typename T>
+void Store(T* to, __m128i block) {
+  _mm_storeu_si128(reinterpret_cast<__m128i*>(to), block);
+}
+
+/// Blocks of 16 bytes, widened as long as all of them are ASCII.
+template <std::size_t Count>
+bool Widen(const char* from, char16_t* to) {
+  __m128i blocks[Count];
+  __m128i any = _mm_setzero_si128();
+  for (std::size_t i = 0; i < Count; ++i) {
+    blocks[i] = Load(from + i * kBlock);
+    any = _mm_or_si128(any, blocks[i]);
+  }
+  if (_mm_movemask_epi8(any) != 0) return false;
+  for (std::size_t i = 0; i < Count; ++i) {
+    Store(to + i * kBlock, _mm_unpacklo_epi8(blocks[i], _mm_setzero_si128()));
+    Store(to + i * kBlock + kBlock / 2, _mm_unpackhi_epi8(blocks[i], _mm_setzero_si128()));
+  }
+  return true;
+}
+
+/// The same the other way, sixteen units a block.
+template <std::size_t Count>
+bool Narrow(const char16_t* from, char* to) {
+  __m128i halves[2 * Count];
+  __m128i any = _mm_setzero_si128();
+  for (std::size_t i = 0; i < 2 * Count; ++i) {
+    halves[i] = Load(from + i * kBlock / 2);
+    any = _mm_or_si128(any, halves[i]);
+  }
+  const __m128i high = _mm_and_si128(any, _mm_set1_epi16(-0x80));
+  if (_mm_movemask_epi8(_mm_cmpeq_epi16(high, _mm_setzero_si128())) != 0xFFFF) return false;
+  for (std::size_t i = 0; i < Count; ++i) {
+    Store(to + i * kBlock, _mm_packus_epi16(halves[2 * i], halves[2 * i + 1]));
+  }
+  return true;
+}
+
+/// In steps of 64 and 16; the last step may go over what the one before has done.
+template <typename From, typename To>
+std::size_t InBlocks(const From* from,
+                     std::size_t size,
+                     To* to,
+                     bool (*four)(const From*, To*),
+                     bool (*one)(const From*, To*)) {
+  std::size_t at = 0;
+  while (size - at >= 4 * kBlock && four(from + at, to + at)) at += 4 * kBlock;
+  while (size - at >= kBlock && one(from + at, to + at)) at += kBlock;
+  const bool nearEnd = size - at < kBlock && size >= kBlock;
+  return nearEnd && one(from + size - kBlock, to + size - kBlock) ? size : at;
+}
+
+}  // namespace
+
+std::size_t Utf16FromAscii(std::string_view text, char16_t* out) {
+  const std::size_t done = InBlocks(text.data(), text.size(), out, Widen<4>, Widen<1>);
+  return done + portable::Utf16FromAscii(text.substr(done), out + done);
+}
+
+std::size_t AsciiFromUtf16(std::u16string_view text, char* out) {
+  const std::size_t done = InBlocks(text.data(), text.size(), out, Narrow<4>, Narrow<1>);
+  return done + portable::AsciiFromUtf16(text.substr(done), out + done);
+}
+
 // Aligned blocks of 16 bytes lie within one page, so the one that holds the terminator may be read
 // whole, with what lies before the text and behind it. The reads stand in this function alone,
 // where the sanitizers are told so.
@@ -253,6 +341,14 @@ __attribute__((no_sanitize("address", "thread"))) std::size_t Utf16Length(
 }
 
 #else
+
+std::size_t Utf16FromAscii(std::string_view text, char16_t* out) {
+  return portable::Utf16FromAscii(text, out);
+}
+
+std::size_t AsciiFromUtf16(std::u16string_view text, char* out) {
+  return portable::AsciiFromUtf16(text, out);
+}
 
 std::size_t Utf16Length(const unsigned short* text) {
   std::size_t length = 0;

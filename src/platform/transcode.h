@@ -23,6 +23,11 @@ std::size_t Utf16LengthOfValid(std::string_view text);
 /// number. `out` needs room for 3 * text.size() + kSlack bytes.
 std::size_t Utf8FromUtf16(std::u16string_view text, char* out);
 
+/// Convert the ASCII that a text begins with and return how much that is. They write no more than
+/// as many as the text has.
+std::size_t Utf16FromAscii(std::string_view text, char16_t* out);
+std::size_t AsciiFromUtf16(std::u16string_view text, char* out);
+
 /// The number of units before the terminating zero.
 std::size_t Utf16Length(const unsigned short* text);
 
@@ -52,6 +57,8 @@ namespace portable {
 std::size_t Utf16FromUtf8(std::string_view text, char16_t* out);
 std::size_t Utf16LengthOfValid(std::string_view text);
 std::size_t Utf8FromUtf16(std::u16string_view text, char* out);
+std::size_t Utf16FromAscii(std::string_view text, char16_t* out);
+std::size_t AsciiFromUtf16(std::u16string_view text, char* out);
 
 }  // namespace portable
 }  // namespace orb::platform

@@ -7,7 +7,9 @@
 #include <cstdint>
 #include <string_view>
 
+#include "strings/text_buffer.h"
 #include "strings/text_scan.h"
+#include "strings/text_utf8.h"
 
 namespace orb {
 
@@ -32,9 +34,13 @@ struct StringAccess {
     return Read(*s.value);
   }
   static Utf8Text Read(const COrbStringData::COrbStringValue& value) {
-    if (value.scan.load(std::memory_order_relaxed) == 0) Scan(value);
-    const TextScan scan = TextScan::Unpack(value.scan.load(std::memory_order_acquire));
-    return {{value.utf8Text.load(std::memory_order_relaxed), value.utf8Length}, scan};
+    const std::uint8_t known = value.scannedKind.load(std::memory_order_acquire);
+    if (known == 0) return Scan(value);
+    const char* bytes = value.utf8Text.load(std::memory_order_relaxed);
+    const std::string_view text(bytes, TextBuffer::Length(bytes));
+    const std::uint32_t length = value.scannedLength.load(std::memory_order_relaxed);
+    const auto kind = static_cast<TextKind>(known - 1);
+    return {text, {kind, length != kTooLong ? length : CountUnits(text)}};
   }
   /// A new value from bytes that need no terminating zero, with one allocation. They must not hold
   /// a zero byte.
@@ -43,7 +49,10 @@ struct StringAccess {
  private:
   static void GiveValue(const COrbStringData& s);
   /// Leaves an empty text when there is no memory for the UTF-8 copy.
-  static void Scan(const COrbStringData::COrbStringValue& value);
+  static Utf8Text Scan(const COrbStringData::COrbStringValue& value);
+
+  /// Four billion units are not kept but counted each time.
+  static constexpr std::uint32_t kTooLong = UINT32_MAX;
 };
 
 }  // namespace orb

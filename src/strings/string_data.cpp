@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include <orb/strings/string_data.h>
 
+#include <algorithm>
 #include <array>
 #include <cstdlib>
 #include <cstring>
@@ -12,56 +13,35 @@
 
 #include "platform/transcode.h"
 #include "strings/string_access.h"
+#include "strings/text_buffer.h"
 
 namespace {
 
+using orb::TextBuffer;
+using orb::platform::AsciiFromUtf16;
 using orb::platform::kNotUtf8;
 using orb::platform::kSlack;
 using orb::platform::MacRomanFromUtf16;
+using orb::platform::Utf16FromAscii;
 using orb::platform::Utf16FromUtf8;
 using orb::platform::Utf16Length;
 using orb::platform::Utf16LengthOfValid;
 using orb::platform::Utf8FromMacRoman;
 using orb::platform::Utf8FromUtf16;
 
-enum Master : std::uint32_t { kNone = 0, kSystem = 1, kUtf8 = 2, kUnicode = 3 };
+enum Master : std::uint8_t { kNone = 0, kSystem = 1, kUtf8 = 2, kUnicode = 3 };
 
 /// Up to here a text is converted on the stack and then copied at its size.
 constexpr std::size_t kShort = 256;
 constexpr std::size_t kMostOnStack = 3072;
+/// How much of a text is looked at before it is taken for ASCII.
+constexpr std::size_t kFirstLook = 64;
 
 /// Null without memory.
 void* BlockFor(std::size_t size) noexcept try {
   return ::operator new(size);
 } catch (const std::bad_alloc&) {
   return nullptr;
-}
-
-class Held {
- public:
-  explicit Held(const COrbCriticalSection& lock) : lock_(lock) { lock_.Enter(); }
-  ~Held() { lock_.Leave(); }
-  Held(const Held&) = delete;
-  Held& operator=(const Held&) = delete;
-
- private:
-  const COrbCriticalSection& lock_;
-};
-
-/// Stores the first text that a value is given; later ones are ignored.
-template <typename Store>
-OrbResult InitOnce(const void* text,
-                   const COrbCriticalSection& lock,
-                   std::atomic<std::uint32_t>& master,
-                   Master encoding,
-                   Store store) {
-  if (text == nullptr) return kOrbErrUnknown;
-  if (master != kNone) return kOrbNoErr;
-  const Held held(lock);
-  if (master != kNone) return kOrbNoErr;
-  store();
-  master = encoding;
-  return kOrbNoErr;
 }
 
 /// A text on its way to being stored; `text` is null when there was no memory.
@@ -71,8 +51,13 @@ struct Copy {
   std::size_t length;
 };
 
+template <typename Unit>
+Unit* Buffer(std::size_t size) {
+  return static_cast<Unit*>(TextBuffer::Make(size));
+}
+
 Copy<char> Duplicate(std::string_view text) {
-  auto* copy = static_cast<char*>(std::malloc(text.size() + 1));
+  auto* copy = Buffer<char>(text.size() + 1);
   if (copy == nullptr) return {nullptr, 0};
   if (!text.empty()) std::memcpy(copy, text.data(), text.size());
   copy[text.size()] = '\0';
@@ -81,7 +66,7 @@ Copy<char> Duplicate(std::string_view text) {
 
 Copy<unsigned short> Duplicate(const unsigned short* text, std::size_t length) {
   const std::size_t size = (length + 1) * sizeof(unsigned short);
-  auto* copy = static_cast<unsigned short*>(std::malloc(size));
+  auto* copy = Buffer<unsigned short>(size);
   if (copy != nullptr) std::memcpy(copy, text, size);
   return {copy, length};
 }
@@ -91,11 +76,11 @@ Copy<unsigned short> Duplicate(const unsigned short* text, std::size_t length) {
 /// next one anew.
 char* Shrunk(char* buffer, std::size_t size, std::size_t before) {
   constexpr std::size_t kLarge = std::size_t{64} * 1024;
-  void* exact = before < kLarge ? std::realloc(buffer, size) : std::malloc(size);
+  void* exact = before < kLarge ? TextBuffer::Resized(buffer, size) : TextBuffer::Make(size);
   if (exact == nullptr) return buffer;
   if (before >= kLarge) {
     std::memcpy(exact, buffer, size);
-    std::free(buffer);
+    TextBuffer::Free(buffer);
   }
   return static_cast<char*>(exact);
 }
@@ -107,7 +92,7 @@ Copy<char> Written(std::size_t most, Write write) {
     std::array<char, kMostOnStack + kSlack> buffer;
     return Duplicate({buffer.data(), write(buffer.data())});
   }
-  auto* made = static_cast<char*>(std::malloc(most + kSlack));
+  auto* made = Buffer<char>(most + kSlack);
   if (made == nullptr) return {nullptr, 0};
   const std::size_t length = write(made);
   made[length] = '\0';
@@ -122,11 +107,42 @@ Copy<unsigned short> Terminated(unsigned short* text, std::size_t length) {
   return {text, length};
 }
 
+/// Nothing where the text is not ASCII alone. Most texts that are not show it where they begin, and
+/// what others have cost by then is little.
+std::optional<Copy<unsigned short>> UnicodeFromAscii(std::string_view utf8) {
+  std::array<char16_t, kFirstLook> head;
+  const std::string_view first = utf8.substr(0, kFirstLook);
+  if (Utf16FromAscii(first, head.data()) != first.size()) return std::nullopt;
+  auto* made = Buffer<unsigned short>(UnicodeSize(utf8.size()));
+  if (made == nullptr) return std::nullopt;
+  const std::size_t length = Utf16FromAscii(utf8, reinterpret_cast<char16_t*>(made));
+  if (length == utf8.size()) return Terminated(made, length);
+  TextBuffer::Free(made);
+  return std::nullopt;
+}
+
+std::optional<Copy<char>> Utf8FromAscii(std::u16string_view units) {
+  std::array<char, kFirstLook> head;
+  const std::u16string_view first = units.substr(0, kFirstLook);
+  if (AsciiFromUtf16(first, head.data()) != first.size()) return std::nullopt;
+  auto* made = Buffer<char>(units.size() + 1);
+  if (made == nullptr) return std::nullopt;
+  made[units.size()] = '\0';
+  if (AsciiFromUtf16(units, made) == units.size()) return Copy<char>{made, units.size()};
+  TextBuffer::Free(made);
+  return std::nullopt;
+}
+
+Copy<char> Utf8From(std::u16string_view units) {
+  if (const auto ascii = Utf8FromAscii(units)) return *ascii;
+  return Written(3 * units.size(), [&](char* out) { return Utf8FromUtf16(units, out); });
+}
+
 Copy<unsigned short> ShortUnicode(std::string_view utf8) {
   std::array<char16_t, kShort + kSlack> units;
   std::size_t length = Utf16FromUtf8(utf8, units.data());
   if (length == kNotUtf8) length = 0;
-  auto* made = static_cast<unsigned short*>(std::malloc(UnicodeSize(length)));
+  auto* made = Buffer<unsigned short>(UnicodeSize(length));
   if (made == nullptr) return {nullptr, 0};
   std::memcpy(made, units.data(), length * sizeof *made);
   return Terminated(made, length);
@@ -135,15 +151,16 @@ Copy<unsigned short> ShortUnicode(std::string_view utf8) {
 /// The second half of the room takes what the conversion overwrites. A text with fewer units than a
 /// third of its bytes is no UTF-8, and one with more has that much room.
 Copy<unsigned short> UnicodeFrom(std::string_view utf8) {
+  if (const auto ascii = UnicodeFromAscii(utf8)) return *ascii;
   if (utf8.size() <= kShort) return ShortUnicode(utf8);
   static_assert(kShort / 3 > kSlack);
   const std::size_t most = Utf16LengthOfValid(utf8);
   if (most < utf8.size() / 3) return ShortUnicode({});
-  auto* made = static_cast<unsigned short*>(std::malloc(UnicodeSize(most)));
+  auto* made = Buffer<unsigned short>(UnicodeSize(most));
   if (made == nullptr) return {nullptr, 0};
   const std::size_t length = Utf16FromUtf8(utf8, reinterpret_cast<char16_t*>(made));
   if (length == most) return Terminated(made, length);
-  std::free(made);
+  TextBuffer::Free(made);
   return ShortUnicode({});
 }
 
@@ -154,6 +171,26 @@ Copy<char> SystemFrom(std::string_view utf8) try {
   return {nullptr, 0};
 }
 
+/// Publishes a copy behind its length.
+template <typename Unit>
+Unit* Stored(std::atomic<Unit*>& place, Copy<Unit> copy) {
+  if (copy.text != nullptr) TextBuffer::SetLength(copy.text, copy.length);
+  place.store(copy.text, std::memory_order_release);
+  return copy.text;
+}
+
+/// Of a copy that may be missing.
+std::size_t LengthOf(const void* text) { return text == nullptr ? 0 : TextBuffer::Length(text); }
+
+/// Stands in where there is no memory for a lock: it may be that of many values, for no thread
+/// holds those of two. It is there as long as there are strings, to the very end.
+union Reserve {
+  constexpr Reserve() : lock() {}
+  ~Reserve() {}  // NOLINT(modernize-use-equals-default): leaves the lock alone.
+  COrbCriticalSection lock;
+};
+constinit Reserve reserve;
+
 }  // namespace
 
 // A value behind which its text lies: one allocation. Where there is no memory for both, the value
@@ -162,78 +199,76 @@ COrbStringData::COrbStringValue* COrbStringData::COrbStringValue::Make(std::uint
                                                                        const void* text,
                                                                        std::size_t length) {
   const std::size_t size = encoding == kUnicode ? length * sizeof(unsigned short) : length;
-  void* block = BlockFor(sizeof(COrbStringValue) + size + sizeof(unsigned short));
+  const std::size_t end = encoding == kUnicode ? sizeof(unsigned short) : 1;
+  void* block = BlockFor(sizeof(COrbStringValue) + sizeof(std::size_t) + size + end);
   auto* made = block == nullptr ? new COrbStringValue : ::new (block) COrbStringValue;
-  made->master.store(encoding, std::memory_order_relaxed);
+  made->master.store(static_cast<std::uint8_t>(encoding), std::memory_order_relaxed);
   if (block == nullptr) return made;
   made->inBlock = static_cast<std::uint8_t>(encoding);
-  auto* copy = reinterpret_cast<char*>(made + 1);
+  auto* copy = reinterpret_cast<char*>(made + 1) + sizeof(std::size_t);
   if (size != 0) std::memcpy(copy, text, size);
-  copy[size] = '\0';
-  copy[size + 1] = '\0';
-  if (encoding == kSystem) made->StoreSystem(copy, length);
-  if (encoding == kUtf8) made->StoreUtf8(copy, length);
-  if (encoding == kUnicode) made->StoreUnicode(reinterpret_cast<unsigned short*>(copy), length);
+  std::memset(copy + size, 0, end);
+  if (encoding == kSystem) Stored(made->systemText, {copy, length});
+  if (encoding == kUtf8) Stored(made->utf8Text, {copy, length});
+  if (encoding == kUnicode) {
+    Stored(made->unicodeText, {reinterpret_cast<unsigned short*>(copy), length});
+  }
   return made;
 }
 
 COrbStringData::COrbStringValue::~COrbStringValue() {
   const auto drop = [this](const auto& copy, std::uint32_t encoding) {
-    void* text = copy.load(std::memory_order_relaxed);
-    if (text != nullptr && inBlock != encoding) std::free(text);
+    if (inBlock != encoding) TextBuffer::Free(copy.load(std::memory_order_relaxed));
   };
   drop(systemText, kSystem);
   drop(utf8Text, kUtf8);
   drop(unicodeText, kUnicode);
+  const COrbCriticalSection* made = lock.load(std::memory_order_relaxed);
+  if (made != &reserve.lock) delete made;
 }
 
 void COrbStringData::COrbStringValue::Clear() {
   // Only strings make values that share a block, and they never clear them.
-  std::free(systemText.exchange(nullptr));
-  std::free(utf8Text.exchange(nullptr));
-  std::free(unicodeText.exchange(nullptr));
+  TextBuffer::Free(systemText.exchange(nullptr));
+  TextBuffer::Free(utf8Text.exchange(nullptr));
+  TextBuffer::Free(unicodeText.exchange(nullptr));
   master = kNone;
-  scan = 0;
+  scannedKind = 0;
 }
 
-const char* COrbStringData::COrbStringValue::StoreSystem(char* text, std::size_t length) const {
-  systemLength = length;
-  systemText.store(text, std::memory_order_release);
-  return text;
+const COrbCriticalSection& COrbStringData::COrbStringValue::MakeLock() const noexcept {
+  const auto* made = new (std::nothrow) COrbCriticalSection;
+  const COrbCriticalSection* there = nullptr;
+  const COrbCriticalSection* const ours = made != nullptr ? made : &reserve.lock;
+  if (lock.compare_exchange_strong(there, ours, std::memory_order_acq_rel)) return *ours;
+  delete made;
+  return *there;
 }
 
-const char* COrbStringData::COrbStringValue::StoreUtf8(char* text, std::size_t length) const {
-  utf8Length = length;
-  utf8Text.store(text, std::memory_order_release);
-  return text;
-}
-
-const unsigned short* COrbStringData::COrbStringValue::StoreUnicode(unsigned short* text,
-                                                                    std::size_t length) const {
-  unicodeLength = length;
-  unicodeText.store(text, std::memory_order_release);
-  return text;
+/// Stores the first text that a value is given; later ones are ignored.
+template <typename Store>
+OrbResult COrbStringData::COrbStringValue::InitOnce(const void* text,
+                                                    std::uint8_t encoding,
+                                                    Store store) {
+  if (text == nullptr) return kOrbErrUnknown;
+  if (master != kNone) return kOrbNoErr;
+  const Hold hold(*this);
+  if (master != kNone) return kOrbNoErr;
+  store();
+  master = encoding;
+  return kOrbNoErr;
 }
 
 OrbResult COrbStringData::COrbStringValue::InitWithSystemEncoding(const char* text) {
-  return InitOnce(text, lock, master, kSystem, [&] {
-    const Copy<char> copy = Duplicate(text);
-    StoreSystem(copy.text, copy.length);
-  });
+  return InitOnce(text, kSystem, [&] { Stored(systemText, Duplicate(text)); });
 }
 
 OrbResult COrbStringData::COrbStringValue::InitWithUtf8(const char* text) {
-  return InitOnce(text, lock, master, kUtf8, [&] {
-    const Copy<char> copy = Duplicate(text);
-    StoreUtf8(copy.text, copy.length);
-  });
+  return InitOnce(text, kUtf8, [&] { Stored(utf8Text, Duplicate(text)); });
 }
 
 OrbResult COrbStringData::COrbStringValue::InitWithUnicode(const unsigned short* text) {
-  return InitOnce(text, lock, master, kUnicode, [&] {
-    const Copy<unsigned short> copy = Duplicate(text, Utf16Length(text));
-    StoreUnicode(copy.text, copy.length);
-  });
+  return InitOnce(text, kUnicode, [&] { Stored(unicodeText, Duplicate(text, Utf16Length(text))); });
 }
 
 const char* COrbStringData::COrbStringValue::GetPtrSystemEncoding() const {
@@ -252,28 +287,25 @@ const unsigned short* COrbStringData::COrbStringValue::GetPtrUnicode() const {
 }
 
 const char* COrbStringData::COrbStringValue::DeriveUtf8() const {
-  const Held held(lock);
+  const Hold hold(*this);
   if (const char* made = utf8Text.load(std::memory_order_acquire)) return made;
   Copy<char> copy{};
   const auto* unicode = reinterpret_cast<const char16_t*>(unicodeText.load());
   const char* system = systemText.load();
   if (master == kUnicode && unicode != nullptr) {
-    copy = Written(3 * unicodeLength, [&](char* out) {
-      return Utf8FromUtf16({unicode, unicodeLength}, out);
-    });
+    copy = Utf8From({unicode, TextBuffer::Length(unicode)});
   } else if (master == kSystem && system != nullptr) {
-    copy = Written(3 * systemLength, [&](char* out) {
-      return Utf8FromMacRoman({system, systemLength}, out);
-    });
+    const std::size_t length = TextBuffer::Length(system);
+    copy = Written(3 * length, [&](char* out) { return Utf8FromMacRoman({system, length}, out); });
   } else {
     copy = Duplicate(std::string_view());
     master = kUtf8;
   }
-  return StoreUtf8(copy.text, copy.length);
+  return Stored(utf8Text, copy);
 }
 
 const char* COrbStringData::COrbStringValue::DeriveSystem() const {
-  const Held held(lock);
+  const Hold hold(*this);
   if (const char* made = systemText.load(std::memory_order_acquire)) return made;
   Copy<char> copy{};
   if (master == kNone || master == kSystem) {
@@ -282,13 +314,13 @@ const char* COrbStringData::COrbStringValue::DeriveSystem() const {
   } else {
     const char* utf8 = GetPtrUtf8();
     if (utf8 == nullptr) return nullptr;
-    copy = SystemFrom({utf8, utf8Length});
+    copy = SystemFrom({utf8, TextBuffer::Length(utf8)});
   }
-  return StoreSystem(copy.text, copy.length);
+  return Stored(systemText, copy);
 }
 
 const unsigned short* COrbStringData::COrbStringValue::DeriveUnicode() const {
-  const Held held(lock);
+  const Hold hold(*this);
   if (const unsigned short* made = unicodeText.load(std::memory_order_acquire)) return made;
   Copy<unsigned short> copy{};
   if (master == kNone || master == kUnicode) {
@@ -298,31 +330,31 @@ const unsigned short* COrbStringData::COrbStringValue::DeriveUnicode() const {
   } else {
     const char* utf8 = GetPtrUtf8();
     if (utf8 == nullptr) return nullptr;
-    copy = UnicodeFrom({utf8, utf8Length});
+    copy = UnicodeFrom({utf8, TextBuffer::Length(utf8)});
   }
-  return StoreUnicode(copy.text, copy.length);
+  return Stored(unicodeText, copy);
 }
 
 unsigned long COrbStringData::COrbStringValue::GetLengthByteSystemEncoding() const {
-  return GetPtrSystemEncoding() == nullptr ? 0 : systemLength;
+  return LengthOf(GetPtrSystemEncoding());
 }
 
 unsigned long COrbStringData::COrbStringValue::GetLengthByteUtf8() const {
-  return GetPtrUtf8() == nullptr ? 0 : utf8Length;
+  return LengthOf(GetPtrUtf8());
 }
 
 unsigned long COrbStringData::COrbStringValue::GetLengthByteUnicode() const {
-  return GetPtrUnicode() == nullptr ? 0 : 2 * unicodeLength;
+  return 2 * LengthOf(GetPtrUnicode());
 }
 
 unsigned long COrbStringData::COrbStringValue::GetLengthChar() const {
   switch (master.load(std::memory_order_acquire)) {
     case kUnicode:
-      return HasValueUnicode() ? unicodeLength : 0;
+      return LengthOf(unicodeText.load(std::memory_order_acquire));
     case kUtf8:
       return HasValueUtf8() ? orb::StringAccess::Read(*this).scan.charLength : 0;
     case kSystem:
-      return HasValueSystemEncoding() ? systemLength : 0;  // Each of its bytes is one unit.
+      return LengthOf(systemText.load(std::memory_order_acquire));  // A byte is one unit.
     default:
       return 0;
   }
@@ -343,11 +375,11 @@ bool COrbStringData::COrbStringValue::HasValueUnicode() const {
 bool COrbStringData::COrbStringValue::IsEmpty() const {
   switch (master.load(std::memory_order_acquire)) {
     case kUnicode:
-      return !HasValueUnicode() || unicodeLength == 0;
+      return LengthOf(unicodeText.load(std::memory_order_acquire)) == 0;
     case kUtf8:
-      return !HasValueUtf8() || utf8Length == 0;  // Valid or not.
+      return LengthOf(utf8Text.load(std::memory_order_acquire)) == 0;  // Valid or not.
     case kSystem:
-      return !HasValueSystemEncoding() || systemLength == 0;
+      return LengthOf(systemText.load(std::memory_order_acquire)) == 0;
     default:
       return true;
   }
@@ -357,10 +389,16 @@ namespace orb {
 
 void StringAccess::GiveValue(const COrbStringData& s) { s.EnsureValue(); }
 
-void StringAccess::Scan(const COrbStringData::COrbStringValue& value) {
+Utf8Text StringAccess::Scan(const COrbStringData::COrbStringValue& value) {
   const char* bytes = value.GetPtrUtf8();
-  if (bytes == nullptr) return;
-  value.scan.store(ScanUtf8({bytes, value.utf8Length}).Pack(), std::memory_order_release);
+  if (bytes == nullptr) return {};
+  const std::string_view text(bytes, TextBuffer::Length(bytes));
+  const TextScan scan = ScanUtf8(text);
+  const auto kept = std::min<std::size_t>(scan.charLength, kTooLong);
+  value.scannedLength.store(static_cast<std::uint32_t>(kept), std::memory_order_relaxed);
+  value.scannedKind.store(static_cast<std::uint8_t>(static_cast<unsigned>(scan.kind) + 1),
+                          std::memory_order_release);
+  return {text, scan};
 }
 
 COrbStringData StringAccess::FromUtf8(std::string_view text) {
@@ -399,18 +437,30 @@ void COrbStringData::Clear() {
   COrbStringValue* const left = value;
   if (left == nullptr) return;
   value = nullptr;
-  if (left->shared.load(std::memory_order_relaxed)) {
-    left->lock.Enter();
-    const bool last = prev == nullptr && next == nullptr;
-    if (prev != nullptr) prev->next = next;
-    if (next != nullptr) next->prev = prev;
-    left->lock.Leave();
-    prev = nullptr;
-    next = nullptr;
-    // From here on the others may end the value: it is ours to touch only if there are none.
-    if (!last) return;
-  }
+  // While others remain they may end the value: then it is no longer ours to touch.
+  if (left->shared.load(std::memory_order_relaxed) && !LeaveChain(*left)) return;
   delete left;
+}
+
+bool COrbStringData::LeaveChain(const COrbStringValue& left) {
+  const COrbStringValue::Hold hold(left);
+  COrbStringData* const before = prev.load(std::memory_order_relaxed);
+  COrbStringData* const behind = next.load(std::memory_order_relaxed);
+  if (before != nullptr) before->next.store(behind, std::memory_order_release);
+  if (behind != nullptr) behind->prev.store(before, std::memory_order_release);
+  prev.store(nullptr, std::memory_order_relaxed);
+  next.store(nullptr, std::memory_order_relaxed);
+  return before == nullptr && behind == nullptr;
+}
+
+void COrbStringData::TakeNeighboursOf(COrbStringData& other) noexcept {
+  const COrbStringValue::Hold hold(*value);
+  COrbStringData* const before = other.prev.exchange(nullptr, std::memory_order_relaxed);
+  COrbStringData* const behind = other.next.exchange(nullptr, std::memory_order_relaxed);
+  prev.store(before, std::memory_order_relaxed);
+  next.store(behind, std::memory_order_relaxed);
+  if (before != nullptr) before->next.store(this, std::memory_order_relaxed);
+  if (behind != nullptr) behind->prev.store(this, std::memory_order_relaxed);
 }
 
 // The new value is complete before the old one goes, so its text may come from there.

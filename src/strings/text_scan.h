@@ -23,14 +23,6 @@ struct TextScan {
   TextKind kind = TextKind::kAscii;
   /// In UTF-16 units; 0 for an invalid text.
   std::size_t charLength = 0;
-
-  /// Never 0.
-  std::uint64_t Pack() const {
-    return std::uint64_t{charLength} << 3 | static_cast<std::uint64_t>(kind) << 1 | 1;
-  }
-  static TextScan Unpack(std::uint64_t packed) {
-    return {static_cast<TextKind>(packed >> 1 & 3), static_cast<std::size_t>(packed >> 3)};
-  }
 };
 
 TextScan ScanUtf8(std::string_view text);

@@ -152,6 +152,26 @@ TEST(Transcode, OfRandomTextsIsWhatThePlainWayGives) {
   EXPECT_GT(invalid, 10'000);
 }
 
+TEST(Transcode, OfAsciiEndsAtTheFirstCharacterBeyondAndWritesNoFurther) {
+  for (std::size_t size = 0; size < 200; ++size) {
+    for (std::size_t bad = 0; bad <= size; bad += 1 + size / 20) {
+      std::string bytes;
+      for (std::size_t i = 0; i < size; ++i) bytes += static_cast<char>(1 + i % 127);
+      std::u16string units(bytes.begin(), bytes.end());
+      if (bad < size) bytes[bad] = '\x80';
+      if (bad < size) units[bad] = size % 2 == 0 ? u'\x80' : u'\xFF00';
+      std::u16string wide(size + 1, u'!');
+      std::string narrow(size + 1, '!');
+      ASSERT_EQ(Utf16FromAscii(bytes, wide.data()), bad);
+      ASSERT_EQ(AsciiFromUtf16(units, narrow.data()), bad);
+      ASSERT_EQ(wide.substr(0, bad), units.substr(0, bad));
+      ASSERT_EQ(narrow.substr(0, bad), bytes.substr(0, bad));
+      ASSERT_EQ(wide[size], u'!');
+      ASSERT_EQ(narrow[size], '!');
+    }
+  }
+}
+
 TEST(MacRoman, GivesAllItsBytesBack) {
   std::string all;
   for (int byte = 1; byte < 256; ++byte) all += static_cast<char>(byte);

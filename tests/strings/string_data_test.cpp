@@ -6,6 +6,10 @@
 #include <algorithm>
 #include <array>
 #include <atomic>
+#include <future>
+#include <memory>
+#include <new>
+#include <random>
 #include <string>
 #include <thread>
 #include <utility>
@@ -18,6 +22,8 @@ namespace {
 
 using Value = COrbStringData::COrbStringValue;
 
+bool areLocksScarce = false;
+
 const unsigned short* Units(const char16_t* text) {
   return reinterpret_cast<const unsigned short*>(text);
 }
@@ -25,6 +31,16 @@ const unsigned short* Units(const char16_t* text) {
 std::u16string UnitsOf(const COrbStringData& text) {
   return reinterpret_cast<const char16_t*>(text.GetPtrUnicode());
 }
+
+}  // namespace
+
+// What the library makes without throwing are the locks of its texts, and this program uses the
+// library's own objects.
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+  return areLocksScarce ? nullptr : ::operator new(size);
+}
+
+namespace {
 
 TEST(StringData, WithoutValueGetsOneFromAPointerAccessor) {
   COrbStringData text;
@@ -200,6 +216,54 @@ TEST(StringData, MovesTakeThePlaceOfTheirSource) {
     others.clear();
     EXPECT_STREQ(source.GetPtrUtf8(), "text");
   }
+}
+
+/// Random copies, moves and ends of strings, beside the shared text that each must have. With
+/// another thread in the process the locks are taken, without memory for locks a common one.
+TEST(StringData, ChainsHoldUnderRandomCopiesMovesAndEnds) {
+  std::mt19937 random(20261123);
+  std::vector<COrbStringData> owners(12);
+  std::vector<std::shared_ptr<std::string>> texts(owners.size());
+  const auto turn = [&](int i) {
+    const std::size_t a = random() % owners.size();
+    const std::size_t b = random() % owners.size();
+    switch (random() % 6) {
+      case 0:
+        texts[a] = std::make_shared<std::string>(std::to_string(i));
+        owners[a].InitWithUtf8(texts[a]->c_str());
+        break;
+      case 1:
+        owners[a].Clear();
+        texts[a] = nullptr;
+        break;
+      case 2:  // Moves all of them.
+        owners.reserve(owners.capacity() + 1);
+        break;
+      case 3:
+        if (a != b) texts[a] = std::exchange(texts[b], nullptr);
+        owners[a] = std::move(owners[b]);
+        break;
+      default:
+        texts[a] = texts[b];
+        owners[a] = owners[b];
+    }
+    for (std::size_t k = 0; k < owners.size(); ++k) {
+      ASSERT_EQ(HasNoValue(owners[k]), texts[k] == nullptr);
+      if (texts[k] == nullptr) continue;
+      ASSERT_EQ(owners[k].GetPtrUtf8(), *texts[k]);
+      const bool shares = texts[k] == texts[0];
+      ASSERT_EQ(!HasNoValue(owners[0]) && owners[0].GetPtrUtf8() == owners[k].GetPtrUtf8(), shares);
+    }
+  };
+  for (int i = 0; i < 3000; ++i) turn(i);
+  std::promise<void> end;
+  std::thread idle([&end] { end.get_future().wait(); });
+  for (int i = 0; i < 3000; ++i) turn(i);
+  areLocksScarce = true;
+  for (int i = 0; i < 3000; ++i) turn(i);
+  areLocksScarce = false;
+  end.set_value();
+  idle.join();
 }
 
 TEST(CharTypes, HandTheirPointerOnAndSayTheirEncoding) {

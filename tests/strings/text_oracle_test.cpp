@@ -14,6 +14,9 @@
 #include <string>
 #include <vector>
 
+#include "platform/transcode.h"
+#include "platform/unicode.h"
+#include "strings/text_scan.h"
 #include "support/texts.h"
 
 namespace {
@@ -26,6 +29,11 @@ std::u16string Units(const COrbStringData& s) {
 
 COrbStringData FromUnits(const std::u16string& units) {
   return COrbStringData(OrbCharUnicode(reinterpret_cast<const unsigned short*>(units.c_str())));
+}
+
+std::u16string Utf16Of(char32_t c) {
+  if (c < 0x10000) return {static_cast<char16_t>(c)};
+  return {U16_LEAD(c), U16_TRAIL(c)};
 }
 
 std::int32_t Size(const std::u16string& s) { return static_cast<std::int32_t>(s.size()); }
@@ -164,6 +172,53 @@ class Texts {
   };
   std::mt19937 random_{20261122};
 };
+
+/// A character at a time.
+orb::TextScan ScannedPlainly(const std::string& text) {
+  std::u16string units(text.size(), u'\0');
+  const std::size_t length = orb::platform::portable::Utf16FromUtf8(text, units.data());
+  if (length == orb::platform::kNotUtf8) return {orb::TextKind::kInvalid, 0};
+  orb::TextScan scan{orb::TextKind::kAscii, length};
+  for (std::size_t at = 0; at < length;) {
+    const bool isPair = U16_IS_LEAD(units[at]);
+    const auto c = static_cast<char32_t>(
+        isPair ? U16_GET_SUPPLEMENTARY(char32_t{units[at]}, units[at + 1]) : units[at]);
+    at += isPair ? 2 : 1;
+    const bool isPlain =
+        c < 0x80 || orb::platform::FormOf(orb::platform::Form::kDecomposed, c).isPlain;
+    if (!isPlain) return {orb::TextKind::kComposing, length};
+    if (c >= 0x80) scan.kind = orb::TextKind::kPlain;
+  }
+  return scan;
+}
+
+TEST(Oracle, ScansAgreeWithReadingEachCharacter) {
+  const auto check = [](const std::string& text) {
+    const orb::TextScan scan = orb::ScanUtf8(text);
+    const orb::TextScan expected = ScannedPlainly(text);
+    ASSERT_EQ(scan.kind, expected.kind) << testing::PrintToString(text);
+    ASSERT_EQ(scan.charLength, expected.charLength);
+  };
+  std::string plain;
+  for (char32_t c = 1; c < 0x110000; ++c) {
+    std::string one;
+    if (c < 0xD800 || c >= 0xE000) one = orb::platform::Utf8FromUtf16(Utf16Of(c));
+    check(one);
+    if (orb::ScanUtf8(one).kind != orb::TextKind::kComposing) plain += one;
+  }
+  std::mt19937 random{20261123};
+  for (int i = 0; i < 3000; ++i) {  // Stretches that are plain, with one other byte or character.
+    std::string text = plain.substr(random() % plain.size(), random() % (i % 8 == 0 ? 4000 : 40));
+    while (!text.empty() && (text[0] & 0xC0) == 0x80) text.erase(0, 1);
+    if (i % 3 != 0) text = orb::platform::Utf8FromUtf16(Utf16Of(U'x')) + text;
+    if (text.empty()) continue;
+    check(text);
+    const std::size_t at = random() % text.size();
+    check(text.substr(0, at) + "\u0301" + text.substr(at));
+    text[at] = static_cast<char>(random());
+    check(text);
+  }
+}
 
 TEST(Oracle, SearchesAgreeWithTryingEveryStretch) {
   Texts texts;

@@ -108,12 +108,16 @@ class ORB_EXPORT COrbStringData {
 
   void Share(const COrbStringData& other);
   void TakePlaceOf(COrbStringData& other) noexcept;
+  void TakeNeighboursOf(COrbStringData& other) noexcept;
+  /// Whether this was the last owner.
+  ORB_LOCAL bool LeaveChain(const COrbStringValue& left);
   ORB_LOCAL OrbResult Init(std::uint32_t encoding, const void* text, std::size_t length);
   ORB_LOCAL COrbStringValue* EnsureValue() const;
 
-  // Every owner of one value stands in a chain, changed under the value's lock alone.
-  mutable COrbStringData* prev = nullptr;
-  mutable COrbStringData* next = nullptr;
+  // Every owner of one value stands in a chain, changed under the value's lock alone. An owner
+  // reads its own two places without it: null is what its last neighbour leaves there at the end.
+  mutable std::atomic<COrbStringData*> prev{nullptr};
+  mutable std::atomic<COrbStringData*> next{nullptr};
   mutable COrbStringValue* value = nullptr;
 };
 
@@ -157,30 +161,32 @@ class ORB_EXPORT COrbStringData::COrbStringValue {
   ORB_LOCAL static COrbStringValue* Make(std::uint32_t encoding,
                                          const void* text,
                                          std::size_t length);
-  ORB_LOCAL const char* StoreSystem(char* text, std::size_t length) const;
-  ORB_LOCAL const char* StoreUtf8(char* text, std::size_t length) const;
-  ORB_LOCAL const unsigned short* StoreUnicode(unsigned short* text, std::size_t length) const;
+  class Hold;
+  const COrbCriticalSection& Lock() const noexcept;
+  [[gnu::cold, gnu::noinline]] const COrbCriticalSection& MakeLock() const noexcept;
+  template <typename Store>
+  ORB_LOCAL OrbResult InitOnce(const void* text, std::uint8_t encoding, Store store);
   ORB_LOCAL const char* DeriveSystem() const;
   ORB_LOCAL const char* DeriveUtf8() const;
   ORB_LOCAL const unsigned short* DeriveUnicode() const;
 
-  COrbCriticalSection lock;
-  mutable std::atomic<std::uint32_t> master{0};
+  // Most values have one owner and one encoding for all their life and never need the lock, which
+  // is as large as all the rest: it is made when it is first asked for.
+  mutable std::atomic<const COrbCriticalSection*> lock{nullptr};
+  // The length of each copy, in its units, stands in front of it.
+  mutable std::atomic<char*> systemText{nullptr};
+  mutable std::atomic<unsigned short*> unicodeText{nullptr};
+  mutable std::atomic<std::uint8_t> master{0};
   // Whether the value ever had a second owner; false means that the one who asks is alone. Relaxed
   // is enough: an owner that a copy made has set it itself, and one that was copied from is neither
   // moved nor cleared before its caller knows that the copying is done.
   std::atomic<bool> shared{false};
   std::uint8_t inBlock = 0;  // The encoding whose copy lies behind the value; 0 for none.
-  // The length of each copy, in its units, is set before its pointer.
-  mutable std::atomic<char*> systemText{nullptr};
-  mutable std::size_t systemLength = 0;
-  mutable std::atomic<unsigned short*> unicodeText{nullptr};
-  mutable std::size_t unicodeLength = 0;
-  // What every operation reads stands last, next to a text that lies behind the value.
+  // What a scan of the UTF-8 text found: its kind, 0 before the scan, and its length in units.
+  mutable std::atomic<std::uint8_t> scannedKind{0};
+  mutable std::atomic<std::uint32_t> scannedLength{0};
+  // Stands last, next to a text that lies behind the value.
   mutable std::atomic<char*> utf8Text{nullptr};
-  mutable std::size_t utf8Length = 0;
-  // What a scan of the UTF-8 text found, packed; 0 before it.
-  mutable std::atomic<std::uint64_t> scan{0};
 };
 
 // Strings are passed by value everywhere: what happens then stands here, so that no call is spent
@@ -190,32 +196,51 @@ inline COrbStringData::COrbStringData(const COrbStringData& other) { Share(other
 
 inline COrbStringData::COrbStringData(COrbStringData&& other) noexcept { TakePlaceOf(other); }
 
+inline const COrbCriticalSection& COrbStringData::COrbStringValue::Lock() const noexcept {
+  const COrbCriticalSection* made = lock.load(std::memory_order_acquire);
+  return made != nullptr ? *made : MakeLock();
+}
+
+/// Keeps every other thread out of a value. Where there is none, there is no need for the lock.
+class COrbStringData::COrbStringValue::Hold {
+ public:
+  explicit Hold(const COrbStringValue& held) : lock_(orb::IsOnlyThread() ? nullptr : &held.Lock()) {
+    if (lock_ != nullptr) lock_->Enter();
+  }
+  ~Hold() {
+    if (lock_ != nullptr) lock_->Leave();
+  }
+  Hold(const Hold&) = delete;
+  Hold& operator=(const Hold&) = delete;
+
+ private:
+  const COrbCriticalSection* lock_;
+};
+
 // Nobody may change `other` meanwhile, so its value stays the same and alive.
 inline void COrbStringData::Share(const COrbStringData& other) {
   COrbStringValue* const theirs = other.value;
   if (theirs == nullptr) return;
-  theirs->lock.Enter();
-  theirs->shared.store(true, std::memory_order_relaxed);
+  const COrbStringValue::Hold hold(*theirs);
+  // Written once, so that the owners on other processors keep the value in their caches.
+  if (!theirs->shared.load(std::memory_order_relaxed)) {
+    theirs->shared.store(true, std::memory_order_relaxed);
+  }
+  COrbStringData* const behind = other.next.load(std::memory_order_relaxed);
   value = theirs;
-  prev = const_cast<COrbStringData*>(&other);
-  next = other.next;
-  if (next != nullptr) next->prev = this;
-  other.next = this;
-  theirs->lock.Leave();
+  prev.store(const_cast<COrbStringData*>(&other), std::memory_order_relaxed);
+  next.store(behind, std::memory_order_relaxed);
+  if (behind != nullptr) behind->prev.store(this, std::memory_order_relaxed);
+  other.next.store(this, std::memory_order_relaxed);
 }
 
+// Without neighbours there is nobody to tell. None can come either: that would need a copy of
+// `other`, which nobody may use meanwhile. A neighbour that is just leaving has done with `other`.
 inline void COrbStringData::TakePlaceOf(COrbStringData& other) noexcept {
-  COrbStringValue* const theirs = other.value;
-  if (theirs == nullptr) return;
-  value = theirs;
+  value = other.value;
   other.value = nullptr;
-  if (!theirs->shared.load(std::memory_order_relaxed)) return;  // No neighbours.
-  theirs->lock.Enter();
-  prev = other.prev;
-  next = other.next;
-  other.prev = nullptr;
-  other.next = nullptr;
-  if (prev != nullptr) prev->next = this;
-  if (next != nullptr) next->prev = this;
-  theirs->lock.Leave();
+  if (other.prev.load(std::memory_order_acquire) != nullptr ||
+      other.next.load(std::memory_order_acquire) != nullptr) {
+    TakeNeighboursOf(other);
+  }
 }
