@@ -101,6 +101,7 @@ def memory(folder):
 class Runner:
     def __init__(self, build, effort, quick):
         self.build, self.effort, self.quick = build, effort, quick
+        self.left_out = {}
         self.results = build / "results"
         self.results.mkdir(exist_ok=True)
 
@@ -121,7 +122,12 @@ class Runner:
             command, env=environment, cwd=folder, check=False,
             stdout=subprocess.DEVNULL, stderr=subprocess.PIPE, text=True)
         if done.returncode != 0:
-            sys.exit(f"{program.name}_bench ended with {done.returncode}: {done.stderr[-2000:]}")
+            options["out"].unlink(missing_ok=True)
+            self.leave_out(f"{program.name}_bench", f"ended with {done.returncode}: {done.stderr[-2000:]}")
+
+    def leave_out(self, what, why):
+        print(f"{what}: {why}", file=sys.stderr)
+        self.left_out[what] = why.splitlines()[0]
 
     def run_on_file_systems(self, program, scratch):
         rounds = [kind for kind in program.on if kind in self.effort.file_systems]
@@ -130,13 +136,16 @@ class Runner:
         for number, kind in enumerate(rounds):
             # What takes minutes runs once: a row may ask whether it is its time.
             environment = {} if self.quick or number > 0 else {"ORB_BENCH_LONG": "1"}
-            with new_file_system(kind, scratch) as folder:
-                self.run(program, folder, kind, environment, min_time=0.01, repetitions=1)
+            try:
+                with new_file_system(kind, scratch) as folder:
+                    self.run(program, folder, kind, environment, min_time=0.01, repetitions=1)
+            except (OSError, subprocess.CalledProcessError) as error:
+                self.leave_out(f"{program.name} on {kind}", str(error))
 
     def run_program(self, program, scratch):
         needs_mount = program.on or program.own_rounds
         if needs_mount and scratch is None:
-            print(f"{program.name}: left out without the right to mount", file=sys.stderr)
+            self.leave_out(program.name, "needs the right to mount")
         elif program.on:
             self.run_on_file_systems(program, scratch)
         elif program.own_rounds:
@@ -220,6 +229,8 @@ def main():
             runner.run_program(program, scratch)
             took = time.monotonic() - start
             print(f"{program.name} {program.only}: {took:.0f} s", file=sys.stderr)
+    if runner.left_out:
+        about["did not run"] = "; ".join(f"{what} ({why})" for what, why in runner.left_out.items())
     about["took"] = f"{(time.monotonic() - begin) / 60:.1f} minutes"
     (runner.results / "machine.json").write_text(json.dumps(about, indent=1))
 
