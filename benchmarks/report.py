@@ -92,7 +92,7 @@ class Line:
     def met(self):
         if self.goal is None or self.goal.at_most is None:
             return None
-        return self.ratio is not None and self.ratio <= self.goal.at_most
+        return self.ratio is not None and round(self.ratio, 2) <= self.goal.at_most  # As it is shown.
 
 
 def split_name(name):
@@ -117,8 +117,8 @@ def figures_of(entries):
         return statistics.median(value(entry) for entry in entries)
 
     def time_of(entry):
-        clock = "real_time" if any(part in entry["run_name"] for part in ("/real_time", "/manual_time")) \
-            else "cpu_time"
+        by_clock = any(f"/{kind}_time" in entry["run_name"] for kind in ("real", "manual"))
+        clock = "real_time" if by_clock else "cpu_time"
         return entry[clock] * NANOSECONDS[entry["time_unit"]]
 
     def each_of(entry):
