@@ -221,7 +221,10 @@ def main():
     runner = Runner(options.build, effort, options.quick)
     for old in runner.results.iterdir():
         old.unlink()
-    about = machine(options.build) | {"run": "quick" if options.quick else "full"}
+    about = machine(options.build)
+    about["repetitions"] = f"{effort.repetitions} in memory, {effort.rounds} on file systems"
+    if options.quick:
+        about["run"] = "quick: a check, not figures to quote"
     begin = time.monotonic()
     with memory(options.build / "scratch") as scratch:
         for program in chosen(options.build, options.programs):
