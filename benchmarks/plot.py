@@ -4,12 +4,13 @@ import math
 from html import escape
 
 COLUMNS = 3
-WIDTH, HEIGHT = 330, 260  # Of a panel with all around it.
-LEFT, RIGHT, TOP, BOTTOM = 52, 92, 28, 34  # Around the field of a panel.
+WIDTH, HEIGHT = 338, 260  # Of a panel with all around it.
+LEFT, RIGHT, TOP, BOTTOM = 52, 100, 28, 34  # Around the field of a panel.
 LABEL = 11  # The least distance of two labels.
 
 COLOURS = {"Orb": "#d1242f", "std": "#1f6feb", "std-string": "#79a8f0", "Qt": "#2da44e", "GLib": "#8250df",
-           "GIO": "#8250df", "ICU": "#0a7d8c", "Boost": "#9a6700", "cp": "#57606a", "rm": "#57606a"}
+           "GIO": "#8250df", "ICU": "#0a7d8c", "Boost": "#9a6700", "cp": "#57606a",
+           "rm": "#57606a", "loop": "#bf8700"}
 LIMIT_COLOUR = "#8c959f"
 
 
@@ -99,7 +100,7 @@ def draw_panel(title, series, x, y):
     ends = sorted((field.y(points[-1][1]), row) for row, points in series.items())
     for (_, row), height in zip(ends, spread([end for end, _ in ends])):
         place = field.x(series[row][-1][0])
-        yield text(max(place, field.right) + 5, height + 3, row, "start", f'fill="{colour(row)}"')
+        yield text(place + 5, height + 3, row, "start", f'fill="{colour(row)}"')
 
 
 def draw(panels):

@@ -1,7 +1,7 @@
 # SPDX-License-Identifier: MIT
 """Runs the benchmark programs of a build and keeps what they say in BUILD/results/*.json.
 
-usage: run.py BUILD [--quick] [program ...]
+usage: run.py BUILD [--quick] [--rounds N] [program ...]
 
 With the right to mount, and in a name space of its own, everything happens in a new tmpfs.
 """
@@ -16,7 +16,7 @@ import re
 import subprocess
 import sys
 import time
-from dataclasses import dataclass
+from dataclasses import dataclass, replace
 
 
 @dataclass(frozen=True)
@@ -43,8 +43,8 @@ PROGRAMS = (
     Program("fileinfo", on=("ext4",)),
     Program("trash", on=("xfs", "ext4")),
     Program("temp", on=("xfs", "ext4", "btrfs")),
-    Program("copy", on=("xfs-noreflink", "xfs", "ext4", "btrfs")),
     Program("tree", own_rounds=True, quick="@ext4"),
+    Program("whole", on=("xfs-noreflink", "ext4")),
     Program("import"),
 )
 
@@ -59,14 +59,13 @@ MAKE = {
 @dataclass(frozen=True)
 class Effort:
     repetitions: int
-    rounds: int
-    own_rounds: int
+    rounds: int  # On file systems.
     seconds: float  # The least time that one repetition of a row in memory runs.
     file_systems: tuple
 
 
-FULL = Effort(9, 5, 5, 0.02, tuple(MAKE))
-QUICK = Effort(3, 1, 1, 0.002, ("ext4",))
+FULL = Effort(7, 3, 0.02, tuple(MAKE))
+QUICK = Effort(3, 1, 0.002, ("ext4",))
 
 
 @contextlib.contextmanager
@@ -102,10 +101,11 @@ def memory(folder):
 class Runner:
     def __init__(self, build, effort, quick):
         self.build, self.effort, self.quick = build, effort, quick
+        self.left_out = {}
         self.results = build / "results"
         self.results.mkdir(exist_ok=True)
 
-    def run(self, program, folder, system="", **options):
+    def run(self, program, folder, system="", environment=None, **options):
         """One run of a program, its rows in random order, with `folder` to work in."""
         options |= {"enable_random_interleaving": "true", "out_format": "json"}
         only = program.quick if self.quick and program.quick else program.only
@@ -115,31 +115,41 @@ class Runner:
         options["out"] = self.results / f"{program.name}{'@' + system if system else ''}.{number}.json"
         command = [self.build / "benchmarks" / f"{program.name}_bench"]
         command += [f"--benchmark_{option}={value}" for option, value in options.items()]
-        environment = os.environ | {"LC_ALL": "C.UTF-8"}
+        environment = os.environ | {"LC_ALL": "C.UTF-8"} | (environment or {})
         if folder:
             environment |= {"ORB_BENCH_FOLDER": str(folder), "TMPDIR": str(folder)}
         done = subprocess.run(
             command, env=environment, cwd=folder, check=False,
             stdout=subprocess.DEVNULL, stderr=subprocess.PIPE, text=True)
         if done.returncode != 0:
-            sys.exit(f"{program.name}_bench ended with {done.returncode}: {done.stderr[-2000:]}")
+            options["out"].unlink(missing_ok=True)
+            self.leave_out(f"{program.name}_bench", f"ended with {done.returncode}: {done.stderr[-2000:]}")
+
+    def leave_out(self, what, why):
+        print(f"{what}: {why}", file=sys.stderr)
+        self.left_out[what] = why.splitlines()[0]
 
     def run_on_file_systems(self, program, scratch):
         rounds = [kind for kind in program.on if kind in self.effort.file_systems]
         rounds *= self.effort.rounds
         random.shuffle(rounds)
-        for kind in rounds:
-            with new_file_system(kind, scratch) as folder:
-                self.run(program, folder, kind, min_time=0.01, repetitions=1)
+        for number, kind in enumerate(rounds):
+            # What takes minutes runs once: a row may ask whether it is its time.
+            environment = {} if self.quick or number > 0 else {"ORB_BENCH_LONG": "1"}
+            try:
+                with new_file_system(kind, scratch) as folder:
+                    self.run(program, folder, kind, environment, min_time=0.01, repetitions=1)
+            except (OSError, subprocess.CalledProcessError) as error:
+                self.leave_out(f"{program.name} on {kind}", str(error))
 
     def run_program(self, program, scratch):
         needs_mount = program.on or program.own_rounds
         if needs_mount and scratch is None:
-            print(f"{program.name}: left out without the right to mount", file=sys.stderr)
+            self.leave_out(program.name, "needs the right to mount")
         elif program.on:
             self.run_on_file_systems(program, scratch)
         elif program.own_rounds:
-            self.run(program, scratch, repetitions=self.effort.own_rounds, min_time=0)
+            self.run(program, scratch, repetitions=self.effort.rounds, min_time=0)
         else:
             self.run(program, scratch, repetitions=self.effort.repetitions,
                      min_time=self.effort.seconds)
@@ -202,13 +212,19 @@ def main():
     parser = argparse.ArgumentParser()
     parser.add_argument("build", type=lambda path: pathlib.Path(path).resolve())
     parser.add_argument("--quick", action="store_true")
+    parser.add_argument("--rounds", type=int)
     parser.add_argument("programs", nargs="*")
-    options = parser.parse_args()
+    options = parser.parse_intermixed_args()
 
-    runner = Runner(options.build, QUICK if options.quick else FULL, options.quick)
+    effort = QUICK if options.quick else FULL
+    effort = replace(effort, rounds=options.rounds or effort.rounds)
+    runner = Runner(options.build, effort, options.quick)
     for old in runner.results.iterdir():
         old.unlink()
-    about = machine(options.build) | {"run": "quick" if options.quick else "full"}
+    about = machine(options.build)
+    about["repetitions"] = f"{effort.repetitions} in memory, {effort.rounds} on file systems"
+    if options.quick:
+        about["run"] = "quick: a check, not figures to quote"
     begin = time.monotonic()
     with memory(options.build / "scratch") as scratch:
         for program in chosen(options.build, options.programs):
@@ -216,6 +232,8 @@ def main():
             runner.run_program(program, scratch)
             took = time.monotonic() - start
             print(f"{program.name} {program.only}: {took:.0f} s", file=sys.stderr)
+    if runner.left_out:
+        about["did not run"] = "; ".join(f"{what} ({why})" for what, why in runner.left_out.items())
     about["took"] = f"{(time.monotonic() - begin) / 60:.1f} minutes"
     (runner.results / "machine.json").write_text(json.dumps(about, indent=1))
 

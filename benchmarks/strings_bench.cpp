@@ -218,7 +218,7 @@ void FormatOrb(benchmark::State& state) {
          [&] { return OrbStringDataFormat(&format, "IMG", 1234, 6000, 4000, 0.125, "JPG"); });
 }
 
-void FormatStd(benchmark::State& state) {
+void FormatLibc(benchmark::State& state) {
   Repeat(state, [] {
     char text[64];
     const int length = std::snprintf(
@@ -388,7 +388,7 @@ BENCHMARK(GrowStd)->Name("GrowVector-paths/std-string")->Apply(Growing);
 BENCHMARK(GrowPathsStd)->Name("GrowVector-paths/std")->Apply(Growing);
 
 BENCHMARK(FormatOrb)->Name("Format/Orb");
-BENCHMARK(FormatStd)->Name("Format/std");
+BENCHMARK(FormatLibc)->Name("Format/libc");
 BENCHMARK(MidOrb)->Name("Mid/Orb");
 BENCHMARK(MidStd)->Name("Mid/std");
 BENCHMARK(MidIcu)->Name("Mid/ICU");

@@ -24,16 +24,16 @@
 
 namespace bench {
 
-inline COrbStringData TextOf(const std::string& utf8) {
-  return COrbStringData(OrbCharUtf8(utf8.c_str()));
-}
+inline COrbStringData TextOf(const char* utf8) { return COrbStringData(OrbCharUtf8(utf8)); }
+inline COrbStringData TextOf(const std::string& utf8) { return TextOf(utf8.c_str()); }
 
-inline COrbFilePath PathOf(const std::string& utf8) {
+inline COrbFilePath PathOf(const char* utf8) {
   const COrbStringData text = TextOf(utf8);
   COrbFilePath path;
   path.Initialize(&text);
   return path;
 }
+inline COrbFilePath PathOf(const std::string& utf8) { return PathOf(utf8.c_str()); }
 
 /// Memory that is freed stays with the process, so that no row is charged for the kernel clearing
 /// the same pages again in every round.

@@ -6,8 +6,11 @@
 
 #include <cstdint>
 #include <cstdlib>
-#include <filesystem>
+#include <optional>
 #include <string>
+#include <utility>
+
+#include "support.h"
 
 /// \file
 /// photo.jpg, photo_1.jpg, ... in one folder, each made before the next is asked for. On ext4 use a
@@ -15,28 +18,6 @@
 /// plain loop takes a minute or two for 10,000, so it runs to 2,000 unless ORB_BENCH_LONG is set.
 
 namespace {
-
-namespace fs = std::filesystem;
-
-class NewFolder {
- public:
-  NewFolder() {
-    std::string pattern = (fs::temp_directory_path() / "orb-temp-bench-XXXXXX").string();
-    if (::mkdtemp(pattern.data()) == nullptr) std::abort();
-    path_ = pattern;
-  }
-  ~NewFolder() {
-    std::error_code ignored;
-    fs::remove_all(path_, ignored);
-  }
-  NewFolder(const NewFolder&) = delete;
-  NewFolder& operator=(const NewFolder&) = delete;
-
-  const std::string& Path() const { return path_; }
-
- private:
-  std::string path_;
-};
 
 std::string NumberedPath(const std::string& folder, std::int64_t number) {
   if (number == 0) return folder + "/photo.jpg";
@@ -54,13 +35,14 @@ template <typename Create>
 void TimeNames(benchmark::State& state, Create create) {
   for (auto _ : state) {
     state.PauseTiming();
-    const NewFolder folder;
+    std::optional<bench::Folder> folder(std::in_place);
     state.ResumeTiming();
-    for (std::int64_t i = 0; i < state.range(0); ++i) create(folder.Path(), i);
+    for (std::int64_t i = 0; i < state.range(0); ++i) create(folder->Path(), i);
     state.PauseTiming();
-    if (::access(NumberedPath(folder.Path(), state.range(0) - 1).c_str(), F_OK) != 0) {
+    if (::access(NumberedPath(folder->Path(), state.range(0) - 1).c_str(), F_OK) != 0) {
       state.SkipWithError("not the names of the plain loop");
     }
+    folder.reset();
     state.ResumeTiming();
   }
   state.SetItemsProcessed(state.iterations() * state.range(0));
@@ -102,9 +84,9 @@ void Slow(benchmark::internal::Benchmark* row) {
   if (std::getenv("ORB_BENCH_LONG") != nullptr) row->Arg(10'000);
 }
 
-BENCHMARK(UniqueNames_Orb)->Apply(Usual);
-BENCHMARK(UniqueNames_NumberKnown)->Apply(Usual);
-BENCHMARK(UniqueNames_PlainLoop)->Apply(Slow);
+BENCHMARK(UniqueNames_Orb)->Name("UniqueNames/Orb")->Apply(Usual);
+BENCHMARK(UniqueNames_NumberKnown)->Name("UniqueNames/limit-number-known")->Apply(Usual);
+BENCHMARK(UniqueNames_PlainLoop)->Name("UniqueNames/loop")->Apply(Slow);
 
 }  // namespace
 
