@@ -48,6 +48,19 @@ std::u16string Folded(const std::u16string& text) {
   return Decomposed(out);
 }
 
+std::u16string UnitsOf(char32_t c) {
+  if (c < 0x10000) return {static_cast<char16_t>(c)};
+  return {static_cast<char16_t>(U16_LEAD(c)), static_cast<char16_t>(U16_TRAIL(c))};
+}
+
+/// Without the rules of any language.
+std::u16string Cased(decltype(&u_strToLower) map, const std::u16string& text) {
+  UErrorCode status = U_ZERO_ERROR;
+  std::u16string out(8, u'\0');
+  const auto size = map(out.data(), Size(out), text.data(), Size(text), "", &status);
+  return out.substr(0, static_cast<std::size_t>(size));
+}
+
 bool IsBoundary(const std::u16string& text, std::size_t at) {
   if (at == 0 || at == text.size()) return true;
   if (U16_IS_TRAIL(text[at])) return false;
@@ -177,6 +190,21 @@ TEST(Oracle, SearchesAgreeWithTryingEveryStretch) {
     ASSERT_EQ(Shown(OrbStringDataStrNoCase(s, find)), Tail(text, Found(text, wanted, Folded)));
     const std::size_t last = wanted.empty() ? std::u16string::npos : text.rfind(wanted);
     ASSERT_EQ(Shown(OrbStringDataStrReverse(s, find)), Tail(text, last));
+  }
+}
+
+TEST(Oracle, EveryCharacterEqualsItsFormsAndHasIcusCases) {
+  for (char32_t c = 1; c < 0x20000; ++c) {
+    if (U_IS_SURROGATE(c)) continue;
+    const std::u16string self = UnitsOf(c);
+    const COrbStringData text = FromUnits(self);
+    const COrbStringData decomposed = FromUnits(Decomposed(self));
+    SCOPED_TRACE(Text(text));
+    ASSERT_EQ(Units(OrbStringDataLower(text)), Cased(u_strToLower, self));
+    ASSERT_EQ(Units(OrbStringDataUpper(text)), Cased(u_strToUpper, self));
+    ASSERT_EQ(OrbStringDataCmpi(text, FromUnits(Folded(self))), 0);
+    ASSERT_EQ(Text(OrbStringDataStr(text, decomposed)), Text(text));
+    ASSERT_EQ(Text(OrbStringDataStr(decomposed, text)), Text(decomposed));
   }
 }
 
