@@ -11,6 +11,7 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <functional>
 #include <map>
 #include <set>
 #include <string>
@@ -53,6 +54,10 @@ inline std::set<std::string> XattrsOf(const std::string& path) {
   return found;
 }
 
+inline std::string Shortened(const std::string& text) {
+  return text.size() < 1000 ? text : std::to_string(std::hash<std::string>()(text));
+}
+
 /// What lies below a folder by relative path: kind and mode, time of modification, attributes,
 /// content.
 inline std::map<std::string, std::string> Describe(const std::string& folder) {
@@ -67,7 +72,7 @@ inline std::map<std::string, std::string> Describe(const std::string& folder) {
                        std::to_string(status.st_mtim.tv_nsec);
     for (const std::string& attribute : XattrsOf(path)) text += " " + attribute;
     if (item.is_symlink()) text += " -> " + fs::read_symlink(item.path()).string();
-    if (item.is_regular_file() && !item.is_symlink()) text += " " + ReadAll(path);
+    if (item.is_regular_file() && !item.is_symlink()) text += " " + Shortened(ReadAll(path));
     items[path.substr(folder.size())] = text;
   }
   return items;
