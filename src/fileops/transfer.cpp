@@ -5,10 +5,12 @@
 #include <orb/fileops/path_relations.h>
 
 #include <string>
+#include <string_view>
 
 #include "fileinfo/item_path.h"
 #include "fileops/creation_result.h"
 #include "fileops/path_in.h"
+#include "strings/string_access.h"
 
 namespace orb {
 namespace {
@@ -30,16 +32,26 @@ OrbResult CheckSource(const TransferForm& form,
   return form.source == Source::kUsable ? CheckAccess(source) : kOrbNoErr;
 }
 
-/// The name in the destination folder: the given one or the source's own. One that names no entry
-/// would lead to the folder itself or above it.
+/// Whether the last component is that of an entry: "/", "." and "a/.." lead to a folder itself or
+/// above it, which is not what shall be replaced.
+bool NamesAnEntry(std::string_view name) {
+  name.remove_prefix(name.rfind('/') + 1);
+  return !name.empty() && name != "." && name != "..";
+}
+
+/// The name in the destination folder, the given one or the source's own, without a "/" at its end.
 OrbResult ChooseName(const TransferRequest& request, COrbStringData* name) {
   if (request.name != nullptr)
     *name = *request.name;
   else
     OrbGetFileNameFromPath(request.source, name);
-  const auto text = ItemPath(*name);
-  const bool isEntry = text && !text->empty() && *text != "." && *text != "..";
-  return isEntry ? kOrbNoErr : kOrbErrInvalidName;
+  auto text = ItemPath(*name);
+  if (!text) return kOrbErrInvalidName;
+  if (text->ends_with('/')) {
+    text->erase(text->find_last_not_of('/') + 1);
+    *name = StringAccess::FromUtf8(*text);
+  }
+  return NamesAnEntry(*text) ? kOrbNoErr : kOrbErrInvalidName;
 }
 
 OrbResult FindDestination(const TransferRequest& request, std::string* destination) {

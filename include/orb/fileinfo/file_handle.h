@@ -112,9 +112,9 @@ class ORB_EXPORT COrbFileHandle : public COrbFilePath {
  private:
   struct Pass;
 
-  OrbResult EnsureCollected() const;
-  OrbResult Keep(const Pass& pass) const;
-  void CopyCollected(const COrbFileHandle& other);
+  ORB_LOCAL OrbResult EnsureCollected() const;
+  ORB_LOCAL OrbResult Keep(const Pass& pass) const;
+  ORB_LOCAL void CopyCollected(const COrbFileHandle& other);
 
   mutable COrbStringData actualName;
   mutable bool collected = false;

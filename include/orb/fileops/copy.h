@@ -21,11 +21,11 @@
 /// some of its content.
 ///
 /// Every form may give kOrbErrAccessDenied for a source that is not valid UTF-8, and forms that
-/// take a folder and a name kOrbErrInvalidName for a name that is empty, "." or ".." and
-/// kOrbErrEmptyPath for an empty folder. `name` is null for the source's own where it is a pointer.
-/// `result` may be null; it receives the destination on success alone. All other failures have the
-/// codes kOrbErrNotFound, kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrOutOfMemory and
-/// kOrbErrUnknown.
+/// take a folder and a name kOrbErrInvalidName for a name that is, or whose last component is, "",
+/// "." or "..", and kOrbErrEmptyPath for an empty folder; a "/" at the end of a name is left out.
+/// `name` is null for the source's own where it is a pointer. `result` may be null; it receives the
+/// destination on success alone. All other failures have the codes kOrbErrNotFound,
+/// kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrOutOfMemory and kOrbErrUnknown.
 
 /// Joins a folder and a name with exactly one "/"; a name joined to an empty folder is the name
 /// alone. kOrbErrInvalidName for a text that is not UTF-8, kOrbErrNameTooLong when the joined text

@@ -22,7 +22,8 @@
 ///
 /// Forms that take a folder give kOrbErrSamePath when it is the source and kOrbErrInsideSource when
 /// it lies inside it, by their texts; kOrbErrAccessDenied for a source that is not valid UTF-8;
-/// kOrbErrInvalidName for a name that is empty, "." or ".."; kOrbErrEmptyPath for an empty folder.
+/// kOrbErrInvalidName for a name that is, or whose last component is, "", "." or ".." (a "/" at its
+/// end is left out); kOrbErrEmptyPath for an empty folder.
 /// `name` is null for the source's own where it is a pointer. `result` may be null; it receives the
 /// destination on success alone. All other failures have the codes kOrbErrNotFound,
 /// kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrOutOfMemory and kOrbErrUnknown, the last for an
