@@ -174,17 +174,6 @@ Status CreateFile(const UniqueFd& folder, const std::string& name) {
   return file ? Status() : Status(LastError());
 }
 
-Result<std::string> CreatePrivateFile(const UniqueFd& folder) {
-  constexpr int kTries = 100;
-  for (int i = 0; i < kTries; ++i) {
-    std::string name = RandomHiddenName();
-    const Status created = CreateFile(folder, name);
-    if (created.Ok()) return name;
-    if (created.Reason() != kItemExists) return created.Reason();
-  }
-  return kItemExists;
-}
-
 Status RefuseToReplace(const Place& place) {
   const int flags = O_PATH | O_NOFOLLOW | O_CLOEXEC;
   const UniqueFd old(
@@ -197,15 +186,8 @@ Status RefuseToReplace(const Place& place) {
 }
 
 Status ReplaceByNewFile(const Place& place) {
-  const Result<std::string> created = CreatePrivateFile(place.folder);
-  if (!created) return created.Reason();
-  const int folder = place.folder.Get();
-  const char* temporary = created.Value().c_str();
-  const char* name = place.name.c_str();
-  if (Retry([&] { return ::renameat(folder, temporary, folder, name); }) == 0) return {};
-  const Error error = LastError();
-  ::unlinkat(folder, temporary, 0);
-  return error;
+  auto file = NewFile::CreateHidden(place.folder.Get(), kNewFile);
+  return file ? file.Value().Replace(place.name.c_str()) : Status(file.Reason());
 }
 
 Status CreateFolder(const std::string& path) {

@@ -86,9 +86,15 @@ class TreeRemover {
     const char* name = entry.Value().name;
     if (name == nullptr) return Leave();
     const auto outcome = RemoveEntry(entries.Descriptor(), name, entry.Value().type);
-    if (!outcome) return outcome.Reason();
+    if (!outcome) return UnlessGone(outcome.Reason());
     if (outcome.Value() == Outcome::kGone) return {};
-    return Enter(entries.Descriptor(), name);
+    return UnlessGone(Enter(entries.Descriptor(), name));
+  }
+
+  /// What somebody else removed meanwhile is no failure. What has become something else makes its
+  /// folder be gone through again.
+  static Status UnlessGone(const Status& done) {
+    return !done && done.Reason() == kNoSuchItem ? Status() : done;
   }
 
   Status Enter(int above, const char* name) {
@@ -109,10 +115,11 @@ class TreeRemover {
     }
     Level& level = levels_.back();
     const auto outcome = RemoveFolderEntry(FolderAbove(), level.name.c_str());
-    if (!outcome) return outcome.Reason();
-    if (outcome.Value() == Outcome::kNotEmpty) return PassAgain(&level);
+    if (outcome && outcome.Value() == Outcome::kNotEmpty) return PassAgain(&level);
+    const bool isInside = levels_.size() > 1;
     levels_.pop_back();
-    return {};
+    if (outcome) return {};
+    return isInside ? UnlessGone(outcome.Reason()) : outcome.Reason();
   }
 
   /// What a level removed already is not listed again, so it begins at the start.

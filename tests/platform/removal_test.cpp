@@ -90,5 +90,17 @@ TEST(IsItemOrAbove, KnowsItemsUnderEveryPathButNotTheirHardLinks) {
   EXPECT_EQ(ResolvedPath("/tmp").Value(), "/tmp");
 }
 
+TEST(RemoveItem, GoesOnWhenSomebodyElseRemovesSomeOfIt) {
+  const TempFolder folder;
+  fs::create_directory(folder / "tree");
+  for (int i = 0; i < 3'000; ++i) folder.Write("tree/" + std::to_string(i), "");
+  std::thread other([&] {
+    std::error_code ignored;
+    for (int i = 3'000; --i >= 0;) fs::remove(folder / ("tree/" + std::to_string(i)), ignored);
+  });
+  EXPECT_TRUE(RemoveItem(folder / "tree"));
+  other.join();
+}
+
 }  // namespace
 }  // namespace orb::platform

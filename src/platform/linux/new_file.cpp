@@ -52,6 +52,10 @@ Status Flush(int file) {
 
 Result<NewFile> NewFile::Create(int folder, mode_t mode) {
   if (UniqueFd file = OpenNameless(folder, mode)) return NewFile(folder, std::move(file), {});
+  return CreateHidden(folder, mode);
+}
+
+Result<NewFile> NewFile::CreateHidden(int folder, mode_t mode) {
   for (int i = 0; i < kNameTries; ++i) {
     std::string name = RandomHiddenName();
     if (UniqueFd file = OpenExclusively(folder, name, mode))
@@ -75,6 +79,13 @@ Status NewFile::Publish(const char* name) {
                           : RenameWithoutReplacing(folder_, hiddenName_.c_str(), folder_, name);
   if (published) hiddenName_.clear();
   return published;
+}
+
+Status NewFile::Replace(const char* name) {
+  const char* const hidden = hiddenName_.c_str();
+  if (Retry([&] { return ::renameat(folder_, hidden, folder_, name); }) != 0) return LastError();
+  hiddenName_.clear();
+  return {};
 }
 
 }  // namespace orb::platform

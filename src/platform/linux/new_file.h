@@ -23,6 +23,8 @@ class NewFile {
  public:
   /// In a folder that must stay open as long as this object lives.
   static Result<NewFile> Create(int folder, mode_t mode);
+  /// The same with a hidden name everywhere: a file without a name cannot replace another.
+  static Result<NewFile> CreateHidden(int folder, mode_t mode);
 
   NewFile(NewFile&& other) noexcept = default;
   NewFile& operator=(NewFile&&) = delete;
@@ -34,6 +36,9 @@ class NewFile {
   /// Gives it its name, once, and never in the place of another item: kItemExists. An error that
   /// only closing shows is found before that.
   Status Publish(const char* name);
+  /// Puts a hidden file in the place of what has the name, once and in one step. A link is replaced
+  /// and not written through.
+  Status Replace(const char* name);
 
  private:
   NewFile(int folder, UniqueFd file, std::string hiddenName);

@@ -2,13 +2,10 @@
 #include "platform/linux/trash_folder.h"
 
 #include <fcntl.h>
-#include <stdio.h>
-#include <sys/random.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
 #include <chrono>
 #include <new>
 #include <span>
@@ -16,6 +13,8 @@
 
 #include "platform/calendar.h"
 #include "platform/linux/file_data.h"
+#include "platform/linux/new_file.h"
+#include "platform/linux/rename.h"
 #include "platform/linux/system_file.h"
 #include "platform/linux/tree_survey.h"
 
@@ -82,28 +81,7 @@ bool IsThere(int folder, const std::string& name) {
   return ::faccessat(folder, name.c_str(), F_OK, AT_SYMLINK_NOFOLLOW) == 0;
 }
 
-/// Not every file system knows how not to replace. The name is reserved, so that nobody who keeps
-/// the rules takes it between the look and the rename.
-Status Rename(int from, const char* name, int to, const std::string& newName) {
-  if (::renameat2(from, name, to, newName.c_str(), RENAME_NOREPLACE) == 0) return {};
-  if (errno != EINVAL && errno != ENOSYS) return LastError();
-  if (IsThere(to, newName)) return kItemExists;
-  return ::renameat(from, name, to, newName.c_str()) == 0 ? Status() : Status(LastError());
-}
-
 std::string InfoName(const std::string& name) { return name + std::string(kInfoSuffix); }
-
-/// Hidden, and not to be guessed.
-std::string PrivateName() {
-  std::array<unsigned char, 8> random{};
-  (void)::getrandom(random.data(), random.size(), GRND_NONBLOCK);
-  std::string name = ".orb-";
-  for (const unsigned char byte : random) {
-    name += "0123456789abcdef"[byte >> 4];
-    name += "0123456789abcdef"[byte & 15];
-  }
-  return name;
-}
 
 /// A new file with this content, or none.
 Status WriteNewFile(int folder, const std::string& name, const std::string& content) {
@@ -150,7 +128,7 @@ Result<std::string> TrashFolder::TakeIn(
 }
 
 Status TrashFolder::RenameIn(int folder, const std::string& entry, const std::string& name) const {
-  return Rename(folder, entry.c_str(), files_.Get(), name);
+  return RenameWithoutReplacing(folder, entry.c_str(), files_.Get(), name.c_str());
 }
 
 void TrashFolder::Forget(const std::string& name) const {
@@ -247,11 +225,10 @@ void TrashFolder::UpdateFolderSizes() const {
     if (!survey || ::fstatat(info_.Get(), InfoName(name).c_str(), &info, 0) != 0) continue;
     list = WithFolderSize(list, {survey.Value().bytes, info.st_mtim.tv_sec, name}, isThere);
   }
-  const std::string temporary = PrivateName();
-  if (!WriteNewFile(root_.Get(), temporary, list)) return;
-  if (::renameat(root_.Get(), temporary.c_str(), root_.Get(), kFolderSizes) != 0) {
-    ::unlinkat(root_.Get(), temporary.c_str(), 0);
-  }
+  auto file = NewFile::CreateHidden(root_.Get(), kPrivateFile);
+  if (!file) return;
+  const Status written = WriteBlock(file.Value().Descriptor(), std::as_bytes(std::span(list)));
+  if (written) (void)file.Value().Replace(kFolderSizes);
 }
 
 }  // namespace orb::platform
