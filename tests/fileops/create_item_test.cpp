@@ -1,28 +1,15 @@
 // SPDX-License-Identifier: MIT
-#include <gtest/gtest.h>
-#include <orb/fileinfo/file_handle.h>
 #include <orb/fileops/create.h>
 #include <orb/fileops/path_relations.h>
 
-#include <filesystem>
-#include <set>
-#include <string>
 #include <thread>
 #include <vector>
 
 #include "fileops/numbered_name.h"
-#include "support/faults.h"
-#include "support/paths.h"
-#include "support/temp_folder.h"
+#include "support/files.h"
 
+namespace orb::test {
 namespace {
-
-namespace fs = std::filesystem;
-using orb::NumberedName;
-using orb::TakenNumbers;
-using orb::test::ReadAll;
-using orb::test::RunWithPrivateMounts;
-using orb::test::TempFolder;
 
 /// The name that was made, or the code in its place.
 std::string Unique(const std::string& folder, const std::string& name) {
@@ -37,10 +24,7 @@ std::string Unique(const std::string& folder, const std::string& name) {
 
 TEST(CreateUniqueFile, NumbersTheNameBeforeItsExtension) {
   const TempFolder folder;
-  const struct {
-    const char* name;
-    std::vector<std::string> made;
-  } kCases[] = {
+  const std::pair<const char*, std::vector<std::string>> kCases[] = {
       {"photo.jpg", {"photo.jpg", "photo_1.jpg", "photo_2.jpg"}},
       {"a.b.jpg", {"a.b.jpg", "a.b_1.jpg"}},
       {"notes", {"notes", "notes_1"}},
@@ -48,34 +32,34 @@ TEST(CreateUniqueFile, NumbersTheNameBeforeItsExtension) {
       {"dot.", {"dot.", "dot_1"}},
       {"100%d.tif", {"100%d.tif", "100%d_1.tif"}},
   };
-  for (const auto& c : kCases) {
-    for (const std::string& made : c.made) EXPECT_EQ(Unique(folder.Path(), c.name), made);
-  }
+  for (const auto& [name, all] : kCases)
+    for (const std::string& made : all) EXPECT_EQ(Unique(folder.Path(), name), made);
 }
 
 TEST(CreateUniqueFile, TakesTheLowestFreeNumberOfMany) {
-  const TempFolder folder;
-  for (int i = 0; i < 300; ++i) Unique(folder.Path(), "p.jpg");
-  EXPECT_TRUE(fs::exists(folder / "p_299.jpg"));
-  fs::remove(folder / "p_7.jpg");
-  fs::remove(folder / "p_120.jpg");
-  fs::create_symlink("nowhere", folder / "p_300.jpg");  // Taken, although it leads nowhere.
+  const Tree tree;
+  for (int i = 0; i < 300; ++i) Unique(tree.Path(), "p.jpg");
+  EXPECT_TRUE(tree.Has("p_299.jpg"));
+  for (const char* name : {"p_7.jpg", "p_120.jpg"}) fs::remove(tree / name);
+  tree.Make("p_300.jpg -> nowhere");  // Taken, although it leads nowhere.
   for (const char* made : {"p_7.jpg", "p_120.jpg", "p_301.jpg"})
-    EXPECT_EQ(Unique(folder.Path(), "p.jpg"), made);
+    EXPECT_EQ(Unique(tree.Path(), "p.jpg"), made);
 }
 
 TEST(CreateUniqueFile, EndsWhereNoNumberCanHelp) {
-  const TempFolder folder;
   const std::string longest = std::string(251, 'n') + ".jpg";
-  EXPECT_EQ(Unique(folder.Path(), longest), longest);
-  EXPECT_EQ(Unique(folder.Path(), longest), std::to_string(kOrbErrInvalidName));
-  EXPECT_EQ(Unique(folder.Path(), "n" + longest), std::to_string(kOrbErrInvalidName));
-  EXPECT_EQ(Unique(folder / "missing", "a"), std::to_string(kOrbErrAccessDenied));
-  EXPECT_EQ(Unique("", "a"), std::to_string(kOrbErrEmptyPath));
-  ASSERT_EQ(COrbFileHandle(PathOf(folder.Path())).SetAttribute(kOrbFileAttrLocked), 0u);
-  EXPECT_EQ(Unique(folder.Path(), longest), std::to_string(kOrbErrInvalidName));
-  folder.Write("a", "");
-  EXPECT_EQ(Unique(folder.Path(), "a"), std::to_string(kOrbErrAccessDenied));
+  const Tree tree(longest + ", locked/a, locked/" + longest + ", locked/!");
+  const Row<OrbResult> kCases[] = {
+      {"", longest, kOrbErrEmptyPath},
+      {tree.Path(), longest, kOrbErrInvalidName},
+      {tree.Path(), "n" + longest, kOrbErrInvalidName},
+      {"missing", "a", kOrbErrAccessDenied},
+      {"locked", longest, kOrbErrInvalidName},
+      {"locked", "a", kOrbErrAccessDenied},
+  };
+  const Unchanged unchanged(tree.Path());
+  for (const auto& [folder, name, expected] : kCases)
+    EXPECT_EQ(Unique(tree.At(folder), name), std::to_string(expected)) << folder << name;
 }
 
 TEST(CreateUniqueFile, GivesNoTwoCallersTheSameFile) {
@@ -99,16 +83,9 @@ TEST(CreateUniqueFile, GivesNoTwoCallersTheSameFile) {
 TEST(NumberedName, ReadsOnlyTheNamesThatItGives) {
   const NumberedName names(S("p.jpg"));
   EXPECT_EQ(names.NumberOf("p_12.jpg"), 12u);
-  for (const char* name : {"p.jpg",
-                           "p_.jpg",
-                           "p_0.jpg",
-                           "p_01.jpg",
-                           "p_+1.jpg",
-                           "p_1.JPG",
-                           "p_99999999999.jpg",
-                           "p_1x.jpg",
-                           "q_1.jpg"})
-    EXPECT_FALSE(names.NumberOf(name)) << name;
+  std::istringstream others(
+      "p.jpg p_.jpg p_0.jpg p_01.jpg p_+1.jpg p_1.JPG p_99999999999.jpg p_1x.jpg q_1.jpg");
+  for (std::string name; others >> name;) EXPECT_FALSE(names.NumberOf(name)) << name;
   const TakenNumbers taken({1, 2, 4, 9999});
   EXPECT_EQ(taken.NextFree(1), 3u);
   EXPECT_EQ(taken.NextFree(4), 5u);
@@ -116,75 +93,54 @@ TEST(NumberedName, ReadsOnlyTheNamesThatItGives) {
 }
 
 TEST(CreateFile, ReplacesAFileOrALinkByAnEmptyFile) {
-  const TempFolder folder;
-  folder.Write("old", "content");
-  folder.Write("outside", "content");
-  fs::create_symlink("outside", folder / "link");
+  const Tree tree("old, outside, link -> outside");
   COrbFilePath result;
   for (const char* name : {"new", "old", "link"}) {
-    EXPECT_EQ(OrbCreateFile(PathOf(folder.Path()), S(name), &result), kOrbNoErr) << name;
-    EXPECT_EQ(Text(result.GetFullPath()), folder / name);
-    EXPECT_TRUE(fs::is_regular_file(fs::symlink_status(folder / name)));
-    EXPECT_EQ(ReadAll(folder / name), "");
+    EXPECT_EQ(OrbCreateFile(PathOf(tree.Path()), S(name), &result), kOrbNoErr) << name;
+    EXPECT_EQ(Text(result.GetFullPath()), tree / name);
+    EXPECT_TRUE(fs::is_regular_file(fs::symlink_status(tree / name)));
+    EXPECT_EQ(tree.Read(name), "");
   }
-  EXPECT_EQ(ReadAll(folder / "outside"), "content");
+  EXPECT_EQ(tree.Read("outside"), "outside");
 }
 
-TEST(CreateFile, SaysWhyItCannot) {
-  const TempFolder folder;
-  fs::create_directory(folder / "folder");
-  folder.Write("locked", "x");
-  ASSERT_EQ(COrbFileHandle(PathOf(folder / "locked")).SetAttribute(kOrbFileAttrLocked), 0u);
-  const struct {
-    std::string folder;
-    std::string name;
-    OrbResult expected;
-  } kCases[] = {
-      {"", "new", kOrbErrEmptyPath},
-      {folder.Path(), "folder", kOrbErrFileExists},
-      {folder.Path(), "locked", kOrbErrFileExists},
-      {folder.Path(), std::string(256, 'n'), kOrbErrInvalidName},
-      {folder.Path(), "\xff", kOrbErrInvalidName},
-      {folder / "missing", "new", kOrbErrAccessDenied},
+TEST(CreateFile, AndCreateFolderSayWhyTheyCannot) {
+  const Tree tree("folder/, file, lock!, locked/!");
+  const std::tuple<std::string, std::string, OrbResult, OrbResult> kCases[] = {
+      {"", "new", kOrbErrEmptyPath, kOrbErrEmptyPath},
+      {tree.Path(), "folder", kOrbErrFileExists, kOrbErrFileExists},
+      {tree.Path(), "lock", kOrbErrFileExists, kOrbErrFileExists},
+      {tree.Path(), std::string(256, 'n'), kOrbErrInvalidName, kOrbErrInvalidName},
+      {tree.Path(), "\xff", kOrbErrInvalidName, kOrbErrInvalidName},
+      {"locked", "new", kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {"missing", "new", kOrbErrAccessDenied, kOrbNoErr},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.name);
+  for (const auto& [folder, name, file, made] : kCases) {
+    SCOPED_TRACE(folder + "/" + name);
     COrbFilePath result = PathOf("before");
-    EXPECT_EQ(OrbCreateFile(PathOf(c.folder), S(c.name), &result), c.expected);
+    EXPECT_EQ(OrbCreateFile(PathOf(tree.At(folder)), S(name), &result), file);
     EXPECT_EQ(Text(result.GetFullPath()), "before");
+    EXPECT_EQ(OrbCreateFolder(PathOf(tree.At(folder)), S(name), nullptr), made);
   }
-  EXPECT_EQ(ReadAll(folder / "locked"), "x");
+  EXPECT_EQ(tree.Read("lock"), "lock");
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
-    ASSERT_TRUE(orb::test::MountTmpfs(folder / "full", "size=1m,nr_inodes=1"));
+    ASSERT_TRUE(MountTmpfs(tree / "full", "size=1m,nr_inodes=1"));
     COrbFilePath result;
-    EXPECT_EQ(OrbCreateFile(PathOf(folder / "full"), S("new"), &result), kOrbErrDiskFull);
-    EXPECT_EQ(OrbCreateFolder(PathOf(folder / "full"), S("new"), nullptr), kOrbErrDiskFull);
+    EXPECT_EQ(OrbCreateFile(PathOf(tree / "full"), S("new"), &result), kOrbErrDiskFull);
+    EXPECT_EQ(OrbCreateFolder(PathOf(tree / "full"), S("new"), nullptr), kOrbErrDiskFull);
   }));
 }
 
 TEST(CreateFolder, MakesMissingFoldersAbove) {
-  const TempFolder folder;
-  folder.Write("file", "");
+  const Tree tree;
   COrbFilePath result;
-  const COrbFilePath above = PathOf(folder / "x/y");
-  EXPECT_EQ(OrbCreateFolder(above, S("z"), &result), kOrbNoErr);
-  EXPECT_EQ(Text(result.GetFullPath()), folder / "x/y/z");
-  EXPECT_TRUE(fs::is_directory(folder / "x/y/z"));
-  EXPECT_EQ(OrbCreateFolder(above, S("z"), nullptr), kOrbErrFileExists);
-  EXPECT_EQ(OrbCreateFolder(PathOf(folder.Path()), S("file"), nullptr), kOrbErrFileExists);
-  EXPECT_EQ(OrbCreateFolder(above, S(std::string(256, 'n')), nullptr), kOrbErrInvalidName);
-  EXPECT_EQ(OrbCreateFolder(PathOf(""), S("z"), nullptr), kOrbErrEmptyPath);
-  ASSERT_EQ(COrbFileHandle(above).SetAttribute(kOrbFileAttrLocked), 0u);
-  EXPECT_EQ(OrbCreateFolder(above, S("new"), nullptr), kOrbErrAccessDenied);
+  EXPECT_EQ(OrbCreateFolder(PathOf(tree / "x/y"), S("z"), &result), kOrbNoErr);
+  EXPECT_EQ(Text(result.GetFullPath()), tree / "x/y/z");
+  EXPECT_TRUE(fs::is_directory(tree / "x/y/z"));
 }
 
 TEST(PathRelations, WorkOnTheTextAlone) {
-  const struct {
-    const char* path;
-    OrbResult result;
-    const char* parent;
-    const char* name;
-  } kCases[] = {
+  const std::tuple<const char*, OrbResult, const char*, const char*> kCases[] = {
       {"/a/b/c", 0, "/a/b", "c"},
       {"/a/b/", 0, "/a/b", ""},
       {"a/b.jpg", 0, "a", "b.jpg"},
@@ -192,15 +148,15 @@ TEST(PathRelations, WorkOnTheTextAlone) {
       {"b.jpg", kOrbErrNotFound, "before", "b.jpg"},
       {"", kOrbErrNotFound, "before", ""},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.path);
+  for (const auto& [path, result, expectedParent, expectedName] : kCases) {
+    SCOPED_TRACE(path);
     COrbStringData parent = S("before");
-    EXPECT_EQ(OrbGetParentFolder(S(c.path), &parent), c.result);
-    EXPECT_EQ(Text(parent), c.parent);
-    EXPECT_EQ(OrbGetParentFolder(S(c.path), nullptr), c.result);
-    COrbStringData name = S(c.path);
+    EXPECT_EQ(OrbGetParentFolder(S(path), &parent), result);
+    EXPECT_EQ(Text(parent), expectedParent);
+    EXPECT_EQ(OrbGetParentFolder(S(path), nullptr), result);
+    COrbStringData name = S(path);
     EXPECT_EQ(OrbGetFileNameFromPath(name, &name), kOrbNoErr);  // The output may be the input.
-    EXPECT_EQ(Text(name), c.name);
+    EXPECT_EQ(Text(name), expectedName);
   }
   EXPECT_TRUE(OrbIsSubFolder(S("/a/b"), S("/A/B/c")));
   EXPECT_FALSE(OrbIsSubFolder(S("/a/b"), S("/a/bc")));
@@ -208,3 +164,4 @@ TEST(PathRelations, WorkOnTheTextAlone) {
 }
 
 }  // namespace
+}  // namespace orb::test
