@@ -5,18 +5,18 @@
 #include <orb/strings/string_functions.h>
 #include <unicode/uchar.h>
 #include <unicode/unorm.h>
-#include <unicode/unorm2.h>
-#include <unicode/ustring.h>
-#include <unicode/utf16.h>
 
 #include <array>
 #include <random>
 #include <string>
 #include <vector>
 
+#include "support/icu.h"
 #include "support/texts.h"
 
 namespace {
+
+using namespace orb::test;
 
 constexpr unsigned long kAll = static_cast<unsigned long>(-1);
 
@@ -28,29 +28,13 @@ COrbStringData FromUnits(const std::u16string& units) {
   return COrbStringData(OrbCharUnicode(reinterpret_cast<const unsigned short*>(units.c_str())));
 }
 
-std::int32_t Size(const std::u16string& s) { return static_cast<std::int32_t>(s.size()); }
-
 std::u16string Decomposed(const std::u16string& text) {
   UErrorCode status = U_ZERO_ERROR;
-  std::u16string out(text.size() * 4 + 1, u'\0');
-  const UNormalizer2* nfd = unorm2_getNFDInstance(&status);
-  out.resize(static_cast<std::size_t>(
-      unorm2_normalize(nfd, text.data(), Size(text), out.data(), Size(out), &status)));
-  return out;
+  return IcuNormalised(unorm2_getNFDInstance(&status), text);
 }
 
 std::u16string Folded(const std::u16string& text) {
-  UErrorCode status = U_ZERO_ERROR;
-  const std::u16string plain = Decomposed(text);
-  std::u16string out(plain.size() * 3 + 1, u'\0');
-  out.resize(static_cast<std::size_t>(u_strFoldCase(
-      out.data(), Size(out), plain.data(), Size(plain), U_FOLD_CASE_DEFAULT, &status)));
-  return Decomposed(out);
-}
-
-std::u16string UnitsOf(char32_t c) {
-  if (c < 0x10000) return {static_cast<char16_t>(c)};
-  return {static_cast<char16_t>(U16_LEAD(c)), static_cast<char16_t>(U16_TRAIL(c))};
+  return Decomposed(IcuFolded(Decomposed(text)));
 }
 
 /// Without the rules of any language.
