@@ -1,16 +1,32 @@
 // SPDX-License-Identifier: MIT
-// What is known of each file of one folder: kind, size, times, permissions, readable, writable.
+// What is known of each file of one folder: kind, size, times, permissions, readable, writable; and
+// of its volume.
 #include <benchmark/benchmark.h>
+#include <fcntl.h>
 #include <orb/fileinfo/file_handle.h>
+#include <sys/stat.h>
+#include <sys/statvfs.h>
 #include <unistd.h>
 
-#include <cstdlib>
 #include <filesystem>
-#include <fstream>
 #include <string>
 #include <vector>
 
 #include "platform/volumes.h"
+#include "support.h"
+
+#ifdef ORB_BENCH_GLIB  // Before Qt, whose macros its names meet.
+#include <gio/gio.h>
+#endif
+#ifdef ORB_BENCH_QT
+#include <QDateTime>
+#include <QFileInfo>
+#include <QStorageInfo>
+#include <QString>
+#endif
+#ifdef ORB_BENCH_BOOST
+#include <boost/filesystem.hpp>
+#endif
 
 namespace {
 
@@ -18,48 +34,33 @@ namespace fs = std::filesystem;
 
 constexpr int kFiles = 10'000;
 
-/// A folder of small photos, removed at the end.
-class PhotoFolder {
- public:
-  PhotoFolder() {
-    std::string pattern = (fs::temp_directory_path() / "orb-bench-XXXXXX").string();
-    if (::mkdtemp(pattern.data()) == nullptr) std::abort();
-    folder_ = pattern;
-    for (int i = 0; i < kFiles; ++i) {
-      paths_.push_back(folder_ + "/IMG_" + std::to_string(10'000 + i) + ".JPG");
-      std::ofstream(paths_.back()) << "photo";
-    }
-  }
-  ~PhotoFolder() {
-    std::error_code ignored;
-    fs::remove_all(folder_, ignored);
-  }
-  PhotoFolder(const PhotoFolder&) = delete;
-  PhotoFolder& operator=(const PhotoFolder&) = delete;
-
-  const std::string& Path() const { return folder_; }
-  const std::vector<std::string>& Paths() const { return paths_; }
-
- private:
-  std::string folder_;
-  std::vector<std::string> paths_;
-};
-
-const PhotoFolder& Photos() {
-  static const PhotoFolder photos;
+const bench::Folder& Photos() {
+  static const bench::Folder photos;
   return photos;
+}
+
+const std::vector<std::string>& Paths() {
+  static const std::vector<std::string> paths = [] {
+    std::vector<std::string> made;
+    for (int i = 0; i < kFiles; ++i) {
+      made.push_back(Photos() / ("IMG_" + std::to_string(10'000 + i) + ".JPG"));
+      bench::MakeFile(made.back(), 5);
+    }
+    return made;
+  }();
+  return paths;
 }
 
 template <typename Ask>
 void OnEachFile(benchmark::State& state, Ask ask) {
-  const std::vector<std::string>& paths = Photos().Paths();
+  const std::vector<std::string>& paths = Paths();
   for (auto _ : state) {
     for (const std::string& path : paths) ask(path);
   }
   state.SetItemsProcessed(state.iterations() * kFiles);
 }
 
-void BM_FileHandle(benchmark::State& state) {
+void FileInfoOrb(benchmark::State& state) {
   OnEachFile(state, [](const std::string& path) {
     const COrbStringData text = OrbCharUtf8(path.c_str());
     COrbFileHandle handle;
@@ -72,35 +73,114 @@ void BM_FileHandle(benchmark::State& state) {
     benchmark::DoNotOptimize(handle.GetCreateTime(&created));
   });
 }
-BENCHMARK(BM_FileHandle)->Unit(benchmark::kMillisecond);
+BENCHMARK(FileInfoOrb)->Name("FileInfo/Orb")->Unit(benchmark::kMillisecond);
 
-/// Knows no creation time, volume, lock or file type.
-void BM_StdFilesystemAndAccess(benchmark::State& state) {
-  OnEachFile(state, [](const std::string& text) {
-    const fs::path path(text);
-    std::error_code error;
-    benchmark::DoNotOptimize(fs::symlink_status(path, error));
-    benchmark::DoNotOptimize(fs::file_size(path, error));
-    benchmark::DoNotOptimize(fs::last_write_time(path, error));
+/// The calls that ours cannot do without.
+void FileInfoCalls(benchmark::State& state) {
+  OnEachFile(state, [](const std::string& path) {
+    struct statx status;
+    struct statvfs volume;
+    benchmark::DoNotOptimize(::statx(
+        AT_FDCWD, path.c_str(), AT_SYMLINK_NOFOLLOW, STATX_BASIC_STATS | STATX_BTIME, &status));
+    benchmark::DoNotOptimize(::access(path.c_str(), W_OK));
+    benchmark::DoNotOptimize(::statvfs(path.c_str(), &volume));
+  });
+}
+BENCHMARK(FileInfoCalls)->Name("FileInfo/limit-calls")->Unit(benchmark::kMillisecond);
+
+/// std's and Boost's, which know no creation time, volume, lock or file type.
+template <typename Path, typename Error, typename Ask>
+void FileInfoPath(benchmark::State& state, Ask ask) {
+  OnEachFile(state, [&](const std::string& text) {
+    const Path path(text);
+    Error error;
+    ask(path, error);
     benchmark::DoNotOptimize(::access(path.c_str(), R_OK));
     benchmark::DoNotOptimize(::access(path.c_str(), W_OK));
   });
 }
-BENCHMARK(BM_StdFilesystemAndAccess)->Unit(benchmark::kMillisecond);
 
-void BM_AvailableCapacity(benchmark::State& state) {
+void FileInfoStd(benchmark::State& state) {
+  FileInfoPath<fs::path, std::error_code>(state, [](const fs::path& path, std::error_code& error) {
+    benchmark::DoNotOptimize(fs::symlink_status(path, error));
+    benchmark::DoNotOptimize(fs::file_size(path, error));
+    benchmark::DoNotOptimize(fs::last_write_time(path, error));
+  });
+}
+BENCHMARK(FileInfoStd)->Name("FileInfo/std")->Unit(benchmark::kMillisecond);
+
+void SpaceOrb(benchmark::State& state) {
   const std::string& folder = Photos().Path();
   for (auto _ : state) {
     benchmark::DoNotOptimize(orb::platform::Volumes::Current().AvailableCapacity(folder));
   }
 }
-BENCHMARK(BM_AvailableCapacity);
+BENCHMARK(SpaceOrb)->Name("Space/Orb");
 
-void BM_StdFilesystemSpace(benchmark::State& state) {
+void SpaceStatvfs(benchmark::State& state) {
+  struct statvfs volume;
+  for (auto _ : state) benchmark::DoNotOptimize(::statvfs(Photos().Path().c_str(), &volume));
+}
+BENCHMARK(SpaceStatvfs)->Name("Space/limit-statvfs");
+
+void SpaceStd(benchmark::State& state) {
   std::error_code error;
   for (auto _ : state) benchmark::DoNotOptimize(fs::space(Photos().Path(), error));
 }
-BENCHMARK(BM_StdFilesystemSpace);
+BENCHMARK(SpaceStd)->Name("Space/std");
+
+#ifdef ORB_BENCH_BOOST
+void FileInfoBoost(benchmark::State& state) {
+  using boost::filesystem::path;
+  using boost::system::error_code;
+  FileInfoPath<path, error_code>(state, [](const path& item, error_code& error) {
+    benchmark::DoNotOptimize(boost::filesystem::symlink_status(item, error));
+    benchmark::DoNotOptimize(boost::filesystem::file_size(item, error));
+    benchmark::DoNotOptimize(boost::filesystem::last_write_time(item, error));
+  });
+}
+BENCHMARK(FileInfoBoost)->Name("FileInfo/Boost")->Unit(benchmark::kMillisecond);
+#endif
+
+#ifdef ORB_BENCH_QT
+void FileInfoQt(benchmark::State& state) {
+  OnEachFile(state, [](const std::string& path) {
+    const QFileInfo info(QString::fromStdString(path));
+    benchmark::DoNotOptimize(info.isSymLink());
+    benchmark::DoNotOptimize(info.isDir());
+    benchmark::DoNotOptimize(info.size());
+    benchmark::DoNotOptimize(info.lastModified());
+    benchmark::DoNotOptimize(info.birthTime());
+    benchmark::DoNotOptimize(info.isReadable());
+    benchmark::DoNotOptimize(info.isWritable());
+  });
+}
+BENCHMARK(FileInfoQt)->Name("FileInfo/Qt")->Unit(benchmark::kMillisecond);
+
+void SpaceQt(benchmark::State& state) {
+  const QString folder = QString::fromStdString(Photos().Path());
+  for (auto _ : state) benchmark::DoNotOptimize(QStorageInfo(folder).bytesAvailable());
+}
+BENCHMARK(SpaceQt)->Name("Space/Qt");
+#endif
+
+#ifdef ORB_BENCH_GLIB
+void FileInfoGio(benchmark::State& state) {
+  OnEachFile(state, [](const std::string& path) {
+    GFile* file = g_file_new_for_path(path.c_str());
+    GFileInfo* info =
+        g_file_query_info(file,
+                          "standard::type,standard::size,standard::is-symlink,time::*,access::*",
+                          G_FILE_QUERY_INFO_NOFOLLOW_SYMLINKS,
+                          nullptr,
+                          nullptr);
+    benchmark::DoNotOptimize(g_file_info_get_size(info));
+    g_object_unref(info);
+    g_object_unref(file);
+  });
+}
+BENCHMARK(FileInfoGio)->Name("FileInfo/GIO")->Unit(benchmark::kMillisecond);
+#endif
 
 }  // namespace
 

@@ -1,36 +1,37 @@
 // SPDX-License-Identifier: MIT
 #include <benchmark/benchmark.h>
-#include <malloc.h>
+#include <orb/path/file_path.h>
 #include <orb/strings/string_data.h>
+#include <orb/strings/string_functions.h>
 #include <pthread.h>
-#include <unicode/ustring.h>
+#include <unicode/unistr.h>
 
-#include <algorithm>
 #include <cstdint>
-#include <cstdlib>
-#include <ctime>
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
 #include <memory>
 #include <string>
 #include <thread>
-#include <utility>
 #include <vector>
 
 #include "orb/thread/event.h"
-#include "platform/transcode.h"
+#include "support.h"
 
 #ifdef ORB_BENCH_QT
-#include <QByteArray>
 #include <QString>
 #endif
 #ifdef ORB_BENCH_GLIB
 #include <glib.h>
 #endif
 
-// Sharing and making a text, and converting it. The rows of a group do the same work, so compare
-// the medians of rows within one run:
-//   orb_strings_bench --benchmark_repetitions=9 --benchmark_report_aggregates_only=true
+/// \file
+/// Sharing, making, growing, formatting and cutting texts.
 
 namespace {
+
+using bench::PathOf;
+using bench::TextOf;
 
 constexpr const char* kPath = "/home/photographer/Pictures/2026/11/22/IMG_20261122.JPG";
 
@@ -43,24 +44,92 @@ class RecursiveMutex {
     pthread_mutex_init(&mutex_, &attribute);
     pthread_mutexattr_destroy(&attribute);
   }
-  void Pair() {
-    pthread_mutex_lock(&mutex_);
-    pthread_mutex_unlock(&mutex_);
-  }
+  ~RecursiveMutex() { pthread_mutex_destroy(&mutex_); }
+  RecursiveMutex(const RecursiveMutex&) = delete;
+  RecursiveMutex& operator=(const RecursiveMutex&) = delete;
+
+  void Enter() { pthread_mutex_lock(&mutex_); }
+  void Leave() { pthread_mutex_unlock(&mutex_); }
 
  private:
   pthread_mutex_t mutex_;
 };
 
+/// The least that the contract allows: every owner stands in a chain that is changed under the
+/// value's recursive lock.
+class ChainOwner {
+ public:
+  struct Value {
+    RecursiveMutex lock;
+    std::string text;
+  };
+
+  explicit ChainOwner(Value* value) : value_(value) {}
+  ChainOwner(const ChainOwner& other) : prev_(&other), value_(other.value_) {
+    value_->lock.Enter();
+    next_ = other.next_;
+    if (next_ != nullptr) next_->prev_ = this;
+    other.next_ = this;
+    value_->lock.Leave();
+  }
+  ChainOwner& operator=(const ChainOwner&) = delete;
+  ~ChainOwner() {
+    value_->lock.Enter();
+    if (prev_ != nullptr) prev_->next_ = next_;
+    if (next_ != nullptr) next_->prev_ = prev_;
+    value_->lock.Leave();
+  }
+
+  const char* Text() const { return value_->text.c_str(); }
+
+ private:
+  mutable const ChainOwner* prev_ = nullptr;
+  mutable const ChainOwner* next_ = nullptr;
+  Value* value_;
+};
+
+const char* Read(const COrbStringData& text) { return text.GetPtrUtf8(); }
+const char* Read(const std::shared_ptr<const std::string>& text) { return text->c_str(); }
+const char* Read(const std::string& text) { return text.c_str(); }
+const char* Read(const ChainOwner& text) { return text.Text(); }
+
+const ChainOwner& Chain() {
+  static ChainOwner::Value value{{}, kPath};
+  static const ChainOwner first(&value);
+  return first;
+}
+
+const COrbStringData& SharedOrb() {
+  static const COrbStringData text = TextOf(kPath);
+  return text;
+}
+
+const std::shared_ptr<const std::string>& SharedPointer() {
+  static const auto text = std::make_shared<const std::string>(kPath);
+  return text;
+}
+
+const std::string& Deep() {
+  static const std::string text(kPath);
+  return text;
+}
+
+#ifdef ORB_BENCH_QT
+const void* Read(const QString& text) { return text.constData(); }
+
+const QString& SharedQt() {
+  static const QString text = QString::fromUtf8(kPath);
+  return text;
+}
+#endif
+
 /// A second thread that does nothing: the process counts as threaded.
 class IdleThread {
  public:
-  explicit IdleThread(bool wanted) {
-    if (wanted) thread_ = std::thread([this] { end_.Wait(); });
-  }
+  IdleThread() : thread_([this] { end_.Wait(); }) {}
   ~IdleThread() {
     end_.Set();
-    if (thread_.joinable()) thread_.join();
+    thread_.join();
   }
   IdleThread(const IdleThread&) = delete;
   IdleThread& operator=(const IdleThread&) = delete;
@@ -70,363 +139,286 @@ class IdleThread {
   std::thread thread_;
 };
 
-void ShareLockPairs(benchmark::State& state) {
-  static RecursiveMutex mutex;
-  const IdleThread idle(state.range(0) == 1);
+template <auto kText>
+void Share(benchmark::State& state) {
+  const auto& text = kText();
   for (auto _ : state) {
-    mutex.Pair();
-    mutex.Pair();
-  }
-}
-
-template <typename Text>
-void Share(benchmark::State& state, const Text& text) {
-  const IdleThread idle(state.range(0) == 1);
-  for (auto _ : state) {
-    Text copy(text);
+    auto copy(text);
     benchmark::DoNotOptimize(copy);
   }
 }
 
-void ShareOrb(benchmark::State& state) {
-  static const COrbStringData text{OrbCharUtf8(kPath)};
-  Share(state, text);
-}
-
-void ShareShared(benchmark::State& state) {
-  static const auto text = std::make_shared<const std::string>(kPath);
-  Share(state, text);
-}
-
-void ShareDeep(benchmark::State& state) {
-  static const std::string text(kPath);
-  Share(state, text);
-}
-
-void MakeOrb(benchmark::State& state) {
+void ShareLockPairs(benchmark::State& state) {
+  static RecursiveMutex mutex;
   for (auto _ : state) {
-    COrbStringData text{OrbCharUtf8(kPath)};
-    benchmark::DoNotOptimize(text);
-  }
-}
-
-void MakeShared(benchmark::State& state) {
-  for (auto _ : state) {
-    auto text = std::make_shared<const std::string>(kPath);
-    benchmark::DoNotOptimize(text);
-  }
-}
-
-/// Each text is its list's own, so that growing moves what nobody shares.
-template <typename Text, typename From>
-void Grow(benchmark::State& state, From from) {
-  for (auto _ : state) {
-    std::vector<Text> texts;
-    for (int i = 0; i < 1000; ++i) texts.emplace_back(from);
-    benchmark::DoNotOptimize(texts.data());
-  }
-}
-
-void GrowOrb(benchmark::State& state) { Grow<COrbStringData>(state, OrbCharUtf8(kPath)); }
-void GrowStd(benchmark::State& state) { Grow<std::string>(state, kPath); }
-
-/// Texts of whole characters, at most `size` bytes of UTF-8.
-std::string Sample(int kind, std::size_t size) {
-  static const char* const kPieces[] = {
-      "The quick brown fox jumps over the lazy dog. ",
-      "Größe, Übermut, déjà vu, façade, naïve, señor, Ångström: ",
-      "日本語の写真を整理するための道具です。中文照片管理",
-      "Holiday 😀🎉 by the sea 🌊 and 👍🏽 ",
-      "A longer caption, with a smile at its end as people like to write them 😀. ",
-  };
-  const std::u16string piece = *orb::platform::Utf16FromUtf8(kPieces[kind]);
-  std::string text;
-  while (true) {
-    for (std::size_t at = 0; at < piece.size();) {
-      const std::size_t units = (piece[at] & 0xFC00) == 0xD800 ? 2 : 1;
-      const std::string next = orb::platform::Utf8FromUtf16(piece.substr(at, units));
-      if (text.size() + next.size() > size) return text;
-      text += next;
-      at += units;
+    for (int pair = 0; pair < 2; ++pair) {
+      mutex.Enter();
+      mutex.Leave();
     }
   }
 }
 
-std::u16string SampleUnits(const benchmark::State& state) {
-  return *orb::platform::Utf16FromUtf8(
-      Sample(static_cast<int>(state.range(0)), static_cast<std::size_t>(state.range(1))));
+template <auto kShare>
+void ShareIdle(benchmark::State& state) {
+  const IdleThread idle;
+  kShare(state);
 }
 
-std::string SampleBytes(const benchmark::State& state) {
-  return Sample(static_cast<int>(state.range(0)), static_cast<std::size_t>(state.range(1)));
-}
-
-void SetBytes(benchmark::State& state, const std::string& text) {
-  state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(text.size()));
-}
-
-// Each direction is timed in three ways:
-//   Derive: the other encoding of a text that is there, asked for the first time. The texts are
-//           made before and end afterwards; the peers' results too.
-//   Road:   the text made in one encoding, the other one asked for, and all of it ended.
-//   Bare:   the conversion alone, into a buffer.
-// The UTF-16 copy is to have twice the room of its units, all zero behind them: Zeroed only asks
-// for that memory, as the least that Derive and Road can cost.
-
-std::int64_t ThreadNanoseconds() {
-  timespec now{};
-  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &now);
-  return std::int64_t{now.tv_sec} * 1'000'000'000 + now.tv_nsec;
-}
-
-/// An iteration is a whole batch, so that looking at the clock costs nothing; compare the rates.
-template <typename Make, typename Convert>
-void Derive(benchmark::State& state, Make make, Convert convert) {
-  const std::size_t batch =
-      std::max<std::size_t>(4, (std::size_t{1} << 18) / static_cast<std::size_t>(state.range(1)));
-  std::vector<decltype(make())> texts(batch);
+/// Every thread copies the one value, reads the copy and ends it.
+template <auto kText>
+void ShareAndRead(benchmark::State& state) {
+  const auto& text = kText();
   for (auto _ : state) {
-    for (auto& text : texts) text = make();
-    const std::int64_t start = ThreadNanoseconds();
-    for (auto& text : texts) convert(text);
-    state.SetIterationTime(static_cast<double>(ThreadNanoseconds() - start) * 1e-9);
+    auto copy(text);
+    benchmark::DoNotOptimize(*static_cast<const volatile char*>(Read(copy)));
   }
-  state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(batch) * state.range(1));
 }
 
-void DeriveUnicodeOrb(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  Derive(
-      state,
-      [&] { return COrbStringData(OrbCharUtf8(text.c_str())); },
-      [](const COrbStringData& made) { benchmark::DoNotOptimize(made.GetPtrUnicode()); });
+template <typename Make>
+void Repeat(benchmark::State& state, Make make) {
+  for (auto _ : state) benchmark::DoNotOptimize(make());
 }
 
-/// Of a text whose length is known already.
-void DeriveScannedUnicodeOrb(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  const auto make = [&] {
-    COrbStringData made{OrbCharUtf8(text.c_str())};
-    benchmark::DoNotOptimize(made.GetLengthChar());
-    return made;
-  };
-  Derive(state, make, [](const COrbStringData& made) {
-    benchmark::DoNotOptimize(made.GetPtrUnicode());
+void MakeOrb(benchmark::State& state) {
+  Repeat(state, [] { return TextOf(kPath); });
+}
+void MakeShared(benchmark::State& state) {
+  Repeat(state, [] { return std::make_shared<const std::string>(kPath); });
+}
+
+/// Each text is its list's own, so that growing moves what nobody shares.
+template <typename Text, typename Make>
+void Grow(benchmark::State& state, Make make) {
+  for (auto _ : state) {
+    std::vector<Text> texts;
+    for (std::int64_t i = 0; i < state.range(0); ++i) texts.push_back(make());
+    benchmark::DoNotOptimize(texts.data());
+  }
+  state.SetItemsProcessed(state.iterations() * state.range(0));
+}
+
+void GrowOrb(benchmark::State& state) {
+  Grow<COrbStringData>(state, [] { return TextOf(kPath); });
+}
+void GrowStd(benchmark::State& state) {
+  Grow<std::string>(state, [] { return std::string(kPath); });
+}
+void GrowPathsOrb(benchmark::State& state) {
+  Grow<COrbFilePath>(state, [] { return PathOf(kPath); });
+}
+void GrowPathsStd(benchmark::State& state) {
+  Grow<std::filesystem::path>(state, [] { return std::filesystem::path(kPath); });
+}
+
+// Formatting, cutting and appending.
+
+void FormatOrb(benchmark::State& state) {
+  const COrbStringData format = TextOf("%s_%04d (%d x %d) %.2f s.%s");
+  Repeat(state,
+         [&] { return OrbStringDataFormat(&format, "IMG", 1234, 6000, 4000, 0.125, "JPG"); });
+}
+
+void FormatStd(benchmark::State& state) {
+  Repeat(state, [] {
+    char text[64];
+    const int length = std::snprintf(
+        text, sizeof(text), "%s_%04d (%d x %d) %.2f s.%s", "IMG", 1234, 6000, 4000, 0.125, "JPG");
+    return std::string(text, static_cast<std::size_t>(length));
   });
 }
 
-void DeriveUtf8Orb(benchmark::State& state) {
-  const std::u16string units = SampleUnits(state);
-  const OrbCharUnicode from(reinterpret_cast<const unsigned short*>(units.c_str()));
-  Derive(
-      state,
-      [&] { return COrbStringData(from); },
-      [](const COrbStringData& made) { benchmark::DoNotOptimize(made.GetPtrUtf8()); });
+constexpr const char* kCaption = "Größe der Düne bei Rauschen, 14. Juli, mit Émile und Zoë am Meer";
+
+void MidOrb(benchmark::State& state) {
+  const COrbStringData text = TextOf(kCaption);
+  Repeat(state, [&] { return text.Mid(10, 20); });
 }
 
-void ZeroedUnicode(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  const std::size_t units = SampleUnits(state).size();
+/// Bytes, not characters.
+void MidStd(benchmark::State& state) {
+  const std::string text(kCaption);
+  Repeat(state, [&] { return text.substr(10, 20); });
+}
+
+void MidIcu(benchmark::State& state) {
+  const icu::UnicodeString text = icu::UnicodeString::fromUTF8(kCaption);
+  Repeat(state, [&] { return icu::UnicodeString(text, 10, 20); });
+}
+
+/// A text that grows piece by piece, and what reads it at the end.
+template <typename Text>
+void Append(benchmark::State& state, const Text& piece) {
   for (auto _ : state) {
-    void* block = std::calloc(units + 1, 4);
-    benchmark::DoNotOptimize(block);
-    std::free(block);
+    Text text;
+    for (std::int64_t i = 0; i < state.range(0); ++i) text += piece;
+    benchmark::DoNotOptimize(text);
   }
-  SetBytes(state, text);
+  state.SetItemsProcessed(state.iterations() * state.range(0));
 }
 
-void RoadUnicodeOrb(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
+constexpr const char* kPiece = "IMG_1234.JPG, ";
+
+void AppendOrb(benchmark::State& state) { Append(state, TextOf(kPiece)); }
+void AppendStd(benchmark::State& state) { Append<std::string>(state, kPiece); }
+void AppendIcu(benchmark::State& state) {
+  Append<icu::UnicodeString>(state, icu::UnicodeString::fromUTF8(kPiece));
+}
+
+/// What a new value at each step forces: a block of the whole length, and its bytes copied.
+void AppendNewValues(benchmark::State& state) {
+  const std::string piece(kPiece);
   for (auto _ : state) {
-    COrbStringData made{OrbCharUtf8(text.c_str())};
-    benchmark::DoNotOptimize(made.GetPtrUnicode());
+    std::unique_ptr<char[]> text(new char[1]);
+    std::size_t length = 0;
+    for (std::int64_t i = 0; i < state.range(0); ++i) {
+      std::unique_ptr<char[]> next(new char[length + piece.size() + 1]);
+      std::memcpy(next.get(), text.get(), length);
+      std::memcpy(next.get() + length, piece.c_str(), piece.size() + 1);
+      length += piece.size();
+      text = std::move(next);
+      benchmark::DoNotOptimize(text.get());
+    }
   }
-  SetBytes(state, text);
-}
-
-void BareUnicodeOrb(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  std::u16string out(text.size() + orb::platform::kSlack, u'\0');
-  for (auto _ : state) {
-    benchmark::DoNotOptimize(orb::platform::Utf16FromUtf8(text, out.data()));
-    benchmark::ClobberMemory();
-  }
-  SetBytes(state, text);
-}
-
-void BareUnicodeIcu(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  std::u16string out(text.size() + 1, u'\0');
-  for (auto _ : state) {
-    UErrorCode status = U_ZERO_ERROR;
-    std::int32_t length = 0;
-    u_strFromUTF8(out.data(),
-                  static_cast<std::int32_t>(out.size()),
-                  &length,
-                  text.data(),
-                  static_cast<std::int32_t>(text.size()),
-                  &status);
-    benchmark::DoNotOptimize(length);
-    benchmark::ClobberMemory();
-  }
-  SetBytes(state, text);
-}
-
-void RoadUtf8Orb(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  const std::u16string units = SampleUnits(state);
-  const OrbCharUnicode from(reinterpret_cast<const unsigned short*>(units.c_str()));
-  for (auto _ : state) {
-    COrbStringData made{from};
-    benchmark::DoNotOptimize(made.GetPtrUtf8());
-  }
-  SetBytes(state, text);
-}
-
-void BareUtf8Orb(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  const std::u16string units = SampleUnits(state);
-  std::string out(3 * units.size() + orb::platform::kSlack, '\0');
-  for (auto _ : state) {
-    benchmark::DoNotOptimize(orb::platform::Utf8FromUtf16(units, out.data()));
-    benchmark::ClobberMemory();
-  }
-  SetBytes(state, text);
-}
-
-void BareUtf8Icu(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  const std::u16string units = SampleUnits(state);
-  std::string out(3 * units.size() + 1, '\0');
-  for (auto _ : state) {
-    UErrorCode status = U_ZERO_ERROR;
-    std::int32_t length = 0;
-    u_strToUTF8(out.data(),
-                static_cast<std::int32_t>(out.size()),
-                &length,
-                units.data(),
-                static_cast<std::int32_t>(units.size()),
-                &status);
-    benchmark::DoNotOptimize(length);
-    benchmark::ClobberMemory();
-  }
-  SetBytes(state, text);
-}
-
-/// Kinds: 0 ASCII, 1 accented Latin, 2 CJK, 3 emoji among ASCII, 4 fewer of them.
-void KindsAndSizes(benchmark::internal::Benchmark* rows) {
-  rows->ArgNames({"kind", "bytes"});
-  rows->ArgsProduct({{0, 1, 2, 3, 4}, {64, 1 << 10, 1 << 16, 1 << 20}});
+  state.SetItemsProcessed(state.iterations() * state.range(0));
 }
 
 #ifdef ORB_BENCH_QT
-void ShareQt(benchmark::State& state) {
-  static const QString text = QString::fromUtf8(kPath);
-  Share(state, text);
-}
 void MakeQt(benchmark::State& state) {
-  for (auto _ : state) {
-    QString text = QString::fromUtf8(kPath);
-    benchmark::DoNotOptimize(text);
-  }
+  Repeat(state, [] { return QString::fromUtf8(kPath); });
 }
-
-void DeriveUnicodeQt(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  Derive(
-      state,
-      [] { return QString(); },
-      [&](QString& made) {
-        made = QString::fromUtf8(text.data(), static_cast<qsizetype>(text.size()));
-      });
+void GrowQt(benchmark::State& state) {
+  Grow<QString>(state, [] { return QString::fromUtf8(kPath); });
 }
-
-void DeriveUtf8Qt(benchmark::State& state) {
-  const QString units = QString::fromStdString(SampleBytes(state));
-  Derive(
-      state, [] { return QByteArray(); }, [&](QByteArray& made) { made = units.toUtf8(); });
+void FormatQt(benchmark::State& state) {
+  Repeat(state, [] {
+    return QString::asprintf("%s_%04d (%d x %d) %.2f s.%s", "IMG", 1234, 6000, 4000, 0.125, "JPG");
+  });
 }
-
-void RoadUnicodeQt(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  for (auto _ : state) {
-    QString made = QString::fromUtf8(text.data(), static_cast<qsizetype>(text.size()));
-    benchmark::DoNotOptimize(made);
-  }
-  SetBytes(state, text);
+void MidQt(benchmark::State& state) {
+  const QString text = QString::fromUtf8(kCaption);
+  Repeat(state, [&] { return text.mid(10, 20); });
 }
-
-void RoadUtf8Qt(benchmark::State& state) {
-  const std::string text = SampleBytes(state);
-  const QString units = QString::fromStdString(text);
-  for (auto _ : state) {
-    QByteArray made = units.toUtf8();
-    benchmark::DoNotOptimize(made);
-  }
-  SetBytes(state, text);
-}
+void AppendQt(benchmark::State& state) { Append(state, QString::fromUtf8(kPiece)); }
 #endif
 
 #ifdef ORB_BENCH_GLIB
-void MakeGlib(benchmark::State& state) {
+/// Frees what `make` makes.
+template <typename Make, typename End>
+void MakeAndEnd(benchmark::State& state, Make make, End end) {
   for (auto _ : state) {
-    char* text = g_ref_string_new(kPath);
+    auto* text = make();
     benchmark::DoNotOptimize(text);
-    g_ref_string_release(text);
+    end(text);
   }
+}
+
+void MakeGlib(benchmark::State& state) {
+  MakeAndEnd(
+      state, [] { return g_ref_string_new(kPath); }, g_ref_string_release);
+}
+void FormatGlib(benchmark::State& state) {
+  const auto format = [] {
+    return g_strdup_printf("%s_%04d (%d x %d) %.2f s.%s", "IMG", 1234, 6000, 4000, 0.125, "JPG");
+  };
+  MakeAndEnd(state, format, g_free);
+}
+void MidGlib(benchmark::State& state) {
+  MakeAndEnd(
+      state, [] { return g_utf8_substring(kCaption, 10, 30); }, g_free);
+}
+void AppendGlib(benchmark::State& state) {
+  for (auto _ : state) {
+    GString* text = g_string_new(nullptr);
+    for (std::int64_t i = 0; i < state.range(0); ++i) g_string_append(text, kPiece);
+    benchmark::DoNotOptimize(text->str);
+    g_string_free(text, TRUE);
+  }
+  state.SetItemsProcessed(state.iterations() * state.range(0));
 }
 #endif
 
 // Once a thread has been started, locks cost more for good: the rows of a process with one thread
-// stand before all others.
-#define ORB_ROWS(row) \
-  row(ShareLockPairs) row(ShareOrb) row(ShareShared) row(ShareDeep) ORB_QT_ROW(row)
+// stand before all others, and run.py starts them in a process of their own.
+
+BENCHMARK(ShareLockPairs)->Name("Share-alone/limit-lock-pairs");
+BENCHMARK(Share<Chain>)->Name("Share-alone/limit-owner-chain");
+BENCHMARK(Share<SharedOrb>)->Name("Share-alone/Orb");
+BENCHMARK(Share<SharedPointer>)->Name("Share-alone/std-shared");
+BENCHMARK(Share<Deep>)->Name("Share-alone/std-deep");
 #ifdef ORB_BENCH_QT
-#define ORB_QT_ROW(row) row(ShareQt)
-#else
-#define ORB_QT_ROW(row)
+BENCHMARK(Share<SharedQt>)->Name("Share-alone/Qt");
 #endif
-#define ORB_ALONE(function) BENCHMARK(function)->Arg(0)->Name(#function "/alone");
-#define ORB_IDLE(function) BENCHMARK(function)->Arg(1)->Name(#function "/idle");
-#define ORB_TWO(function) \
-  BENCHMARK(function)->Arg(2)->Threads(2)->UseRealTime()->Name(#function "/two");
-ORB_ROWS(ORB_ALONE)
-BENCHMARK(MakeOrb);
-BENCHMARK(MakeShared);
+
+BENCHMARK(ShareIdle<ShareLockPairs>)->Name("Share-idle/limit-lock-pairs");
+BENCHMARK(ShareIdle<Share<Chain>>)->Name("Share-idle/limit-owner-chain");
+BENCHMARK(ShareIdle<Share<SharedOrb>>)->Name("Share-idle/Orb");
+BENCHMARK(ShareIdle<Share<SharedPointer>>)->Name("Share-idle/std-shared");
+BENCHMARK(ShareIdle<Share<Deep>>)->Name("Share-idle/std-deep");
 #ifdef ORB_BENCH_QT
-BENCHMARK(MakeQt);
+BENCHMARK(ShareIdle<Share<SharedQt>>)->Name("Share-idle/Qt");
+#endif
+
+void Contended(benchmark::internal::Benchmark* row, int threads) {
+  row->Arg(threads)->Threads(threads)->UseRealTime();
+}
+void Two(benchmark::internal::Benchmark* row) { Contended(row, 2); }
+void Sixteen(benchmark::internal::Benchmark* row) { Contended(row, 16); }
+
+#define ORB_CONTENDED(text, row)                                         \
+  BENCHMARK(ShareAndRead<text>)->Name("Share-threads/" row)->Apply(Two); \
+  BENCHMARK(ShareAndRead<text>)->Name("Share-threads/" row)->Apply(Sixteen)
+ORB_CONTENDED(Chain, "limit-owner-chain");
+ORB_CONTENDED(SharedOrb, "Orb");
+ORB_CONTENDED(SharedPointer, "std-shared");
+ORB_CONTENDED(Deep, "std-deep");
+#ifdef ORB_BENCH_QT
+ORB_CONTENDED(SharedQt, "Qt");
+#endif
+
+BENCHMARK(MakeOrb)->Name("Make/Orb");
+BENCHMARK(MakeShared)->Name("Make/std-shared");
+
+void Growing(benchmark::internal::Benchmark* row) {
+  row->RangeMultiplier(10)->Range(1000, 1'000'000)->Unit(benchmark::kMillisecond);
+}
+BENCHMARK(GrowOrb)->Name("GrowVector/Orb")->Apply(Growing);
+BENCHMARK(GrowPathsOrb)->Name("GrowVector-paths/Orb")->Apply(Growing);
+BENCHMARK(GrowStd)->Name("GrowVector/std")->Apply(Growing);
+BENCHMARK(GrowStd)->Name("GrowVector-paths/std-string")->Apply(Growing);
+BENCHMARK(GrowPathsStd)->Name("GrowVector-paths/std")->Apply(Growing);
+
+BENCHMARK(FormatOrb)->Name("Format/Orb");
+BENCHMARK(FormatStd)->Name("Format/std");
+BENCHMARK(MidOrb)->Name("Mid/Orb");
+BENCHMARK(MidStd)->Name("Mid/std");
+BENCHMARK(MidIcu)->Name("Mid/ICU");
+
+void Steps(benchmark::internal::Benchmark* row) {
+  for (const int steps : {10, 100, 1000}) row->Arg(steps);
+}
+BENCHMARK(AppendOrb)->Name("Append/Orb")->Apply(Steps);
+BENCHMARK(AppendStd)->Name("Append/std")->Apply(Steps);
+BENCHMARK(AppendIcu)->Name("Append/ICU")->Apply(Steps);
+BENCHMARK(AppendNewValues)->Name("Append/limit-new-values")->Apply(Steps);
+
+#ifdef ORB_BENCH_QT
+BENCHMARK(MakeQt)->Name("Make/Qt");
+BENCHMARK(GrowQt)->Name("GrowVector/Qt")->Apply(Growing);
+BENCHMARK(FormatQt)->Name("Format/Qt");
+BENCHMARK(MidQt)->Name("Mid/Qt");
+BENCHMARK(AppendQt)->Name("Append/Qt")->Apply(Steps);
 #endif
 #ifdef ORB_BENCH_GLIB
-BENCHMARK(MakeGlib);
-#endif
-BENCHMARK(GrowOrb);
-BENCHMARK(GrowStd);
-ORB_ROWS(ORB_IDLE)
-ORB_ROWS(ORB_TWO)
-BENCHMARK(ZeroedUnicode)->Apply(KindsAndSizes);
-BENCHMARK(DeriveUnicodeOrb)->Apply(KindsAndSizes)->UseManualTime();
-BENCHMARK(DeriveScannedUnicodeOrb)->Apply(KindsAndSizes)->UseManualTime();
-BENCHMARK(RoadUnicodeOrb)->Apply(KindsAndSizes);
-BENCHMARK(BareUnicodeOrb)->Apply(KindsAndSizes);
-BENCHMARK(BareUnicodeIcu)->Apply(KindsAndSizes);
-BENCHMARK(DeriveUtf8Orb)->Apply(KindsAndSizes)->UseManualTime();
-BENCHMARK(RoadUtf8Orb)->Apply(KindsAndSizes);
-BENCHMARK(BareUtf8Orb)->Apply(KindsAndSizes);
-BENCHMARK(BareUtf8Icu)->Apply(KindsAndSizes);
-#ifdef ORB_BENCH_QT
-BENCHMARK(DeriveUnicodeQt)->Apply(KindsAndSizes)->UseManualTime();
-BENCHMARK(RoadUnicodeQt)->Apply(KindsAndSizes);
-BENCHMARK(DeriveUtf8Qt)->Apply(KindsAndSizes)->UseManualTime();
-BENCHMARK(RoadUtf8Qt)->Apply(KindsAndSizes);
+BENCHMARK(MakeGlib)->Name("Make/GLib");
+BENCHMARK(FormatGlib)->Name("Format/GLib");
+BENCHMARK(MidGlib)->Name("Mid/GLib");
+BENCHMARK(AppendGlib)->Name("Append/GLib")->Apply(Steps);
 #endif
 
 }  // namespace
 
 int main(int count, char** arguments) {
-  // Memory that is freed stays with the process, so that no row is charged for the kernel clearing
-  // the same pages again in every round.
-  mallopt(M_TRIM_THRESHOLD, 1 << 30);
-  mallopt(M_MMAP_THRESHOLD, 1 << 30);
+  bench::KeepMemory();
   benchmark::Initialize(&count, arguments);
   benchmark::RunSpecifiedBenchmarks();
 }

@@ -2,7 +2,6 @@
 // Searching, replacing, splitting, trimming and comparing, beside the installed peers. Only the
 // ratios within one run mean something. The argument of a row is the size of the text in bytes.
 #include <benchmark/benchmark.h>
-#include <malloc.h>
 #include <orb/strings/string_functions.h>
 #include <unicode/unorm.h>
 #include <unicode/ustring.h>
@@ -17,6 +16,7 @@
 #include "platform/transcode.h"
 #include "strings/string_access.h"
 #include "strings/text_search.h"
+#include "support.h"
 
 #ifdef ORB_BENCH_QT
 #include <QString>
@@ -25,6 +25,7 @@
 
 namespace {
 
+using bench::TextOf;
 using orb::platform::Utf16FromUtf8;
 
 /// A text of about `size` bytes with a match every eight characters.
@@ -54,8 +55,6 @@ Sample Take(const benchmark::State& state) {
 void Finish(benchmark::State& state) {
   state.SetBytesProcessed(state.iterations() * state.range(0));
 }
-
-COrbStringData Value(const std::string& text) { return COrbStringData(OrbCharUtf8(text.c_str())); }
 
 template <Sample (*kMake)(std::size_t)>
 void FindOrb(benchmark::State& state) {
@@ -108,9 +107,9 @@ void FindIcu(benchmark::State& state) {
 template <Sample (*kMake)(std::size_t)>
 void ReplaceOrb(benchmark::State& state) {
   const Sample sample = Take<kMake>(state);
-  const COrbStringData text = Value(sample.text);
-  const COrbStringData find = Value(sample.find);
-  const COrbStringData with = Value(sample.with);
+  const COrbStringData text = TextOf(sample.text);
+  const COrbStringData find = TextOf(sample.find);
+  const COrbStringData with = TextOf(sample.with);
   for (auto _ : state) benchmark::DoNotOptimize(OrbStringDataReplace(text, find, with));
   Finish(state);
 }
@@ -132,10 +131,26 @@ void ReplaceStd(benchmark::State& state) {
 }
 
 template <Sample (*kMake)(std::size_t)>
+void SplitStd(benchmark::State& state) {
+  const Sample s = Take<kMake>(state);
+  for (auto _ : state) {
+    std::vector<std::string> pieces;
+    std::size_t done = 0;
+    for (std::size_t at; (at = s.text.find(s.find, done)) != std::string::npos;) {
+      if (at > done) pieces.push_back(s.text.substr(done, at - done));
+      done = at + s.find.size();
+    }
+    if (done < s.text.size()) pieces.push_back(s.text.substr(done));
+    benchmark::DoNotOptimize(pieces);
+  }
+  Finish(state);
+}
+
+template <Sample (*kMake)(std::size_t)>
 void SplitOrb(benchmark::State& state) {
   const Sample sample = Take<kMake>(state);
-  const COrbStringData text = Value(sample.text);
-  const COrbStringData separator = Value(sample.find);
+  const COrbStringData text = TextOf(sample.text);
+  const COrbStringData separator = TextOf(sample.find);
   for (auto _ : state) {
     std::vector<COrbStringData> pieces;
     OrbStringDataSplit(text, separator, &pieces);
@@ -147,8 +162,8 @@ void SplitOrb(benchmark::State& state) {
 template <Sample (*kMake)(std::size_t)>
 void TrimOrb(benchmark::State& state) {
   const Sample sample = Take<kMake>(state);
-  const COrbStringData text = Value(std::string(sample.text.size() / 2, ' ') + sample.text);
-  const COrbStringData set = Value(" \t");
+  const COrbStringData text = TextOf(std::string(sample.text.size() / 2, ' ') + sample.text);
+  const COrbStringData set = TextOf(" \t");
   for (auto _ : state) benchmark::DoNotOptimize(OrbStringDataTrim(text, set));
   Finish(state);
 }
@@ -165,6 +180,16 @@ void FindQt(benchmark::State& state) {
 }
 
 template <Sample (*kMake)(std::size_t)>
+void ReplaceQt(benchmark::State& state) {
+  const Sample s = Take<kMake>(state);
+  const QString text = QString::fromStdString(s.text);
+  const QString find = QString::fromStdString(s.find);
+  const QString with = QString::fromStdString(s.with);
+  for (auto _ : state) benchmark::DoNotOptimize(QString(text).replace(find, with));
+  Finish(state);
+}
+
+template <Sample (*kMake)(std::size_t)>
 void SplitQt(benchmark::State& state) {
   const Sample s = Take<kMake>(state);
   const QString text = QString::fromStdString(s.text);
@@ -178,24 +203,28 @@ void Sizes(benchmark::internal::Benchmark* row) {
   for (const std::int64_t size : {1 << 10, 1 << 16, 1 << 20, 1 << 23}) row->Arg(size);
 }
 
-BENCHMARK(FindOrb<Ascii>)->Apply(Sizes);
-BENCHMARK(FindStd<Ascii>)->Apply(Sizes);
-BENCHMARK(FindIcu<Ascii>)->Apply(Sizes);
-BENCHMARK(FindOrb<Cjk>)->Apply(Sizes);
-BENCHMARK(FindStd<Cjk>)->Apply(Sizes);
-BENCHMARK(FindIcu<Cjk>)->Apply(Sizes);
-BENCHMARK(ReplaceOrb<Ascii>)->Apply(Sizes);
-BENCHMARK(ReplaceStd<Ascii>)->Apply(Sizes);
-BENCHMARK(ReplaceOrb<Cjk>)->Apply(Sizes);
-BENCHMARK(ReplaceStd<Cjk>)->Apply(Sizes);
-BENCHMARK(SplitOrb<Ascii>)->Apply(Sizes);
-BENCHMARK(SplitOrb<Cjk>)->Apply(Sizes);
-BENCHMARK(TrimOrb<Ascii>)->Apply(Sizes);
+BENCHMARK(FindOrb<Ascii>)->Name("Find-ASCII/Orb")->Apply(Sizes);
+BENCHMARK(FindStd<Ascii>)->Name("Find-ASCII/std")->Apply(Sizes);
+BENCHMARK(FindIcu<Ascii>)->Name("Find-ASCII/ICU")->Apply(Sizes);
+BENCHMARK(FindOrb<Cjk>)->Name("Find-CJK/Orb")->Apply(Sizes);
+BENCHMARK(FindStd<Cjk>)->Name("Find-CJK/std")->Apply(Sizes);
+BENCHMARK(FindIcu<Cjk>)->Name("Find-CJK/ICU")->Apply(Sizes);
+BENCHMARK(ReplaceOrb<Ascii>)->Name("Replace-ASCII/Orb")->Apply(Sizes);
+BENCHMARK(ReplaceStd<Ascii>)->Name("Replace-ASCII/std")->Apply(Sizes);
+BENCHMARK(ReplaceOrb<Cjk>)->Name("Replace-CJK/Orb")->Apply(Sizes);
+BENCHMARK(ReplaceStd<Cjk>)->Name("Replace-CJK/std")->Apply(Sizes);
+BENCHMARK(SplitOrb<Ascii>)->Name("Split-ASCII/Orb")->Apply(Sizes);
+BENCHMARK(SplitOrb<Cjk>)->Name("Split-CJK/Orb")->Apply(Sizes);
+BENCHMARK(SplitStd<Ascii>)->Name("Split-ASCII/std")->Apply(Sizes);
+BENCHMARK(SplitStd<Cjk>)->Name("Split-CJK/std")->Apply(Sizes);
+BENCHMARK(TrimOrb<Ascii>)->Name("Trim-ASCII/Orb")->Apply(Sizes);
 #ifdef ORB_BENCH_QT
-BENCHMARK(FindQt<Ascii>)->Apply(Sizes);
-BENCHMARK(FindQt<Cjk>)->Apply(Sizes);
-BENCHMARK(SplitQt<Ascii>)->Apply(Sizes);
-BENCHMARK(SplitQt<Cjk>)->Apply(Sizes);
+BENCHMARK(FindQt<Ascii>)->Name("Find-ASCII/Qt")->Apply(Sizes);
+BENCHMARK(FindQt<Cjk>)->Name("Find-CJK/Qt")->Apply(Sizes);
+BENCHMARK(ReplaceQt<Ascii>)->Name("Replace-ASCII/Qt")->Apply(Sizes);
+BENCHMARK(ReplaceQt<Cjk>)->Name("Replace-CJK/Qt")->Apply(Sizes);
+BENCHMARK(SplitQt<Ascii>)->Name("Split-ASCII/Qt")->Apply(Sizes);
+BENCHMARK(SplitQt<Cjk>)->Name("Split-CJK/Qt")->Apply(Sizes);
 #endif
 
 /// 100,000 names as cameras and people give them, in no order.
@@ -237,54 +266,83 @@ void Sort(benchmark::State& state, const std::vector<Text>& texts, Compare compa
 
 void SortOrb(benchmark::State& state) {
   std::vector<COrbStringData> names;
-  for (const std::string& name : PhotoNames()) names.push_back(Value(name));
+  for (const std::string& name : PhotoNames()) names.push_back(TextOf(name));
   Sort(state, names, OrbStringDataCmpi);
 }
-BENCHMARK(SortOrb)->Unit(benchmark::kMillisecond);
+BENCHMARK(SortOrb)->Name("SortNames/Orb")->Unit(benchmark::kMillisecond);
 
 /// What bounds it: the bytes as they are, reached in the same way.
 void SortOrbBytes(benchmark::State& state) {
   std::vector<COrbStringData> names;
-  for (const std::string& name : PhotoNames()) names.push_back(Value(name));
+  for (const std::string& name : PhotoNames()) names.push_back(TextOf(name));
   Sort(state, names, [](const COrbStringData& a, const COrbStringData& b) {
     return orb::StringAccess::Read(a).bytes.compare(orb::StringAccess::Read(b).bytes);
   });
 }
-BENCHMARK(SortOrbBytes)->Unit(benchmark::kMillisecond);
+BENCHMARK(SortOrbBytes)->Name("SortNames/limit-bytes")->Unit(benchmark::kMillisecond);
+
+constexpr const char* kName = "Sommerurlaub an der Ostsee, Größe M, IMG_20261122_1234.JPG";
+
+/// Two equal texts that share nothing.
+template <typename Text, typename Compare>
+void CompareEqual(benchmark::State& state, const Text& a, const Text& b, Compare compare) {
+  for (auto _ : state) {
+    const Text* first = &a;
+    benchmark::DoNotOptimize(first);
+    benchmark::DoNotOptimize(compare(*first, b));
+  }
+}
+
+void CompareEqualOrb(benchmark::State& state) {
+  CompareEqual(state, TextOf(kName), TextOf(kName), OrbStringDataCmpi);
+}
+BENCHMARK(CompareEqualOrb)->Name("CompareEqual/Orb");
+
+/// With the meaning that ours has: composed and decomposed forms are equal.
+int CompareIcu(const std::u16string& a, const std::u16string& b) {
+  UErrorCode status = U_ZERO_ERROR;
+  return unorm_compare(a.data(),
+                       static_cast<std::int32_t>(a.size()),
+                       b.data(),
+                       static_cast<std::int32_t>(b.size()),
+                       U_COMPARE_IGNORE_CASE | U_FOLD_CASE_DEFAULT,
+                       &status);
+}
+
+void CompareEqualIcu(benchmark::State& state) {
+  CompareEqual(state, *Utf16FromUtf8(kName), *Utf16FromUtf8(kName), CompareIcu);
+}
+BENCHMARK(CompareEqualIcu)->Name("CompareEqual/ICU");
 
 void SortIcu(benchmark::State& state) {
   std::vector<std::u16string> names;
   for (const std::string& name : PhotoNames()) names.push_back(*Utf16FromUtf8(name));
-  Sort(state, names, [](const std::u16string& a, const std::u16string& b) {
-    UErrorCode status = U_ZERO_ERROR;
-    return unorm_compare(a.data(),
-                         static_cast<std::int32_t>(a.size()),
-                         b.data(),
-                         static_cast<std::int32_t>(b.size()),
-                         U_COMPARE_IGNORE_CASE | U_FOLD_CASE_DEFAULT,
-                         &status);
-  });
+  Sort(state, names, CompareIcu);
 }
-BENCHMARK(SortIcu)->Unit(benchmark::kMillisecond);
+BENCHMARK(SortIcu)->Name("SortNames/ICU")->Unit(benchmark::kMillisecond);
 
 #ifdef ORB_BENCH_QT
+int CompareQt(const QString& a, const QString& b) {
+  return QString::compare(a, b, Qt::CaseInsensitive);
+}
+
+void CompareEqualQt(benchmark::State& state) {
+  CompareEqual(state, QString::fromUtf8(kName), QString::fromUtf8(kName), CompareQt);
+}
+BENCHMARK(CompareEqualQt)->Name("CompareEqual/Qt");
+
 void SortQt(benchmark::State& state) {
   std::vector<QString> names;
   for (const std::string& name : PhotoNames()) names.push_back(QString::fromStdString(name));
-  Sort(state, names, [](const QString& a, const QString& b) {
-    return QString::compare(a, b, Qt::CaseInsensitive);
-  });
+  Sort(state, names, CompareQt);
 }
-BENCHMARK(SortQt)->Unit(benchmark::kMillisecond);
+BENCHMARK(SortQt)->Name("SortNames/Qt")->Unit(benchmark::kMillisecond);
 #endif
 
 }  // namespace
 
 int main(int count, char** arguments) {
-  // Memory that is freed stays with the process, so that no row is charged for the kernel clearing
-  // the same pages again in every round.
-  mallopt(M_TRIM_THRESHOLD, 1 << 30);
-  mallopt(M_MMAP_THRESHOLD, 1 << 30);
+  bench::KeepMemory();
   benchmark::Initialize(&count, arguments);
   benchmark::RunSpecifiedBenchmarks();
 }

@@ -67,7 +67,7 @@ void FieldsFromInstant_Orb(benchmark::State& state) {
     benchmark::DoNotOptimize(f);
   });
 }
-BENCHMARK(FieldsFromInstant_Orb);
+BENCHMARK(FieldsFromInstant_Orb)->Name("FieldsFromInstant/Orb");
 
 void FieldsFromInstant_localtime_r(benchmark::State& state) {
   OnEach(state, Instants(), [](std::time_t instant) {
@@ -75,7 +75,7 @@ void FieldsFromInstant_localtime_r(benchmark::State& state) {
     benchmark::DoNotOptimize(::localtime_r(&instant, &fields));
   });
 }
-BENCHMARK(FieldsFromInstant_localtime_r);
+BENCHMARK(FieldsFromInstant_localtime_r)->Name("FieldsFromInstant/libc");
 
 void InstantFromFields_Orb(benchmark::State& state) {
   OnEach(state, Fields(), [](const std::tm& f) {
@@ -93,7 +93,7 @@ void InstantFromFields_Orb(benchmark::State& state) {
     benchmark::DoNotOptimize(time.ticks);
   });
 }
-BENCHMARK(InstantFromFields_Orb);
+BENCHMARK(InstantFromFields_Orb)->Name("InstantFromFields/Orb");
 
 void InstantFromFields_mktime(benchmark::State& state) {
   OnEach(state, Fields(), [](std::tm fields) {
@@ -101,7 +101,7 @@ void InstantFromFields_mktime(benchmark::State& state) {
     benchmark::DoNotOptimize(std::mktime(&fields));
   });
 }
-BENCHMARK(InstantFromFields_mktime);
+BENCHMARK(InstantFromFields_mktime)->Name("InstantFromFields/libc");
 
 void CompactText_Orb(benchmark::State& state) {
   OnEach(state, Times(), [](const COrbTime& time) {
@@ -110,7 +110,7 @@ void CompactText_Orb(benchmark::State& state) {
     benchmark::DoNotOptimize(text);
   });
 }
-BENCHMARK(CompactText_Orb);
+BENCHMARK(CompactText_Orb)->Name("CompactText/Orb");
 
 void CompactText_strftime(benchmark::State& state) {
   OnEach(state, Instants(), [](std::time_t instant) {
@@ -121,7 +121,7 @@ void CompactText_strftime(benchmark::State& state) {
     benchmark::DoNotOptimize(text);
   });
 }
-BENCHMARK(CompactText_strftime);
+BENCHMARK(CompactText_strftime)->Name("CompactText/libc");
 
 #ifdef ORB_BENCH_QT
 void FieldsFromInstant_QDateTime(benchmark::State& state) {
@@ -131,7 +131,7 @@ void FieldsFromInstant_QDateTime(benchmark::State& state) {
     benchmark::DoNotOptimize(time.time().hour() + time.time().minute() + time.time().second());
   });
 }
-BENCHMARK(FieldsFromInstant_QDateTime);
+BENCHMARK(FieldsFromInstant_QDateTime)->Name("FieldsFromInstant/Qt");
 
 void InstantFromFields_QDateTime(benchmark::State& state) {
   OnEach(state, Fields(), [](const std::tm& f) {
@@ -140,7 +140,7 @@ void InstantFromFields_QDateTime(benchmark::State& state) {
     benchmark::DoNotOptimize(time.toSecsSinceEpoch());
   });
 }
-BENCHMARK(InstantFromFields_QDateTime);
+BENCHMARK(InstantFromFields_QDateTime)->Name("InstantFromFields/Qt");
 
 void CompactText_QDateTime(benchmark::State& state) {
   const QString format = QStringLiteral("yyyyMMddHHmmsszzz");
@@ -148,7 +148,7 @@ void CompactText_QDateTime(benchmark::State& state) {
     benchmark::DoNotOptimize(QDateTime::fromSecsSinceEpoch(instant).toString(format));
   });
 }
-BENCHMARK(CompactText_QDateTime);
+BENCHMARK(CompactText_QDateTime)->Name("CompactText/Qt");
 #endif
 
 #ifdef ORB_BENCH_GLIB
@@ -162,7 +162,7 @@ void FieldsFromInstant_GDateTime(benchmark::State& state) {
     g_date_time_unref(time);
   });
 }
-BENCHMARK(FieldsFromInstant_GDateTime);
+BENCHMARK(FieldsFromInstant_GDateTime)->Name("FieldsFromInstant/GLib");
 
 void InstantFromFields_GDateTime(benchmark::State& state) {
   OnEach(state, Fields(), [](const std::tm& f) {
@@ -172,7 +172,7 @@ void InstantFromFields_GDateTime(benchmark::State& state) {
     g_date_time_unref(time);
   });
 }
-BENCHMARK(InstantFromFields_GDateTime);
+BENCHMARK(InstantFromFields_GDateTime)->Name("InstantFromFields/GLib");
 
 void CompactText_GDateTime(benchmark::State& state) {
   OnEach(state, Instants(), [](std::time_t instant) {
@@ -183,7 +183,7 @@ void CompactText_GDateTime(benchmark::State& state) {
     g_date_time_unref(time);
   });
 }
-BENCHMARK(CompactText_GDateTime);
+BENCHMARK(CompactText_GDateTime)->Name("CompactText/GLib");
 #endif
 
 }  // namespace

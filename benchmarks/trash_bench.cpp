@@ -12,14 +12,15 @@
 #include <vector>
 
 #include "platform/drives.h"
+#include "support.h"
 
+#ifdef ORB_BENCH_GLIB  // Before Qt, whose macros its names meet.
+#include <gio/gio.h>
+#endif
 #ifdef ORB_BENCH_QT
 #include <QFile>
 #include <QStorageInfo>
 #include <QString>
-#endif
-#ifdef ORB_BENCH_GIO
-#include <gio/gio.h>
 #endif
 
 /// \file
@@ -33,23 +34,14 @@ namespace fs = std::filesystem;
 constexpr int kItems = 200;
 
 const std::string& Folder() {
-  static const std::string folder = [] {
-    std::string pattern = (fs::temp_directory_path() / "orb-trash-bench-XXXXXX").string();
-    if (::mkdtemp(pattern.data()) == nullptr) std::abort();
-    return pattern;
-  }();
-  return folder;
-}
-
-COrbFilePath PathOf(const std::string& path) {
-  const COrbStringData text(OrbCharUtf8{path.c_str()});
-  COrbFilePath made;
-  made.Initialize(&text);
-  return made;
+  static const bench::Folder folder;
+  return folder.Path();
 }
 
 std::vector<std::string> MakeItems() {
   fs::remove_all(Folder() + "/data");
+  fs::create_directory(Folder() +
+                       "/data");  // QFile does not make it, and takes the volume's trash.
   fs::create_directories(Folder() + "/items");
   std::vector<std::string> paths;
   for (int i = 0; i < kItems; ++i) {
@@ -80,11 +72,11 @@ void TimeTrash(benchmark::State& state, Move move) {
 void Trash_Orb(benchmark::State& state) {
   TimeTrash(state, [](const std::vector<std::string>& paths) {
     std::vector<COrbFilePath> items;
-    for (const std::string& path : paths) items.push_back(PathOf(path));
+    for (const std::string& path : paths) items.push_back(bench::PathOf(path));
     OrbMoveToTrash(items, false);
   });
 }
-BENCHMARK(Trash_Orb)->Unit(benchmark::kMillisecond);
+BENCHMARK(Trash_Orb)->Name("Trash/Orb")->UseRealTime()->Unit(benchmark::kMillisecond);
 
 void Drive_Statx(benchmark::State& state) {
   for (auto _ : state) {
@@ -93,13 +85,13 @@ void Drive_Statx(benchmark::State& state) {
         ::statx(AT_FDCWD, Folder().c_str(), AT_SYMLINK_NOFOLLOW, STATX_BASIC_STATS, &status));
   }
 }
-BENCHMARK(Drive_Statx);
+BENCHMARK(Drive_Statx)->Name("DriveCached/limit-statx");
 
 void Drive_OrbCached(benchmark::State& state) {
-  COrbFileHandle handle(PathOf(Folder()));
+  COrbFileHandle handle(bench::PathOf(Folder()));
   for (auto _ : state) benchmark::DoNotOptimize(handle.GetDriveType());
 }
-BENCHMARK(Drive_OrbCached);
+BENCHMARK(Drive_OrbCached)->Name("DriveCached/Orb");
 
 /// The first question of a process, which reads the mount table.
 void Drive_OrbFirst(benchmark::State& state) {
@@ -109,7 +101,7 @@ void Drive_OrbFirst(benchmark::State& state) {
     benchmark::DoNotOptimize(drives->Read(Folder()));
   }
 }
-BENCHMARK(Drive_OrbFirst);
+BENCHMARK(Drive_OrbFirst)->Name("DriveFirst/Orb");
 
 /// The first question about one more volume.
 void Drive_OrbNextVolume(benchmark::State& state) {
@@ -119,7 +111,7 @@ void Drive_OrbNextVolume(benchmark::State& state) {
     benchmark::DoNotOptimize(drives->Read(Folder()));
   }
 }
-BENCHMARK(Drive_OrbNextVolume);
+BENCHMARK(Drive_OrbNextVolume)->Name("DriveNextVolume/Orb");
 
 #ifdef ORB_BENCH_QT
 void Trash_QFile(benchmark::State& state) {
@@ -127,7 +119,7 @@ void Trash_QFile(benchmark::State& state) {
     for (const std::string& path : paths) QFile::moveToTrash(QString::fromStdString(path));
   });
 }
-BENCHMARK(Trash_QFile)->Unit(benchmark::kMillisecond);
+BENCHMARK(Trash_QFile)->Name("Trash/Qt")->UseRealTime()->Unit(benchmark::kMillisecond);
 
 void Drive_QStorageInfo(benchmark::State& state) {
   const QString path = QString::fromStdString(Folder());
@@ -136,10 +128,10 @@ void Drive_QStorageInfo(benchmark::State& state) {
     benchmark::DoNotOptimize(info.isReadOnly());
   }
 }
-BENCHMARK(Drive_QStorageInfo);
+BENCHMARK(Drive_QStorageInfo)->Name("DriveFirst/Qt");
 #endif
 
-#ifdef ORB_BENCH_GIO
+#ifdef ORB_BENCH_GLIB
 void Trash_GFile(benchmark::State& state) {
   TimeTrash(state, [](const std::vector<std::string>& paths) {
     for (const std::string& path : paths) {
@@ -149,7 +141,7 @@ void Trash_GFile(benchmark::State& state) {
     }
   });
 }
-BENCHMARK(Trash_GFile)->Unit(benchmark::kMillisecond);
+BENCHMARK(Trash_GFile)->Name("Trash/GIO")->UseRealTime()->Unit(benchmark::kMillisecond);
 #endif
 
 }  // namespace
@@ -159,5 +151,4 @@ int main(int argc, char** argv) {
   ::setenv("XDG_DATA_HOME", (Folder() + "/data").c_str(), 1);
   benchmark::Initialize(&argc, argv);
   benchmark::RunSpecifiedBenchmarks();
-  fs::remove_all(Folder());
 }

@@ -50,7 +50,7 @@ void TypeByExtension_Orb(benchmark::State& state) {
   AskAll(
       state, texts, [](const COrbStringData& text) { return OrbPathConvertExtensionToType(text); });
 }
-BENCHMARK(TypeByExtension_Orb);
+BENCHMARK(TypeByExtension_Orb)->Name("TypeByExtension/Orb");
 
 void TypeByExtension_map_strcasecmp(benchmark::State& state) {
   std::map<std::string, int, Less> types;
@@ -60,7 +60,7 @@ void TypeByExtension_map_strcasecmp(benchmark::State& state) {
     return found == types.end() ? 0 : found->second;
   });
 }
-BENCHMARK(TypeByExtension_map_strcasecmp);
+BENCHMARK(TypeByExtension_map_strcasecmp)->Name("TypeByExtension/std-map-strcasecmp");
 
 }  // namespace
 

@@ -12,6 +12,7 @@
 #include "fileops/path_in.h"
 #include "platform/item_relations.h"
 #include "platform/items.h"
+#include "platform/mover.h"
 #include "platform/removal.h"
 #include "platform/volumes.h"
 #include "strings/string_access.h"
@@ -71,9 +72,7 @@ OrbResult ExpectCopyable(const std::string& source) {
 }
 
 OrbResult ExpectMovable(const std::string& source) {
-  const auto record = platform::Items::Current().ReadRecord(source);
-  if (!record) return OrbMapErrorForFileOperation(record.Reason());
-  return record.Value().locked ? kOrbErrAccessDenied : kOrbNoErr;
+  return FileOperationResult(platform::ExpectMovable(source));
 }
 
 OrbResult OrbCheckCopyTarget(const COrbStringData& source, const COrbStringData& destination) {

@@ -15,7 +15,7 @@ namespace orb {
 
 /// What the copy, or the move, would refuse anyway is refused before anything is removed for it:
 /// what is not there, with the code that the copy would give; what cannot be read, sockets, pipes
-/// and devices; what is locked.
+/// and devices; what is locked, or may not be taken out of its folder.
 OrbResult ExpectCopyable(const std::string& source);
 OrbResult ExpectMovable(const std::string& source);
 

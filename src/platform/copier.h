@@ -9,7 +9,9 @@ namespace orb::platform {
 
 /// Copies a file, a link (as a link) or a folder with all it holds, with mode, times, attributes,
 /// access control lists, creation time and lock; the owner is the copier. Holes stay holes. Hard
-/// links inside a folder become files of their own.
+/// links inside a folder become files of their own. Of an item with more than 64 KiB of attribute
+/// names, which the kernel does not list, only the creation time, the lock and the access control
+/// lists.
 ///
 /// kItemExists when anything is at the destination, also a link that leads nowhere. kNotPermitted
 /// for sockets, pipes and devices, also inside a folder, and for a locked destination folder. A

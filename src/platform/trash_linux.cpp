@@ -16,15 +16,14 @@
 #include <string_view>
 #include <utility>
 
-#include "platform/copier.h"
 #include "platform/item_relations.h"
 #include "platform/linux/item_metadata.h"
 #include "platform/linux/place.h"
 #include "platform/linux/posix.h"
+#include "platform/linux/removal_at.h"
 #include "platform/linux/trash_folder.h"
 #include "platform/linux/tree_survey.h"
 #include "platform/mount_table.h"
-#include "platform/removal.h"
 #include "platform/volumes.h"
 
 namespace orb::platform {
@@ -160,42 +159,18 @@ bool StickyBitForbids(const Item& item) {
   return isSticky && user != 0 && user != item.status.stx_uid && user != item.parent.status.stx_uid;
 }
 
-/// Asked before anything is copied, so that no copy is made in vain and nothing is removed in part.
-Result<TreeSurvey> SurveyForCopy(const Item& item) {
-  const int folder = item.parent.folder.Get();
-  if (::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) != 0) return LastError();
-  if (StickyBitForbids(item)) return kNotPermitted;
-  Result<TreeSurvey> survey = SurveyTree(folder, item.name, SurveyFor::kRemoval);
-  if (survey && !survey.Value().canBeRemoved) return kNotPermitted;
-  return survey;
-}
-
-Status FlushVolumeOf(const std::string& path) {
-  const std::string folder(ParentOf(path));
-  const UniqueFd open(
-      Retry([&] { return ::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC); }));
-  return open && ::syncfs(open.Get()) == 0 ? Status() : Status(LastError());
-}
-
-bool IsThere(const std::string& path) {
-  return ReadStatus(AT_FDCWD, path.c_str(), AT_SYMLINK_NOFOLLOW).Ok();
-}
-
-/// A copy that is complete and on the device, or none. kItemExists only for a name that is taken.
-Status CopyWhole(const std::string& from, const std::string& to) {
-  if (IsThere(to)) return kItemExists;
-  Status copied = CopyItem(from, to);
-  if (copied) copied = FlushVolumeOf(to);
-  if (copied) return {};
-  (void)RemoveItem(to);
-  return copied.Reason() == kItemExists ? kNotPermitted : copied.Reason();
+/// Asked before anything is copied, so that no copy is made in vain.
+Status ExpectRoom(const Item& item, const TrashFolder& trash) {
+  const auto survey = SurveyTree(item.parent.folder.Get(), item.name, SurveyFor::kSize);
+  if (!survey) return survey.Reason();
+  const auto capacity = Volumes::Current().AvailableCapacity(trash.PathOf("."));
+  return capacity && survey.Value().bytes > *capacity ? Status(kVolumeFull) : Status();
 }
 
 /// A file is there or gone. Of a folder a part may be gone: then the copy must stay.
-Status RemoveCopied(const Item& item, TrashFolder& trash, const std::string& name) {
-  const Status removed = RemoveItem(item.path);
-  if (removed || item.IsFolder()) return removed;
-  if (RemoveItem(trash.PathOf(name))) trash.Forget(name);
+Status RemoveCopied(const Item& item, const TrashFolder& trash, const std::string& name) {
+  const Status removed = RemoveItemAt(item.parent.folder.Get(), item.name);
+  if (!removed && !item.IsFolder()) trash.Drop(name);
   return removed;
 }
 
@@ -257,13 +232,10 @@ class Trash::Batch {
     Result<TrashFolder>& home = Home();
     if (!home) return home.Reason();
     TrashFolder& trash = home.Value();
-    const Result<TreeSurvey> survey = SurveyForCopy(item);
-    if (!survey) return survey.Reason();
-    const auto capacity = Volumes::Current().AvailableCapacity(trash.PathOf("."));
-    if (capacity && survey.Value().bytes > *capacity) return kVolumeFull;
-    if (Concerns(trash, item)) return kNotPermitted;
+    if (StickyBitForbids(item) || Concerns(trash, item)) return kNotPermitted;
+    if (const Status room = ExpectRoom(item, trash); !room) return room;
     const auto copy = [&](const std::string& name) {
-      return CopyWhole(item.path, trash.PathOf(name));
+      return trash.CopyIn(item.parent.folder.Get(), item.name, name);
     };
     const Result<std::string> taken = trash.TakeIn(item.name, item.path, copy);
     if (!taken) return taken.Reason();

@@ -150,12 +150,13 @@ TEST_P(FolderForms, ReplaceWhatIsThereOrLeaveIt) {
 }
 
 TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
-  folder_.Make("link -> tree, to/old=old, locked!, pipe|");
+  folder_.Make("link -> tree, to/old=old, locked!, pipe|, pinned/file, pinned/!");
   const Unchanged unchanged(folder_.Path());
   EXPECT_EQ(RunHere("missing", "to", "old"), row_.missing);
   EXPECT_EQ(Run("", folder_ / "to", "old"), row_.missing);
   if (row_.existing == 0) {
     EXPECT_EQ(RunHere(row_.moves == kYes ? "locked" : "pipe", "to", "old"), kDenied);
+    EXPECT_EQ(RunHere(row_.moves == kYes ? "pinned/file" : "pipe", "to", "old"), kDenied);
   }
   EXPECT_EQ(RunHere("tree", "tree", "new"), row_.same);
   EXPECT_EQ(RunHere("tree", "tree/sub", "new"), row_.inside);

@@ -210,5 +210,22 @@ TEST(CopyItem, LeavesCompleteCopiesOrNoneWhenTheProcessIsKilled) {
     EXPECT_TRUE(tree.Read("to/" + copy) == whole) << copy;
 }
 
+TEST(CopyItem, KeepsTheLockBesideMoreNamesThanAreListed) {
+  const Tree tree;
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(MountTmpfs(tree / "many", "size=4m"));
+    const std::string source = tree.Write("many/source", "x");
+    for (int i = 100; i < 400; ++i) {
+      const std::string name = "user." + std::to_string(i) + std::string(240, 'n');
+      ASSERT_EQ(::setxattr(source.c_str(), name.c_str(), "", 0, 0), 0);
+    }
+    ASSERT_TRUE(Items::Current().SetCreated(source, {1000000000, 0}));
+    ASSERT_TRUE(SetLock(source, true));
+    ASSERT_TRUE(CopyItem(source, tree / "many/copy"));
+    const ItemRecord copy = Items::Current().ReadRecord(tree / "many/copy").Value();
+    EXPECT_TRUE(copy.created.seconds == 1000000000 && copy.locked);
+  }));
+}
+
 }  // namespace
 }  // namespace orb::platform

@@ -164,5 +164,32 @@ TEST(MoveItem, LosesNothingWhenItIsKilledOnTheWayToAnotherVolume) {
   }));
 }
 
+// The lease tells when the copy comes to the second file: the first is written to, or the tree
+// goes.
+TEST(MoveItem, LosesNothingOfATreeThatChangesMeanwhile) {
+  const Tree tree;
+  static int first, second;
+  static std::string from, away;
+  for (const char* elsewhere : {"", "a/away"}) {
+    ORB_IN_CHILD(RunWithPrivateMounts([&] {
+      MakeVolumes(tree);
+      from = tree / "a/tree";
+      away = *elsewhere == '\0' ? "" : tree / elsewhere;
+      first = ::open((from + "/100%.jpg").c_str(), O_WRONLY | O_APPEND | O_CLOEXEC);
+      second = ::open((from + "/sub/big").c_str(), O_RDWR | O_CLOEXEC);
+      ::signal(SIGIO, [](int) {
+        const bool done =
+            away.empty() ? ::write(first, "!", 1) == 1 : ::rename(from.c_str(), away.c_str()) == 0;
+        ::close(done ? second : first);
+      });
+      ASSERT_EQ(::fcntl(second, F_SETLEASE, F_WRLCK), 0);
+      EXPECT_FALSE(MoveItem(from, tree / "b/tree"));
+      EXPECT_EQ(ReadAll((away.empty() ? from : away) + "/100%.jpg"),
+                away.empty() ? "photo!" : "photo");
+      EXPECT_EQ(tree.Read("b/tree/100%.jpg"), away.empty() ? "" : "photo");
+    }));
+  }
+}
+
 }  // namespace
 }  // namespace orb::platform

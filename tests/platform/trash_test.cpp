@@ -304,14 +304,19 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
 TEST_F(TrashOnVolume, CopiesWhereTheVolumeDoesNotRename) {
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
     ASSERT_TRUE(MountTmpfs(tree_ / "layers", "size=4m"));
-    tree_.Make("volume/, layers/upper/, layers/work/, layers/lower/trip/a.jpg=below");
+    tree_.Make(
+        "layers/lower/tour/a.jpg, volume/, layers/upper/, layers/work/, layers/lower/trip/a.jpg");
     if (!RunShell("cd '" + (tree_ / "layers") + "' && mount -t overlay overlay ../volume -o " +
                   "redirect_dir=off,lowerdir=lower,upperdir=upper,workdir=work 2>/dev/null"))
       ::_exit(kImpossibleStatus);
     EXPECT_TRUE(Put(Volume() + "/trip"));
     EXPECT_FALSE(tree_.Has("volume/trip"));
-    EXPECT_EQ(ReadAll(Home() + "/files/trip/a.jpg"), "below");
+    EXPECT_EQ(ReadAll(Home() + "/files/trip/a.jpg"), "layers/lower/trip/a.jpg");
     EXPECT_TRUE(IsEmpty(Own()));
+
+    const ScopedVariable data("XDG_DATA_HOME", Volume() + "/data");
+    EXPECT_TRUE(Put(Volume() + "/tour")) << "nor the volume of the home";
+    EXPECT_TRUE(tree_.Has("volume/data/Trash/files/tour/a.jpg"));
   }));
 }
 

@@ -11,14 +11,15 @@
 /// Moves of files, links and folders. On one volume a move is one step that never replaces
 /// anything, and an item that is at the destination already makes it fail. To another volume the
 /// item is copied with all it has, and the source goes when the copy is complete and on the device;
-/// a failed copy is taken away again. If the source cannot be removed then, the copy stays and the
-/// failure is reported. A locked item does not move, nor to another volume a folder that holds one.
+/// a failed copy is taken away again, also when the source was written to meanwhile. If the source
+/// cannot be removed then, or has gone, the copy stays and the failure is reported. A locked item
+/// does not move, nor to another volume a folder that holds one.
 ///
 /// A form that removes what is at the destination looks at the source first: kOrbErrNotFound, and
-/// nothing is removed, when it is empty or not there; kOrbErrAccessDenied for a locked one. Nor is
-/// anything removed when the destination is the source, one of its folders or something inside it,
-/// by its text or on disk: kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed; a
-/// folder may then have lost some of its content.
+/// nothing is removed, when it is empty or not there; kOrbErrAccessDenied for a locked one and for
+/// one that may not be taken out of its folder. Nor is anything removed when the destination is the
+/// source, one of its folders or something inside it, by its text or on disk: kOrbErrInsideSource.
+/// kOrbErrAccessDenied when it cannot be removed; a folder may then have lost some of its content.
 ///
 /// Forms that take a folder give kOrbErrSamePath when it is the source and kOrbErrInsideSource when
 /// it lies inside it, by their texts; kOrbErrAccessDenied for a source that is not valid UTF-8;

@@ -111,8 +111,10 @@ Status CopySmall(int from, int to, std::size_t size) {
   return WriteBlock(to, std::span(block).first(size));
 }
 
-/// A file system that does not tell of holes has one stretch of data.
+/// A file system that does not tell of holes has one stretch of data. The copy has its length from
+/// the start: XFS fills holes at the end of a growing file with room for more.
 Status CopyStretches(int from, int to, off_t size) {
+  if (Status sized = SetLength(to, size); !sized) return sized;
   Carrier carrier(from, to);
   for (off_t offset = 0; offset < size;) {
     const off_t data = ::lseek(from, offset, SEEK_DATA);
@@ -125,7 +127,7 @@ Status CopyStretches(int from, int to, off_t size) {
   }
   struct stat now;
   if (::fstat(from, &now) != 0) return LastError();
-  return now.st_size < size ? EndedEarly() : SetLength(to, size);
+  return now.st_size < size ? EndedEarly() : Status();
 }
 
 bool MayHaveHoles(const struct stat& source) {

@@ -21,6 +21,8 @@ namespace {
 constexpr std::size_t kMaxAttribute = 65'536;
 /// While somebody changes it under us.
 constexpr int kSizeTries = 4;
+constexpr char kAccessList[] = "system.posix_acl_access";
+constexpr char kDefaultAccessList[] = "system.posix_acl_default";
 
 bool IsUserAttribute(std::string_view name) {
   if (name == kLockAttribute || name == kCreatedAttribute) return false;  // Carried by meaning.
@@ -28,7 +30,7 @@ bool IsUserAttribute(std::string_view name) {
 }
 
 bool IsAccessList(std::string_view name) {
-  return name == "system.posix_acl_access" || name == "system.posix_acl_default";
+  return name == kAccessList || name == kDefaultAccessList;
 }
 
 /// What the destination cannot carry, and what a source does not let us see.
@@ -80,14 +82,24 @@ Names SplitNames(std::string_view list) {
   return names;
 }
 
+/// The kernel lists no more than 64 KiB of names. Of an item with more, those that are known are
+/// asked for one by one; nobody can tell the others.
+Names AskForEach(int from) {
+  Names names;
+  for (const char* name : {kLockAttribute, kCreatedAttribute, kAccessList, kDefaultAccessList})
+    if (::fgetxattr(from, name, nullptr, 0) >= 0) names.emplace_back(name);
+  return names;
+}
+
 Result<Names> ListAttributes(int from) {
   std::array<char, 1024> few;  // Enough for almost every item, and one call instead of two.
   const ssize_t size = ::flistxattr(from, few.data(), few.size());
   if (size >= 0) return SplitNames({few.data(), static_cast<std::size_t>(size)});
+  if (errno != ERANGE) return IsRefusal(errno) ? Result(Names()) : LastError();
   const auto list =
       ReadSized([&](char* buffer, std::size_t room) { return ::flistxattr(from, buffer, room); });
   if (!list) return list.Reason();
-  return list.Value() ? SplitNames(*list.Value()) : Names();
+  return list.Value() ? SplitNames(*list.Value()) : AskForEach(from);
 }
 
 Status CarryOne(int from, int to, const char* name) {

@@ -3,6 +3,7 @@
 
 #include <fcntl.h>
 
+#include <cstdint>
 #include <utility>
 
 #include "platform/linux/copy_at.h"
@@ -32,12 +33,13 @@ class Crossing {
   Crossing(const Place& from, const Place& to, const struct stat& source)
       : from_(from), to_(to), source_(source) {}
 
-  Status Move() {
+  Status Copy() {
     if (Status possible = Prepare(); !possible) return possible;
     const Status copied = S_ISDIR(source_.st_mode) ? CopyTree() : CopyLeaf();
     if (!copied) return copied;
-    if (Status same = ExpectUnchanged(); !same) return same;
-    return RemoveItemAt(from_.folder.Get(), from_.name);
+    const Status same = ExpectUnchanged();
+    if (!same && IsSourceInItsPlace()) (void)RemoveItemAt(target_.Get(), to_.name);
+    return same;
   }
 
  private:
@@ -53,9 +55,10 @@ class Crossing {
     return target_ ? ExpectFree() : Status(LastError());
   }
 
-  Status ExpectRemovableTree() const {
+  Status ExpectRemovableTree() {
     const auto survey = SurveyTree(from_.folder.Get(), from_.name, SurveyFor::kRemoval);
     if (!survey) return survey.Reason();
+    state_ = survey.Value().state;
     return survey.Value().canBeRemoved ? Status() : kNotPermitted;
   }
 
@@ -75,14 +78,13 @@ class Crossing {
   }
 
   Status CopyTree() const {
-    Place hidden;
-    hidden.folder = UniqueFd(::fcntl(to_.folder.Get(), F_DUPFD_CLOEXEC, 0));
-    if (!hidden.folder) return LastError();
-    hidden.name = RandomHiddenName();
-    Status copied = CopyItemAt(from_, hidden);
+    const auto hidden = EntryOf(to_.folder.Get(), RandomHiddenName());
+    if (!hidden) return hidden.Reason();
+    const std::string& name = hidden.Value().name;
+    Status copied = CopyItemAt(from_, hidden.Value());
     if (copied) copied = AfterSync(::syncfs(target_.Get()));
-    if (copied) copied = Publish(hidden.name);
-    if (!copied) (void)RemoveItemAt(target_.Get(), hidden.name);
+    if (copied) copied = Publish(name);
+    if (!copied) (void)RemoveItemAt(target_.Get(), name);
     return copied;
   }
 
@@ -96,7 +98,7 @@ class Crossing {
     return done;
   }
 
-  /// What was written to a file, or put in its place, while it was copied would be lost.
+  /// What was written to the source, or put in its place, while it was copied would be lost.
   Status ExpectUnchanged() const {
     const auto now = ReadStatus(from_);
     if (!now) return now.Reason();
@@ -104,21 +106,40 @@ class Crossing {
     const timespec& is = now.Value().st_mtim;
     const bool same = IdentityOf(now.Value()) == IdentityOf(source_) && was.tv_sec == is.tv_sec &&
                       was.tv_nsec == is.tv_nsec;
-    return same ? Status() : ErrorFromErrno(ESTALE);
+    if (!same) return ErrorFromErrno(ESTALE);
+    return S_ISDIR(source_.st_mode) ? ExpectUnchangedTree() : Status();
+  }
+
+  /// Otherwise, its medium pulled or the item taken away, the copy may be all that is left.
+  bool IsSourceInItsPlace() const {
+    const auto now = ReadStatus(from_);
+    return now && IdentityOf(now.Value()) == IdentityOf(source_);
+  }
+
+  Status ExpectUnchangedTree() const {
+    const auto survey = SurveyTree(from_.folder.Get(), from_.name, SurveyFor::kSize);
+    if (!survey) return survey.Reason();
+    return survey.Value().state == state_ ? Status() : ErrorFromErrno(ESTALE);
   }
 
   const Place& from_;
   const Place& to_;
   const struct stat source_;
+  std::uint64_t state_ = 0;  // Of a folder and all it holds, before it was copied.
   UniqueFd target_;
 };
 
 }  // namespace
 
-Status MoveAcross(const Place& from, const Place& to) {
+Status CopyAcross(const Place& from, const Place& to) {
   const auto status = ReadStatus(from);
   if (!status) return status.Reason();
-  return Crossing(from, to, status.Value()).Move();
+  return Crossing(from, to, status.Value()).Copy();
+}
+
+Status MoveAcross(const Place& from, const Place& to) {
+  const Status copied = CopyAcross(from, to);
+  return copied ? RemoveItemAt(from.folder.Get(), from.name) : copied;
 }
 
 }  // namespace orb::platform

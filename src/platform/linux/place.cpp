@@ -56,6 +56,14 @@ Result<Place> Locate(const std::string& path) {
   return place;
 }
 
+Result<Place> EntryOf(int folder, std::string name) {
+  Place place;
+  place.folder = UniqueFd(::fcntl(folder, F_DUPFD_CLOEXEC, 0));
+  if (!place.folder) return LastError();
+  place.name = std::move(name);
+  return place;
+}
+
 Result<struct stat> ReadStatus(const Place& place) {
   struct stat status;
   const int folder = place.folder.Get();

@@ -26,6 +26,9 @@ struct Place {
 /// Finds the folder; whether the item exists is not asked. kNoSuchItem for the empty path.
 Result<Place> Locate(const std::string& path);
 
+/// An entry of a folder that is open. The folder is held a second time.
+Result<Place> EntryOf(int folder, std::string name);
+
 /// The record of the item itself. kNoSuchItem where a folder was meant and something else is.
 Result<struct stat> ReadStatus(const Place& place);
 

@@ -13,7 +13,9 @@
 
 #include "platform/calendar.h"
 #include "platform/linux/file_data.h"
+#include "platform/linux/move_across.h"
 #include "platform/linux/new_file.h"
+#include "platform/linux/removal_at.h"
 #include "platform/linux/rename.h"
 #include "platform/linux/system_file.h"
 #include "platform/linux/tree_survey.h"
@@ -123,12 +125,29 @@ Result<std::string> TrashFolder::TakeIn(
     const Status moved = move(kept.Value());
     if (moved) return kept;
     Forget(kept.Value());
-    if (moved.Reason() != kItemExists) return moved.Reason();
+    if (moved.Reason() == kItemExists) continue;
+    --number;  // The name is free again.
+    return moved.Reason();
   }
 }
 
 Status TrashFolder::RenameIn(int folder, const std::string& entry, const std::string& name) const {
   return RenameWithoutReplacing(folder, entry.c_str(), files_.Get(), name.c_str());
+}
+
+Status TrashFolder::CopyIn(int folder, const std::string& entry, const std::string& name) const {
+  const auto from = EntryOf(folder, entry);
+  if (!from) return from.Reason();
+  const auto to = EntryOf(files_.Get(), name);
+  if (!to) return to.Reason();
+  const Status copied = CopyAcross(from.Value(), to.Value());
+  // Names in a folder may be one to the other volume: no other name for the folder helps.
+  const bool isInside = !copied && copied.Reason() == kItemExists && !IsThere(files_.Get(), name);
+  return isInside ? kNotPermitted : copied;
+}
+
+void TrashFolder::Drop(const std::string& name) const {
+  if (RemoveItemAt(files_.Get(), name)) Forget(name);
 }
 
 void TrashFolder::Forget(const std::string& name) const {

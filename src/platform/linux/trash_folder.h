@@ -39,8 +39,10 @@ class TrashFolder {
                              const std::function<Status(const std::string& name)>& move);
   /// For `move`: renames an entry of an open folder, never over another.
   Status RenameIn(int folder, const std::string& entry, const std::string& name) const;
-  /// Takes the record of an item away.
-  void Forget(const std::string& name) const;
+  /// The same with a copy, as CopyAcross() makes it.
+  Status CopyIn(int folder, const std::string& entry, const std::string& name) const;
+  /// Removes what was copied in, with its record.
+  void Drop(const std::string& name) const;
 
   /// To be called for a folder that was put in under this name.
   void NoteFolder(const std::string& name);
@@ -59,6 +61,7 @@ class TrashFolder {
   static Result<TrashFolder> Open(UniqueFd root, std::string path, std::string topFolder);
   std::string RecordedPath(std::string_view path) const;
   Result<std::string> Record(const std::string& name, const std::string& text, unsigned& number);
+  void Forget(const std::string& name) const;
   void UpdateFolderSizes() const;
 
   std::string path_;

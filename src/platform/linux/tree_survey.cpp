@@ -4,6 +4,7 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 
+#include <functional>
 #include <optional>
 #include <utility>
 #include <vector>
@@ -18,6 +19,17 @@ namespace {
 
 /// Of the units in which the kernel counts.
 constexpr std::uint64_t kBlock = 512;
+
+/// Sums of these do not depend on the order in which a folder is listed.
+std::uint64_t StateOf(std::string entry, const struct stat& status) {
+  for (const auto value : {status.st_size,
+                           status.st_mtim.tv_sec,
+                           status.st_mtim.tv_nsec,
+                           status.st_ctim.tv_sec,
+                           status.st_ctim.tv_nsec})
+    entry.append(1, '/').append(std::to_string(value));
+  return std::hash<std::string>()(entry);
+}
 
 class Surveyor {
  public:
@@ -40,6 +52,7 @@ class Surveyor {
     if (!device_) device_ = status.st_dev;
     survey_.bytes += static_cast<std::uint64_t>(status.st_blocks) * kBlock;
     survey_.canBeRemoved &= status.st_dev == *device_;
+    survey_.state += StateOf(path, status);
     if (S_ISDIR(status.st_mode)) pending_.push_back(path);
     return purpose_ == SurveyFor::kRemoval ? LookForLock(path) : Status();
   }

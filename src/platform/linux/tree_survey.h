@@ -14,6 +14,9 @@ struct TreeSurvey {
   std::uint64_t bytes = 0;
   /// Something inside is locked, or on a volume of its own: not all of it could be removed.
   bool canBeRemoved = true;
+  /// Of all names, sizes and times of change: another sum tells that something was written, added
+  /// or taken away in between.
+  std::uint64_t state = 0;
 };
 
 enum class SurveyFor { kSize, kRemoval };
