@@ -222,18 +222,47 @@ VolumeId IdOf(const StatusRecord& status) {
   return IdOf(known ? status.stx_mnt_id : 0, {status.stx_dev_major, status.stx_dev_minor});
 }
 
+bool IsOnRemote(const MountTable& table, std::string_view path) {
+  const Mount* mount = table.FindByPath(path);
+  return mount != nullptr && IsRemote(*mount);
+}
+
+/// The same place from the root, without "//", "." and "..". Nothing where a ".." leaves a folder
+/// that may be a link: what that means only the kernel knows. On a network mount it is taken by the
+/// text, for the kernel would ask the server.
+std::optional<std::string> PlainPath(const MountTable& table, std::string_view path) {
+  std::string plain;
+  if (!path.starts_with('/')) {
+    std::error_code failed;
+    plain = std::filesystem::current_path(failed);
+    if (failed) return std::nullopt;
+    if (plain == "/") plain.clear();
+  }
+  while (!path.empty()) {
+    const std::string_view name = path.substr(0, path.find('/'));
+    path.remove_prefix(std::min(name.size() + 1, path.size()));
+    if (name == "..") {
+      if (!IsOnRemote(table, plain)) return std::nullopt;
+      plain.erase(plain.rfind('/'));
+    } else if (!name.empty() && name != ".") {
+      plain.append("/").append(name);
+    }
+  }
+  return plain;
+}
+
 /// Keeps the mount table for a second: the questions about 10,000 items should not read it 10,000
 /// times. Guarded by its lock.
 class RecentMountTable {
  public:
   explicit RecentMountTable(std::string file) : file_(std::move(file)) {}
 
-  /// The network mount that a path is on by its text. What ".." means only the kernel knows.
+  /// The network mount that a path is on by its text.
   std::optional<Mount> FindRemote(std::string_view path) {
-    if (path.find("/..") != std::string_view::npos) return std::nullopt;
     const std::lock_guard lock(mutex_);
     if (!freshUntil_ || Clock::now() >= *freshUntil_) Refresh();
-    const Mount* mount = hasRemote_ ? table_.FindByPath(path) : nullptr;
+    const auto plain = hasRemote_ ? PlainPath(table_, path) : std::nullopt;
+    const Mount* mount = plain ? table_.FindByPath(*plain) : nullptr;
     return mount != nullptr && IsRemote(*mount) ? std::optional(*mount) : std::nullopt;
   }
 

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <charconv>
 #include <cstddef>
+#include <set>
 
 namespace orb::platform {
 
@@ -91,19 +92,24 @@ std::string NumberedName(std::string_view name, unsigned number) {
   return std::string(CutTo(stem, kLongestName - kInfoSuffix.size() - tail.size())) + tail;
 }
 
-std::string WithFolderSize(std::string_view list,
-                           const FolderSize& folder,
-                           const std::function<bool(const std::string& name)>& isThere) {
-  std::string kept;
+std::string WithFolderSizes(std::string_view list,
+                            const std::vector<FolderSize>& folders,
+                            const std::function<bool(const std::string& name)>& isThere) {
+  std::set<std::string_view> names;
+  for (const FolderSize& folder : folders) names.insert(folder.name);
+  std::string text;
   while (!list.empty()) {
     const std::size_t end = std::min(list.find('\n'), list.size());
     const std::string_view line = list.substr(0, end);
     list.remove_prefix(std::min(end + 1, list.size()));
     const std::string name = PercentDecoded(NameOf(line));
-    if (name != folder.name && isThere(name)) kept.append(line) += '\n';
+    if (!names.contains(name) && isThere(name)) text.append(line) += '\n';
   }
-  return kept + std::to_string(folder.bytes) + ' ' + std::to_string(folder.recorded) + ' ' +
-         PercentEncoded(folder.name) + '\n';
+  for (const auto& [bytes, recorded, name] : folders) {
+    text += std::to_string(bytes) + ' ' + std::to_string(recorded) + ' ' + PercentEncoded(name);
+    text += '\n';
+  }
+  return text;
 }
 
 }  // namespace orb::platform

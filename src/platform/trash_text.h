@@ -5,6 +5,7 @@
 #include <functional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "platform/civil.h"
 
@@ -34,10 +35,10 @@ struct FolderSize {
   std::string name;
 };
 
-/// The list of folder sizes with one more line. Lines of the same name, and those of folders that
-/// are there no longer, are left out.
-std::string WithFolderSize(std::string_view list,
-                           const FolderSize& folder,
-                           const std::function<bool(const std::string& name)>& isThere);
+/// The list of folder sizes with a line more for each folder. Lines of the same names, and those of
+/// folders that are there no longer, are left out.
+std::string WithFolderSizes(std::string_view list,
+                            const std::vector<FolderSize>& folders,
+                            const std::function<bool(const std::string& name)>& isThere);
 
 }  // namespace orb::platform

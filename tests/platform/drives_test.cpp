@@ -165,7 +165,9 @@ TEST(Drives, DoNotLookAtWhatIsBelowANetworkMount) {
   const std::string share = machine.Mount("share", "0:55", "nfs", "nas:/photos");
   const auto drives = MakeDrives({machine.Folder() / "mountinfo", machine.Folder() / "sys"});
   fs::remove(share);  // As good as a server that does not answer.
-  EXPECT_EQ(machine.KindOf(share + "/photo.jpg"), "remote");
+  for (const char* below : {"/photo.jpg", "/..photo.jpg", "//./photo.jpg", "/b/../photo.jpg"})
+    EXPECT_EQ(machine.KindOf(share + below), "remote") << below;
+  EXPECT_EQ(machine.KindOf(share + "/../photo.jpg"), "nothing") << "left again";
   EXPECT_EQ(drives->VolumeOf(share + "/photo.jpg").Value(),
             drives->VolumeOf(share + "/b/c").Value());
 }

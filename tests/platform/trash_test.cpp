@@ -39,9 +39,9 @@ TEST(TrashText, NumbersNamesAndKeepsThemShort) {
 
 TEST(TrashText, ListsFolderSizesOnce) {
   const auto isThere = [](const std::string& name) { return name != "gone"; };
-  EXPECT_EQ(WithFolderSize("1 2 a%20b\n3 4 gone\n5 6 kept\n", {7, 8, "a b"}, isThere),
+  EXPECT_EQ(WithFolderSizes("1 2 a%20b\n3 4 gone\n5 6 kept\n", {{7, 8, "a b"}}, isThere),
             "5 6 kept\n7 8 a%20b\n");
-  EXPECT_EQ(WithFolderSize("", {7, 8, "%"}, isThere), "7 8 %25\n");
+  EXPECT_EQ(WithFolderSizes("", {{7, 8, "%"}, {9, 9, "a"}}, isThere), "7 8 %25\n9 9 a\n");
 }
 
 bool RunShell(const std::string& command) { return std::system(command.c_str()) == 0; }
@@ -288,6 +288,7 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
     ASSERT_TRUE(Mount("size=4m,mode=0755"));
     tree_.Make("volume/in/a.jpg, volume/sticky/a.jpg, volume/closed/a.jpg");
+    tree_.Make("volume/in/from a disc/a.jpg");
     tree_.Make("volume/in/ 0777, volume/sticky/ 01777");
     ASSERT_EQ(::setresuid(kStranger, kStranger, kStranger), 0);
     EXPECT_TRUE(Put(Volume() + "/in/a.jpg"));
@@ -297,6 +298,7 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
     const Unchanged unchanged(Volume());
     EXPECT_FALSE(Put(Volume() + "/sticky/a.jpg"));
     EXPECT_FALSE(Put(Volume() + "/closed/a.jpg"));
+    EXPECT_FALSE(Put(Volume() + "/in/from a disc"));
     EXPECT_TRUE(IsEmpty(Home()));
   }));
 }

@@ -233,17 +233,18 @@ void TrashFolder::NoteFolder(const std::string& name) { newFolders_.push_back(na
 /// A list for readers that want to say how full the trash is without looking at all of it. They
 /// count themselves what is missing there, so that a failure is none.
 void TrashFolder::UpdateFolderSizes() const {
-  const Result<std::string> old = ReadSystemFile(path_ + '/' + kFolderSizes);
-  std::string list = old ? old.Value() : std::string();
-  const auto isThere = [&](const std::string& name) {
-    return IsThere(info_.Get(), InfoName(name));
-  };
+  std::vector<FolderSize> sizes;
   for (const std::string& name : newFolders_) {
     struct stat info;
     const Result<TreeSurvey> survey = SurveyTree(files_.Get(), name, SurveyFor::kSize);
     if (!survey || ::fstatat(info_.Get(), InfoName(name).c_str(), &info, 0) != 0) continue;
-    list = WithFolderSize(list, {survey.Value().bytes, info.st_mtim.tv_sec, name}, isThere);
+    sizes.push_back({survey.Value().bytes, info.st_mtim.tv_sec, name});
   }
+  const Result<std::string> old = ReadSystemFile(path_ + '/' + kFolderSizes);
+  const auto isThere = [&](const std::string& name) {
+    return IsThere(info_.Get(), InfoName(name));
+  };
+  const std::string list = WithFolderSizes(old ? old.Value() : "", sizes, isThere);
   auto file = NewFile::CreateHidden(root_.Get(), kPrivateFile);
   if (!file) return;
   const Status written = WriteBlock(file.Value().Descriptor(), std::as_bytes(std::span(list)));

@@ -67,15 +67,22 @@ class Surveyor {
     return {};
   }
 
+  /// Only a folder that is not empty needs it.
+  void LookForPermission(int folder) {
+    if (purpose_ != SurveyFor::kRemoval) return;
+    survey_.canBeRemoved &= ::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) == 0;
+  }
+
   Status VisitEntries(const std::string& path) {
     constexpr int kFlags = O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
     auto entries = FolderStream::Open(
         UniqueFd(Retry([&] { return ::openat(folder_, path.c_str(), kFlags); })));
     if (!entries) return entries.Reason();
-    while (true) {
+    for (bool isFirst = true;; isFirst = false) {
       const auto entry = entries.Value().Next();
       if (!entry) return entry.Reason();
       if (entry.Value().name == nullptr) return {};
+      if (isFirst) LookForPermission(entries.Value().Descriptor());
       const Status visited = Visit(path + '/' + entry.Value().name);
       if (!visited) return visited;
     }

@@ -12,7 +12,8 @@ namespace orb::platform {
 struct TreeSurvey {
   /// The space it takes up on its volume.
   std::uint64_t bytes = 0;
-  /// Something inside is locked, or on a volume of its own: not all of it could be removed.
+  /// False when something inside is locked, on a volume of its own or in a folder that the caller
+  /// may not write to: not all of it could be removed.
   bool canBeRemoved = true;
   /// Of all names, sizes and times of change: another sum tells that something was written, added
   /// or taken away in between.
