@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include <orb/fileops/copy.h>
 
-#include "fileops/path_workers.h"
 #include "support/files.h"
 
 namespace orb::test {
@@ -80,44 +79,6 @@ TEST(CopyFileOverwriteEx, RemovesNothingUnlessItCanBeReplaced) {
     EXPECT_EQ(Copy(tree.At(c.source), tree.At(c.folder), name), c.expected)
         << c.source << " to " << c.folder << "/" << c.name;
   }
-}
-
-// The destination is gone by then: the caller asked for its removal first.
-TEST(CopyFileOverwriteEx, CanBeCanceledBeforeButNotAfterTheCopy) {
-  const Tree tree("source");
-  for (const char* there : {"", "to"}) {
-    tree.Make(there);
-    Progress progress{1};
-    EXPECT_EQ(Copy(tree / "source", tree.Path(), "to", &progress), kOrbErrCanceled);
-    EXPECT_EQ(progress.calls, 1);
-    EXPECT_FALSE(tree.Has("to"));
-  }
-  Progress progress{2};
-  EXPECT_EQ(Copy(tree / "source", tree.Path(), "to", &progress), kOrbNoErr);
-  EXPECT_EQ(tree.Read("to"), "source");
-}
-
-TEST(CopyFileOverwriteEx, PutsFailuresDownToALowVolumeButNotACancel) {
-  constexpr std::uint64_t kEnough = 104857600;
-  const Tree tree("file, taken -> nowhere");  // No way is made for what does not exist.
-  for (const std::uint64_t available : {kEnough, kEnough - 1}) {
-    SCOPED_TRACE(available);
-    const SpaceLeft space(available);
-    const OrbResult failed = available < kEnough ? kOrbErrDiskFull : kOrbErrUnknown;
-    EXPECT_EQ(Copy(tree / "file", tree.Path(), "taken"), failed);
-    Progress progress{1};
-    EXPECT_EQ(Copy(tree / "file", tree.Path(), "copy", &progress), kOrbErrCanceled);
-    EXPECT_EQ(Copy(tree / "file", tree.Path(), "copy"), kOrbNoErr);
-  }
-}
-
-TEST(CopyPath, CallsBeforeAndAfterAlsoWhenTheCopyFails) {
-  const Tree tree;
-  Progress progress;
-  OrbCopyPath worker(tree / "missing", tree / "copy");
-  worker.SetProgress(Progress::Call, &progress);
-  EXPECT_EQ(worker.Perform().code, kOrbErrNotFound);
-  EXPECT_EQ(progress.calls, 2);
 }
 
 OrbResult Append(const std::string& source,

@@ -179,6 +179,8 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
 TEST_P(FolderForms, CallAndCanBeCanceledBefore) {
   Arguments arguments = Ask(folder_ / "file", folder_ / "to", "new");
   arguments.progress.falseAt = 1;
+  // What is there is gone by then: the caller asked for its removal first.
+  if (row_.existing == 0) folder_.Make("to/new");
   const SpaceLeft space(kAlmostFull);
   const bool calls = row_.callsOnSuccess > 0;
   EXPECT_EQ(Run(arguments), calls ? kOrbErrCanceled : kOrbNoErr);
@@ -211,17 +213,19 @@ TEST_P(FolderForms, MayAskWhetherTheSourceCanBeUsed) {
 // Only forms that are told nothing blame the volume there; the others keep what they were told.
 TEST(LowSpace, ExplainsWhatTheFormAllows) {
   const TempFolder folder;
-  const SpaceLeft space(kAlmostFull);
-  const std::tuple<LowSpace, bool, OrbResult> kCases[] = {
-      {LowSpace::kNothing, false, kDenied},
-      {LowSpace::kNothing, true, kDenied},
-      {LowSpace::kUntold, false, kFull},
-      {LowSpace::kUntold, true, kDenied},
-      {LowSpace::kAnything, false, kFull},
-      {LowSpace::kAnything, true, kFull},
+  const std::tuple<std::uint64_t, LowSpace, bool, OrbResult> kCases[] = {
+      {kAlmostFull, LowSpace::kNothing, false, kDenied},
+      {kAlmostFull, LowSpace::kNothing, true, kDenied},
+      {kAlmostFull, LowSpace::kUntold, false, kFull},
+      {kAlmostFull, LowSpace::kUntold, true, kDenied},
+      {kAlmostFull, LowSpace::kAnything, false, kFull},
+      {kAlmostFull, LowSpace::kAnything, true, kFull},
+      {kAlmostFull + 1, LowSpace::kAnything, true, kDenied},
   };
-  for (const auto& [lowSpace, explained, expected] : kCases)
+  for (const auto& [available, lowSpace, explained, expected] : kCases) {
+    const SpaceLeft space(available);
     EXPECT_EQ(ConsiderSpace({kDenied, explained}, lowSpace, PathOf(folder.Path())), expected);
+  }
 }
 
 TEST(MoveFile, TakesASeparatorInTheNameForALetter) {
