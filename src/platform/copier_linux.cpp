@@ -3,6 +3,9 @@
 
 #include <fcntl.h>
 #include <limits.h>
+#include <linux/magic.h>
+#include <sys/statfs.h>
+#include <sys/sysmacros.h>
 
 #include <optional>
 #include <utility>
@@ -23,35 +26,82 @@ constexpr mode_t kPrivateFolder = 0700;
 /// How many levels of a tree are held open at once, two descriptors each.
 constexpr std::size_t kOpenLevels = 16;
 
+/// What XFS has and linux/magic.h does not.
+constexpr unsigned long kXfsMagic = 0x58465342;
+/// btrfs keeps what is no larger in its trees.
+constexpr off_t kBtrfsInline = 2048;
+
+/// What can be saved on a volume that files are copied to.
+struct Savings {
+  NewFile::Closing closing = NewFile::Closing::kMayFail;
+  off_t cloneAbove = kCloneAbove;
+};
+
+Savings SavingsOn(int folder) {
+  struct statfs volume;
+  if (::fstatfs(folder, &volume) != 0) return {};
+  switch (static_cast<unsigned long>(volume.f_type)) {
+    case BTRFS_SUPER_MAGIC:
+      return {NewFile::Closing::kCannotFail, kBtrfsInline};
+    case EXT4_SUPER_MAGIC:
+    case TMPFS_MAGIC:
+    case kXfsMagic:
+      return {NewFile::Closing::kCannotFail};
+    default:
+      return {};
+  }
+}
+
 /// A copy under way: an entry of one folder to an entry of another.
 struct Step {
   int from;
   const char* name;
   int to;
   const char* newName;
+  Savings savings;
 };
+
+Identity RecordedIdentity(const StatusRecord& status) {
+  return {::makedev(status.stx_dev_major, status.stx_dev_minor), status.stx_ino};
+}
 
 UniqueFd OpenFolder(int above, const char* name) {
   constexpr int kFlags = O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
   return UniqueFd(Retry([&] { return ::openat(above, name, kFlags); }));
 }
 
-Status CopyOpenFile(int from, const struct stat& status, const Step& step) {
-  auto copy = NewFile::Create(step.to, kPrivateFile);
+/// Reading for a copy is no use of the file: it would change its access time. Only the owner may
+/// ask for that.
+UniqueFd OpenSource(const Step& step) {
+  constexpr int kFlags = O_RDONLY | O_NOFOLLOW;
+  UniqueFd file = OpenFile(step.from, step.name, kFlags | O_NOATIME);
+  const bool isRefused = !file && (errno == EPERM || errno == EINVAL);
+  return isRefused ? OpenFile(step.from, step.name, kFlags) : std::move(file);
+}
+
+/// A file without a name begins with the permissions that it will have, as far as its owner can
+/// write to it.
+Result<NewFile> CreateCopy(int folder, const StatusRecord& source) {
+  constexpr mode_t kPermissions = 0777;
+  return NewFile::Create(folder, (source.stx_mode & kPermissions) | kPrivateFile, kPrivateFile);
+}
+
+Status CopyOpenFile(int from, const StatusRecord& source, const Step& step) {
+  auto copy = CreateCopy(step.to, source);
   if (!copy) return copy.Reason();
   const int to = copy.Value().Descriptor();
-  if (Status copied = CopyFileData(from, to, status); !copied) return copied;
-  if (Status carried = CarryAttributes(from, to, status); !carried) return carried;
-  return copy.Value().Publish(step.newName);
+  Status done = CopyFileData(from, to, source, step.savings.cloneAbove);
+  if (done) done = CarryAttributes(from, to, source);
+  return done ? copy.Value().Publish(step.newName, step.savings.closing) : done;
 }
 
 Status CopyFile(const Step& step) {
-  const UniqueFd from = OpenFile(step.from, step.name, O_RDONLY | O_NOFOLLOW);
+  const UniqueFd from = OpenSource(step);
   if (!from) return LastError();
-  struct stat status;
-  if (::fstat(from.Get(), &status) != 0) return LastError();
-  if (!S_ISREG(status.st_mode)) return kNotPermitted;
-  return CopyOpenFile(from.Get(), status, step);
+  const auto source = ReadStatus(from.Get());
+  if (!source) return source.Reason();
+  if (!S_ISREG(source.Value().stx_mode)) return kNotPermitted;
+  return CopyOpenFile(from.Get(), source.Value(), step);
 }
 
 Status CopyLink(const Step& step) {
@@ -84,7 +134,8 @@ struct Level {
   UniqueFd to;
   Identity fromIdentity;
   Identity toIdentity;
-  struct stat status;
+  StatusRecord status;
+  Savings savings;
   /// The folders in it that are still to be copied.
   std::vector<std::string> pending;
 };
@@ -108,14 +159,17 @@ class TreeCopier {
     if (level.pending.empty()) return Leave();
     const std::string name = std::move(level.pending.back());
     level.pending.pop_back();
-    return Enter({level.from.Get(), name.c_str(), level.to.Get(), name.c_str()});
+    return Enter({level.from.Get(), name.c_str(), level.to.Get(), name.c_str(), {}});
   }
 
   Status Enter(const Step& step) {
     Level level;
     level.from = OpenFolder(step.from, step.name);
-    if (!level.from || ::fstat(level.from.Get(), &level.status) != 0) return LastError();
-    level.fromIdentity = IdentityOf(level.status);
+    if (!level.from) return LastError();
+    const auto status = ReadStatus(level.from.Get());
+    if (!status) return status.Reason();
+    level.status = status.Value();
+    level.fromIdentity = RecordedIdentity(level.status);
     if (root_ && level.fromIdentity == *root_) return ErrorFromErrno(EINVAL);  // Into itself.
     if (::mkdirat(step.to, step.newName, kPrivateFolder) != 0) return LastError();
     level.to = OpenFolder(step.to, step.newName);
@@ -123,6 +177,7 @@ class TreeCopier {
     const auto identity = IdentityOf(level.to.Get());
     if (!identity) return identity.Reason();
     level.toIdentity = identity.Value();
+    level.savings = SavingsOn(level.to.Get());
     if (!root_) root_ = level.toIdentity;
     levels_.push_back(std::move(level));
     CloseFarLevel();
@@ -162,7 +217,8 @@ class TreeCopier {
       level.pending.emplace_back(entry.name);
       return {};
     }
-    return CopyLeaf(type, {level.from.Get(), entry.name, level.to.Get(), entry.name});
+    const int from = level.from.Get();
+    return CopyLeaf(type, {from, entry.name, level.to.Get(), entry.name, level.savings});
   }
 
   /// The folder's own attributes come after its content, which would change its times.
@@ -217,7 +273,11 @@ Status CopyItemAt(const Place& from, const Place& to) {
   const auto status = ReadStatus(from);
   if (!status) return status.Reason();
   if (Status free = ExpectFree(to); !free) return free;
-  const Step step{from.folder.Get(), from.name.c_str(), to.folder.Get(), to.name.c_str()};
+  const Step step{from.folder.Get(),
+                  from.name.c_str(),
+                  to.folder.Get(),
+                  to.name.c_str(),
+                  SavingsOn(to.folder.Get())};
   const bool isFolder = S_ISDIR(status.Value().st_mode);
   return isFolder ? CopyFolder(status.Value(), step) : CopyLeaf(status.Value().st_mode, step);
 }

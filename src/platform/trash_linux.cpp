@@ -167,11 +167,18 @@ Status ExpectRoom(const Item& item, const TrashFolder& trash) {
   return capacity && survey.Value().bytes > *capacity ? Status(kVolumeFull) : Status();
 }
 
-/// A file is there or gone. Of a folder a part may be gone: then the copy must stay.
+/// The copy of a file goes again only while the file is seen to be there: else it may be the last.
+/// Of a folder a part may be gone, and its copy stays.
 Status RemoveCopied(const Item& item, const TrashFolder& trash, const std::string& name) {
-  const Status removed = RemoveItemAt(item.parent.folder.Get(), item.name);
-  if (!removed && !item.IsFolder()) trash.Drop(name);
-  return removed;
+  const int folder = item.parent.folder.Get();
+  const Status removed = RemoveItemAt(folder, item.name);
+  if (removed || item.IsFolder()) return removed;
+  struct stat status;
+  if (::fstatat(folder, item.name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0) {
+    trash.Drop(name);
+    return removed;
+  }
+  return LastError() == kNoSuchItem ? Status() : removed;
 }
 
 bool IsOtherVolume(const Error& failed) { return failed == ErrorFromErrno(EXDEV); }

@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: MIT
 #include "platform/trash.h"
 
+#include <atomic>
 #include <regex>
 #include <sstream>
+#include <thread>
 
 #include "platform/trash_text.h"
 #include "support/environment.h"
@@ -357,6 +359,24 @@ TEST_F(TrashOnVolume, IsListedAndRestoredByTrashCli) {
       EXPECT_TRUE(PutNew(place + "twice.jpg", "1") && PutNew(place + "twice.jpg", "2"));
     }
     EXPECT_TRUE(RunShell("test $(trash-list | grep -c /twice.jpg) = 6"));
+  }));
+}
+
+TEST_F(TrashOnVolume, KeepsTheCopyOfWhatSomebodyElseRemoves) {
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(Mount());
+    tree_.Make("volume/a.jpg=photo, volume/.Trash-0 -> " + Items());  // Only the copy is left.
+    const std::string file = Volume() + "/a.jpg";
+    std::atomic<bool> done = false;
+    std::thread other([&] {
+      while (!done && !fs::exists(Home() + "/files/a.jpg")) std::this_thread::yield();
+      ::unlink(file.c_str());
+    });
+    (void)Put(file);
+    done = true;
+    other.join();
+    EXPECT_EQ(ReadAll(Home() + "/files/a.jpg"), "photo");
+    EXPECT_EQ(PathIn(Home(), "a.jpg"), file);
   }));
 }
 

@@ -7,6 +7,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cstdint>
 #include <memory>
 
 #include "platform/linux/posix.h"
@@ -130,18 +131,18 @@ Status CopyStretches(int from, int to, off_t size) {
   return now.st_size < size ? EndedEarly() : Status();
 }
 
-bool MayHaveHoles(const struct stat& source) {
-  constexpr off_t kStatUnit = 512;
-  return source.st_blocks < source.st_size / kStatUnit;
+bool MayHaveHoles(const StatusRecord& source) {
+  constexpr std::uint64_t kStatUnit = 512;
+  return source.stx_blocks < source.stx_size / kStatUnit;
 }
 
 }  // namespace
 
-Status CopyFileData(int from, int to, const struct stat& source) {
-  const off_t size = source.st_size;
+Status CopyFileData(int from, int to, const StatusRecord& source, off_t cloneAbove) {
+  const auto size = static_cast<off_t>(source.stx_size);
   if (size == 0) return CopyUntilEnd(from, to);
+  if (size > cloneAbove && ::ioctl(to, FICLONE, from) == 0) return TrimClone(to, size);
   if (size <= kSmallFile) return CopySmall(from, to, static_cast<std::size_t>(size));
-  if (::ioctl(to, FICLONE, from) == 0) return TrimClone(to, size);
   return MayHaveHoles(source) ? CopyStretches(from, to, size) : Carrier(from, to).Carry(0, size);
 }
 

@@ -2,6 +2,7 @@
 #include "platform/linux/item_attributes.h"
 
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <sys/xattr.h>
 
 #include <algorithm>
@@ -21,6 +22,7 @@ namespace {
 constexpr std::size_t kMaxAttribute = 65'536;
 /// While somebody changes it under us.
 constexpr int kSizeTries = 4;
+constexpr mode_t kModeBits = 07777;
 constexpr char kAccessList[] = "system.posix_acl_access";
 constexpr char kDefaultAccessList[] = "system.posix_acl_default";
 
@@ -121,18 +123,31 @@ Status CarryThose(int from, int to, const Names& names, bool (*chosen)(std::stri
 }
 
 /// Set-id bits lend the owner's rights: they go along only where the owner is the same.
-mode_t ModeFor(const struct stat& source, const struct stat& copy) {
-  mode_t mode = source.st_mode & 07777;
-  if (source.st_uid != copy.st_uid) mode &= ~mode_t{S_ISUID};
-  if (source.st_gid != copy.st_gid) mode &= ~mode_t{S_ISGID};
+mode_t ModeFor(const StatusRecord& source, const struct stat& copy) {
+  mode_t mode = source.stx_mode & kModeBits;
+  if (source.stx_uid != copy.st_uid) mode &= ~mode_t{S_ISUID};
+  if (source.stx_gid != copy.st_gid) mode &= ~mode_t{S_ISGID};
   return mode;
 }
 
-/// Refused on FAT, network and user-space volumes, which is no failed copy.
-void CarryModeAndTimes(int to, const struct stat& source) {
+/// Refused on FAT, network and user-space volumes, which is no failed copy. Where the mode is right
+/// already, as that of most new files is, it is not set again: that would be one more change of the
+/// file for the file system to log.
+void CarryMode(int to, const StatusRecord& source) {
   struct stat copy;
-  if (::fstat(to, &copy) == 0) (void)::fchmod(to, ModeFor(source, copy));
-  const timespec times[2] = {source.st_atim, source.st_mtim};
+  if (::fstat(to, &copy) != 0) return;
+  const mode_t mode = ModeFor(source, copy);
+  if ((copy.st_mode & kModeBits) != mode) (void)::fchmod(to, mode);
+}
+
+timespec KernelTime(const Timestamp& time) {
+  return {static_cast<time_t>(time.seconds), static_cast<long>(time.nanoseconds)};
+}
+
+/// Refused as the mode is.
+void CarryTimes(int to, const StatusRecord& source) {
+  const timespec times[2] = {KernelTime(LastAccessTime(source)),
+                             KernelTime(ModificationTime(source))};
   (void)::futimens(to, times);
 }
 
@@ -150,19 +165,18 @@ bool IsLockedBy(int from, const StatusRecord& status, const OwnAttributes& own) 
 
 }  // namespace
 
-Status CarryAttributes(int from, int to, const struct stat& source) {
+Status CarryAttributes(int from, int to, const StatusRecord& source) {
   const auto names = ListAttributes(from);
   if (!names) return names.Reason();
-  const auto status = ReadStatus(from);
-  if (!status) return status.Reason();
   const OwnAttributes own = OwnOf(names.Value());
   // An owner without write permission cannot set attributes any more: lists and mode come later.
-  (void)StoreCreationTime(to, CreationTime(from, status.Value(), own));
+  (void)StoreCreationTime(to, CreationTime(from, source, own));
   for (const auto chosen : {IsUserAttribute, IsAccessList}) {
     if (Status carried = CarryThose(from, to, names.Value(), chosen); !carried) return carried;
   }
-  CarryModeAndTimes(to, source);
-  if (IsLockedBy(from, status.Value(), own)) (void)SetLocked(to, true);
+  CarryMode(to, source);
+  CarryTimes(to, source);
+  if (IsLockedBy(from, source, own)) (void)SetLocked(to, true);
   return {};
 }
 

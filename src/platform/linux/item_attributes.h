@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: MIT
 #pragma once
 
-#include <sys/stat.h>
-
 #include "platform/error.h"
+#include "platform/linux/item_metadata.h"
 
 namespace orb::platform {
 
@@ -12,6 +11,6 @@ namespace orb::platform {
 /// each would be undone or refused after the next. Never security.* or trusted.*; the set-id bits
 /// only where the copy has the same owner. `source` is the record of when the source was opened.
 /// What the destination's volume cannot carry is left out, and is no error.
-Status CarryAttributes(int from, int to, const struct stat& source);
+Status CarryAttributes(int from, int to, const StatusRecord& source);
 
 }  // namespace orb::platform

@@ -50,9 +50,9 @@ Status Flush(int file) {
   return second && second.Close() ? Status() : Status(LastError());
 }
 
-Result<NewFile> NewFile::Create(int folder, mode_t mode) {
+Result<NewFile> NewFile::Create(int folder, mode_t mode, mode_t hiddenMode) {
   if (UniqueFd file = OpenNameless(folder, mode)) return NewFile(folder, std::move(file), {});
-  return CreateHidden(folder, mode);
+  return CreateHidden(folder, hiddenMode);
 }
 
 Result<NewFile> NewFile::CreateHidden(int folder, mode_t mode) {
@@ -72,8 +72,9 @@ NewFile::~NewFile() {
   if (file_ && !hiddenName_.empty()) ::unlinkat(folder_, hiddenName_.c_str(), 0);
 }
 
-Status NewFile::Publish(const char* name) {
-  if (Status flushed = Flush(file_.Get()); !flushed) return flushed;
+Status NewFile::Publish(const char* name, Closing closing) {
+  const Status flushed = closing == Closing::kMayFail ? Flush(file_.Get()) : Status();
+  if (!flushed) return flushed;
   const Status published =
       hiddenName_.empty() ? LinkNameless(file_.Get(), folder_, name)
                           : RenameWithoutReplacing(folder_, hiddenName_.c_str(), folder_, name);

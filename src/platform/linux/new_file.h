@@ -21,8 +21,13 @@ Status Flush(int file);
 /// published it goes away with this object.
 class NewFile {
  public:
+  /// Whether closing the file can show an error that writing to it did not.
+  enum class Closing { kMayFail, kCannotFail };
+
   /// In a folder that must stay open as long as this object lives.
-  static Result<NewFile> Create(int folder, mode_t mode);
+  static Result<NewFile> Create(int folder, mode_t mode) { return Create(folder, mode, mode); }
+  /// With another mode where it has a hidden name, under which others might open it.
+  static Result<NewFile> Create(int folder, mode_t mode, mode_t hiddenMode);
   /// The same with a hidden name everywhere: a file without a name cannot replace another.
   static Result<NewFile> CreateHidden(int folder, mode_t mode);
 
@@ -35,7 +40,7 @@ class NewFile {
   int Descriptor() const { return file_.Get(); }
   /// Gives it its name, once, and never in the place of another item: kItemExists. An error that
   /// only closing shows is found before that.
-  Status Publish(const char* name);
+  Status Publish(const char* name, Closing closing = Closing::kMayFail);
   /// Puts a hidden file in the place of what has the name, once and in one step. A link is replaced
   /// and not written through.
   Status Replace(const char* name);

@@ -124,7 +124,9 @@ Result<std::string> TrashFolder::TakeIn(
     if (!kept) return kept;
     const Status moved = move(kept.Value());
     if (moved) return kept;
-    Forget(kept.Value());
+    // A copy whose source was replaced meanwhile stays: it may be the last there is.
+    const bool isReplaced = moved.Reason() == ErrorFromErrno(ESTALE);
+    if (!isReplaced || !IsThere(files_.Get(), kept.Value())) Forget(kept.Value());
     if (moved.Reason() == kItemExists) continue;
     --number;  // The name is free again.
     return moved.Reason();
