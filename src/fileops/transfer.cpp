@@ -75,6 +75,18 @@ OrbResult Prepare(const TransferForm& form,
   return FindDestination(request, destination);
 }
 
+/// Nothing goes for an item that cannot come.
+OrbResult MakeWay(const TransferForm& form,
+                  const std::string& source,
+                  const std::string& destination) {
+  if (form.existing == Existing::kKept) return kOrbNoErr;
+  if (form.work == Work::kMove) {
+    const OrbResult movable = ExpectMovableTo(source, destination);
+    if (Failed(movable)) return movable;
+  }
+  return RemoveExistingDestination(source, destination, Alike::kByTextToo);
+}
+
 template <typename Worker>
 Outcome Run(const std::string& source,
             const std::string& destination,
@@ -92,10 +104,7 @@ OrbResult Transfer(const TransferForm& form, const TransferRequest& request) {
   std::string destination;
   const OrbResult prepared = Prepare(form, request, *source, &destination);
   if (Failed(prepared)) return prepared;
-  if (form.existing == Existing::kRemoved) {
-    const OrbResult free = RemoveExistingDestination(*source, destination, Alike::kByTextToo);
-    if (Failed(free)) return free;
-  }
+  if (const OrbResult free = MakeWay(form, *source, destination); Failed(free)) return free;
   const Outcome outcome = form.work == Work::kCopy
                               ? Run<OrbCopyPath>(*source, destination, request)
                               : Run<OrbMovePath>(*source, destination, request);

@@ -75,6 +75,11 @@ OrbResult ExpectMovable(const std::string& source) {
   return FileOperationResult(platform::ExpectMovable(source));
 }
 
+OrbResult ExpectMovableTo(const std::string& source, const std::string& destination) {
+  if (!platform::Items::Current().Exists(destination)) return kOrbNoErr;
+  return FileOperationResult(platform::ExpectMovableTo(source, destination));
+}
+
 OrbResult OrbCheckCopyTarget(const COrbStringData& source, const COrbStringData& destination) {
   if (OrbPathCompareNoCase(source, destination) == 0) return kOrbErrSamePath;
   return OrbIsSubFolder(source, destination) ? kOrbErrInsideSource : kOrbNoErr;
@@ -87,7 +92,8 @@ OrbResult RemoveExistingDestination(const std::string& source,
   const auto entangled = IsEntangled(source, destination, alike);
   if (!entangled) return kOrbErrAccessDenied;  // What cannot be told apart is not removed.
   if (entangled.Value()) return kOrbErrInsideSource;
-  return platform::RemoveItem(destination) ? kOrbNoErr : kOrbErrAccessDenied;
+  const bool removed = platform::ExpectRemovable(destination) && platform::RemoveItem(destination);
+  return removed ? kOrbNoErr : kOrbErrAccessDenied;
 }
 
 OrbResult ConsiderSpace(const Outcome& failed, LowSpace lowSpace, const COrbFilePath& folder) {

@@ -18,6 +18,9 @@ namespace orb {
 /// and devices; what is locked, or may not be taken out of its folder.
 OrbResult ExpectCopyable(const std::string& source);
 OrbResult ExpectMovable(const std::string& source);
+/// The same for what only shows when something is in the way: a folder cannot leave its volume as a
+/// whole.
+OrbResult ExpectMovableTo(const std::string& source, const std::string& destination);
 
 /// By the texts alone: kOrbErrSamePath when both are one, kOrbErrInsideSource when the destination
 /// lies inside the source.
@@ -29,7 +32,7 @@ enum class Alike { kByTextToo, kOnDisk };
 /// Makes way at a destination where something exists. kOrbErrInsideSource, and nothing is removed,
 /// when it is the source, a folder above it or something inside it, as the texts say or as the file
 /// system knows it: the same item may be reached through a linked folder, through ".." or in other
-/// letters' case. kOrbErrAccessDenied when it cannot be removed.
+/// letters' case. kOrbErrAccessDenied when it cannot be removed, also for something locked inside.
 OrbResult RemoveExistingDestination(const std::string& source,
                                     const std::string& destination,
                                     Alike alike);

@@ -16,7 +16,6 @@
 namespace orb::platform {
 namespace {
 
-constexpr int kAnyHandle = O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
 constexpr std::size_t kPiece = 65536;
 /// Room for a file that shows no size, as those of /proc do, and to notice the end of others.
 constexpr std::size_t kSpareRoom = 4096;
@@ -54,7 +53,7 @@ FileHandle::FileHandle(FileHandle&&) noexcept = default;
 FileHandle::~FileHandle() = default;
 
 Result<FileHandle> FileHandle::Open(const std::string& path, int flags) {
-  UniqueFd file(Retry([&] { return ::open(path.c_str(), flags); }));
+  UniqueFd file = OpenFile(AT_FDCWD, path.c_str(), flags);
   if (!file) return errno == ELOOP || errno == ENXIO ? kNotPermitted : LastError();
   auto state = std::make_unique<State>();
   if (::fstat(file.Get(), &state->status) != 0) return LastError();
@@ -65,12 +64,12 @@ Result<FileHandle> FileHandle::Open(const std::string& path, int flags) {
 
 Result<FileHandle> FileHandle::OpenForReading(const std::string& path) {
   const ErrnoKeeper errnoKeeper;
-  return Open(path, O_RDONLY | kAnyHandle);
+  return Open(path, O_RDONLY);
 }
 
 Result<FileHandle> FileHandle::OpenForWriting(const std::string& path) {
   const ErrnoKeeper errnoKeeper;
-  auto handle = Open(path, O_WRONLY | O_NOFOLLOW | kAnyHandle);
+  auto handle = Open(path, O_WRONLY | O_NOFOLLOW);
   if (!handle) return handle;
   const Status open = RefuseLocked(handle.Value().state_->file.Get());
   return open ? std::move(handle) : open.Reason();

@@ -9,6 +9,7 @@
 
 #include "platform/linux/file_data.h"
 #include "platform/linux/item_metadata.h"
+#include "platform/linux/place.h"
 #include "platform/linux/posix.h"
 
 namespace orb::platform {
@@ -33,8 +34,7 @@ FileWriter::~FileWriter() = default;
 
 Result<FileWriter> FileWriter::Open(const std::string& path) {
   const ErrnoKeeper errnoKeeper;
-  constexpr int kFlags = O_WRONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
-  UniqueFd file(Retry([&] { return ::open(path.c_str(), kFlags); }));
+  UniqueFd file = OpenFile(AT_FDCWD, path.c_str(), O_WRONLY);
   if (!file) return errno == ENXIO ? kNotPermitted : LastError();  // A pipe that nobody reads.
   struct stat status;
   if (::fstat(file.Get(), &status) != 0) return LastError();

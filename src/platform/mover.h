@@ -23,9 +23,11 @@ namespace orb::platform {
 /// fails before the source is removed, the item is where it was.
 Status MoveItem(const std::string& source, const std::string& destination);
 
-/// Whether MoveItem() can take the source out of its folder, for those who make way for it first:
-/// the failure it would end with when there is no source, it or its folder is locked, or the caller
-/// may not change the folder.
+/// For those who make way for a source first: the failure that MoveItem() would end with when there
+/// is no source, it or its folder is locked, or the caller may not change the folder.
 Status ExpectMovable(const std::string& source);
+/// The same for a source that cannot go to the volume of the destination: it cannot be read, or is
+/// a folder that holds something locked or a volume of its own.
+Status ExpectMovableTo(const std::string& source, const std::string& destination);
 
 }  // namespace orb::platform

@@ -11,6 +11,7 @@
 #include "platform/linux/removal_at.h"
 #include "platform/linux/rename.h"
 #include "platform/linux/spelling.h"
+#include "platform/linux/tree_survey.h"
 
 namespace orb::platform {
 namespace {
@@ -57,14 +58,45 @@ Result<Place> LocateDestination(const std::string& path, const Place& source) {
   return open ? std::move(place) : open.Reason();
 }
 
+/// What a copy to another volume, and the removal after it, ask of an item.
+Status ExpectCrossing(const Place& from, mode_t mode) {
+  const int folder = from.folder.Get();
+  if (S_ISLNK(mode)) return {};
+  if (!S_ISDIR(mode) && !S_ISREG(mode)) return kNotPermitted;
+  if (::faccessat(folder, from.name.c_str(), R_OK, AT_EACCESS) != 0) return LastError();
+  if (S_ISREG(mode)) return {};
+  const auto survey = SurveyTree(folder, from.name, SurveyFor::kRemoval);
+  if (!survey) return survey.Reason();
+  return survey.Value().canBeRemoved ? Status() : kNotPermitted;
+}
+
 }  // namespace
 
 Status ExpectMovable(const std::string& source) {
   const ErrnoKeeper errnoKeeper;
-  const auto place = LocateSource(source);
+  const auto place = LocateRemovable(source);
   if (!place) return place.Reason();
   const int folder = place.Value().folder.Get();
+  const char* name = place.Value().name.c_str();
+  const UniqueFd item(
+      Retry([&] { return ::openat(folder, name, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
+  if (!item) return LastError();
+  if (Status open = RefuseLocked(item.Get()); !open) return open;
   return ::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) == 0 ? Status() : Status(LastError());
+}
+
+Status ExpectMovableTo(const std::string& source, const std::string& destination) {
+  const ErrnoKeeper errnoKeeper;
+  const auto from = Locate(source);
+  if (!from) return from.Reason();
+  const auto status = ReadStatus(from.Value());
+  if (!status) return status.Reason();
+  const auto to = Locate(destination);
+  if (!to) return to.Reason();
+  const auto folder = IdentityOf(to.Value().folder.Get());
+  if (!folder) return folder.Reason();
+  const bool stays = folder.Value().device == status.Value().st_dev;
+  return stays ? Status() : ExpectCrossing(from.Value(), status.Value().st_mode);
 }
 
 Status MoveItem(const std::string& source, const std::string& destination) {

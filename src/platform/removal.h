@@ -14,6 +14,10 @@ namespace orb::platform {
 /// it; what was removed before is gone.
 Status RemoveItem(const std::string& path);
 
+/// kNotPermitted for a folder with something inside that RemoveItem() would stop at with a part of
+/// the folder gone: a locked item, a volume of its own. Only that is looked for.
+Status ExpectRemovable(const std::string& path);
+
 /// Removes one entry that is not a folder, under the same rules.
 Status UnlinkItem(const std::string& path);
 

@@ -16,6 +16,7 @@
 #include "platform/linux/folder_stream.h"
 #include "platform/linux/item_metadata.h"
 #include "platform/linux/removal_at.h"
+#include "platform/linux/tree_survey.h"
 
 namespace orb::platform {
 namespace {
@@ -209,6 +210,18 @@ Status RemoveItem(const std::string& path) {
   const auto place = LocateRemovable(path);
   if (!place) return place.Reason();
   return RemoveItemAt(place.Value().folder.Get(), place.Value().name);
+}
+
+Status ExpectRemovable(const std::string& path) {
+  const ErrnoKeeper errnoKeeper;
+  const auto place = Locate(path);
+  if (!place) return place.Reason();
+  const auto status = ReadStatus(place.Value());
+  if (!status) return status.Reason();
+  if (!S_ISDIR(status.Value().st_mode)) return {};
+  const auto survey =
+      SurveyTree(place.Value().folder.Get(), place.Value().name, SurveyFor::kRemoval);
+  return !survey || survey.Value().canBeRemoved ? Status() : kNotPermitted;
 }
 
 Status UnlinkItem(const std::string& path) {

@@ -151,6 +151,7 @@ TEST_P(FolderForms, ReplaceWhatIsThereOrLeaveIt) {
 
 TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
   folder_.Make("link -> tree, to/old=old, locked!, pipe|, pinned/file, pinned/!");
+  folder_.Make("to/full/a, to/full/b!, to/full/c");
   const Unchanged unchanged(folder_.Path());
   EXPECT_EQ(RunHere("missing", "to", "old"), row_.missing);
   EXPECT_EQ(Run("", folder_ / "to", "old"), row_.missing);
@@ -166,6 +167,7 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
   // What is in the source, on disk, is not removed for a move or copy that cannot succeed.
   const OrbResult doomed = row_.existing == 0 ? kInside : kUnknown;
   EXPECT_EQ(RunHere("tree", "link/sub", "old"), doomed);
+  EXPECT_EQ(RunHere("file", "to", "full"), row_.existing == 0 ? kDenied : kUnknown);
   for (const std::string name : {"", ".", "..", "/", "//", "../", "to/.."}) {
     const bool isLetter = row_.form == std::string("MoveFile") && name.find('/') != name.npos;
     if (!isLetter) {
@@ -274,6 +276,17 @@ TEST(FormsWithoutAName, AreNotSupported) {
   EXPECT_EQ(OrbCopyFolderEx(from, to, Progress::Call, &progress), kOrbErrNotSupported);
   EXPECT_EQ(progress.calls, 0);
   EXPECT_FALSE(tree.Has("b"));
+}
+
+TEST(MoveFileOverwrite, MakesNoWayForAnImmutableItem) {
+  const Tree tree("to/name=old, file");
+  if (std::system(("chattr +i " + (tree / "file") + " 2>/dev/null").c_str()) != 0)
+    GTEST_SKIP() << "no such flag here";
+  const COrbStringData name = S("name");
+  EXPECT_EQ(OrbMoveFileOverwrite(PathOf(tree / "file"), PathOf(tree / "to"), &name, nullptr),
+            kDenied);
+  EXPECT_EQ(tree.Read("to/name"), "old");
+  EXPECT_EQ(std::system(("chattr -i " + (tree / "file")).c_str()), 0);
 }
 
 }  // namespace

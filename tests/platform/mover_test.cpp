@@ -88,6 +88,9 @@ TEST(MoveItem, BringsFilesLinksAndTreesToAnotherVolume) {
     EXPECT_EQ(Describe(tree / "b/tree"), before);
     EXPECT_EQ(NamesIn(tree / "b"), (Names{"taken", "tree"}));
     EXPECT_EQ(NamesIn(tree / "a"), Names());
+    ASSERT_TRUE(MakeChain(tree / "a", 2100));  // Deeper than a path can tell.
+    EXPECT_EQ(Move(tree / "a/d", tree / "b/d"), kDone);
+    EXPECT_EQ(ChainDepth(tree / "b"), 2101);
     EXPECT_EQ(OpenDescriptors(), descriptors);
   }));
 }
@@ -107,7 +110,9 @@ TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
       {"a/tree/locked!", 0, "a/tree", "b/tree", kNotPermitted},
       {"a/tree/locked!", 0, "a/tree/locked", "b/file", kNotPermitted},
       {"a/tree/pipe|", 0, "a/tree", "b/tree", kNotPermitted},
+      {"a/tree/pipe|", 0, "a/tree/pipe", "b/file", kNotPermitted},
       {"a/tree/secret 0600", kStranger, "a/tree", "b/tree", kNotPermitted},
+      {"a/tree/secret 0600", kStranger, "a/tree/secret", "b/file", kNotPermitted},
   };
   for (const auto& c : kCases) {
     SCOPED_TRACE(c.obstacle + c.from + " to " + c.to);
@@ -118,6 +123,11 @@ TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
       ASSERT_EQ(::chown((tree / "a/tree").c_str(), c.user, c.user), 0);
       const Unchanged unchanged(tree / "a");
       ASSERT_EQ(::seteuid(c.user), 0);
+      // What makes way for the item asks before.
+      const bool isObstacle = c.from != "a/tree" && c.obstacle.starts_with(c.from);
+      const bool foreseen = c.user != 0 || c.obstacle.ends_with('!') || isObstacle;
+      const std::string from = tree / c.from;
+      EXPECT_EQ(ExpectMovable(from) && ExpectMovableTo(from, tree / "b/new"), !foreseen);
       EXPECT_EQ(Move(tree / c.from, tree / c.to), c.expected);
       ASSERT_EQ(::seteuid(0), 0);
       for (const std::string volume : {"b", "small"}) {

@@ -5,6 +5,8 @@
 #include <thread>
 
 #include "platform/copier.h"
+#include "platform/file_handle.h"
+#include "platform/file_writer.h"
 #include "support/files.h"
 
 namespace orb::platform {
@@ -37,6 +39,9 @@ TEST(Streams, WaitForAFileThatIsLeased) {
   const auto body = [&] {
     lease([&] { EXPECT_TRUE(InputStream::Open(tree / "photo")); });
     lease([&] { EXPECT_TRUE(OutputStream::Append(tree / "photo")); });
+    lease([&] { EXPECT_TRUE(FileHandle::OpenForReading(tree / "photo")); });
+    lease([&] { EXPECT_TRUE(FileHandle::OpenForWriting(tree / "photo")); });
+    lease([&] { EXPECT_TRUE(FileWriter::Open(tree / "photo")); });
     lease([&] { EXPECT_TRUE(CopyItem(tree / "photo", tree / "copy")); });
   };
   ORB_IN_CHILD(RunInChild([] { return ::signal(SIGIO, SIG_IGN) != SIG_ERR; }, body));

@@ -18,7 +18,7 @@
 /// read, and for a socket, pipe or device. Nor is anything removed when the destination
 /// is the source, one of its folders or something inside it, by its text or on disk:
 /// kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed; a folder may then have lost
-/// some of its content.
+/// some of its content, unless something in it is locked.
 ///
 /// Every form may give kOrbErrAccessDenied for a source that is not valid UTF-8, and forms that
 /// take a folder and a name kOrbErrInvalidName for a name that is, or whose last component is, "",
@@ -63,8 +63,8 @@ ORB_EXPORT OrbResult OrbCopyFile(const COrbFilePath& source,
 /// kOrbErrEmptyPath for an empty folder; the codes of OrbMakeFilePath; kOrbErrCanceled;
 /// kOrbErrSamePath when source and destination are one file, under whichever names;
 /// kOrbErrNotFound, kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrInvalidName, kOrbErrFileExists
-/// (somebody else made the destination meanwhile) and kOrbErrUnknown for what failed. A source that
-/// is empty or does not exist copies nothing, makes nothing and gives 0.
+/// (somebody else made the destination meanwhile) and kOrbErrUnknown for what failed. An empty
+/// source makes an empty destination; one that does not exist makes nothing and gives 0.
 ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
                                    const COrbFilePath& folder,
                                    const COrbStringData& name,

@@ -19,7 +19,8 @@
 /// nothing is removed, when it is empty or not there; kOrbErrAccessDenied for a locked one and for
 /// one that may not be taken out of its folder. Nor is anything removed when the destination is the
 /// source, one of its folders or something inside it, by its text or on disk: kOrbErrInsideSource.
-/// kOrbErrAccessDenied when it cannot be removed; a folder may then have lost some of its content.
+/// kOrbErrAccessDenied when it cannot be removed; a folder may then have lost some of its content,
+/// unless something in it is locked.
 ///
 /// Forms that take a folder give kOrbErrSamePath when it is the source and kOrbErrInsideSource when
 /// it lies inside it, by their texts; kOrbErrAccessDenied for a source that is not valid UTF-8;

@@ -6,11 +6,13 @@
 
 #include <functional>
 #include <optional>
+#include <string_view>
 #include <utility>
 #include <vector>
 
 #include "platform/linux/folder_stream.h"
 #include "platform/linux/item_metadata.h"
+#include "platform/linux/place.h"
 #include "platform/linux/posix.h"
 
 namespace orb::platform {
@@ -19,47 +21,68 @@ namespace {
 
 /// Of the units in which the kernel counts.
 constexpr std::uint64_t kBlock = 512;
+/// How many levels of a tree are held open at once.
+constexpr std::size_t kOpenLevels = 32;
+
+std::uint64_t HashOf(std::uint64_t folder, std::string_view name) {
+  return std::hash<std::string>()(std::to_string(folder).append(name));
+}
 
 /// Sums of these do not depend on the order in which a folder is listed.
-std::uint64_t StateOf(std::string entry, const struct stat& status) {
+std::uint64_t StateOf(std::uint64_t path, const struct stat& status) {
   for (const auto value : {status.st_size,
                            status.st_mtim.tv_sec,
                            status.st_mtim.tv_nsec,
                            status.st_ctim.tv_sec,
                            status.st_ctim.tv_nsec})
-    entry.append(1, '/').append(std::to_string(value));
-  return std::hash<std::string>()(entry);
+    path = HashOf(path, std::to_string(value));
+  return path;
 }
 
+struct Level {
+  UniqueFd folder;
+  Identity identity;
+  std::uint64_t path = 0;
+  /// The folders in it that are still to be entered.
+  std::vector<std::string> pending;
+};
+
+/// Goes through a tree level by level, in a loop of its own stack so that no depth is too deep.
+/// Levels far above the current one are closed meanwhile and found again through "..".
 class Surveyor {
  public:
-  Surveyor(int folder, SurveyFor purpose) : folder_(folder), purpose_(purpose) {}
+  explicit Surveyor(SurveyFor purpose) : purpose_(purpose) {}
 
-  Result<TreeSurvey> Survey(const std::string& name) {
-    if (Status visited = Visit(name); !visited) return visited.Reason();
-    while (!pending_.empty()) {
-      const std::string path = std::move(pending_.back());
-      pending_.pop_back();
-      if (Status entered = VisitEntries(path); !entered) return entered.Reason();
+  Result<TreeSurvey> Survey(int folder, const std::string& name) {
+    const auto isFolder = Visit(folder, name.c_str(), 0);
+    if (!isFolder) return isFolder.Reason();
+    if (isFolder.Value()) {
+      if (Status entered = Enter(folder, name, 0); !entered) return entered.Reason();
+    }
+    while (!levels_.empty()) {
+      if (Status done = Proceed(); !done) return done.Reason();
     }
     return survey_;
   }
 
  private:
-  Status Visit(const std::string& path) {
+  /// Whether it is a folder.
+  Result<bool> Visit(int folder, const char* name, std::uint64_t path) {
     struct stat status;
-    if (::fstatat(folder_, path.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) return LastError();
+    if (::fstatat(folder, name, &status, AT_SYMLINK_NOFOLLOW) != 0) return LastError();
     if (!device_) device_ = status.st_dev;
     survey_.bytes += static_cast<std::uint64_t>(status.st_blocks) * kBlock;
     survey_.canBeRemoved &= status.st_dev == *device_;
-    survey_.state += StateOf(path, status);
-    if (S_ISDIR(status.st_mode)) pending_.push_back(path);
-    return purpose_ == SurveyFor::kRemoval ? LookForLock(path) : Status();
+    survey_.state += StateOf(HashOf(path, name), status);
+    if (purpose_ == SurveyFor::kRemoval) {
+      if (Status looked = LookForLock(folder, name); !looked) return looked.Reason();
+    }
+    return S_ISDIR(status.st_mode);
   }
 
-  Status LookForLock(const std::string& path) {
+  Status LookForLock(int folder, const char* name) {
     constexpr int kFlags = O_PATH | O_NOFOLLOW | O_CLOEXEC;
-    const UniqueFd item(Retry([&] { return ::openat(folder_, path.c_str(), kFlags); }));
+    const UniqueFd item(Retry([&] { return ::openat(folder, name, kFlags); }));
     if (!item) return LastError();
     const Result<bool> locked = IsLocked(item.Get());
     if (!locked) return locked.Reason();
@@ -73,32 +96,62 @@ class Surveyor {
     survey_.canBeRemoved &= ::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) == 0;
   }
 
-  Status VisitEntries(const std::string& path) {
+  Status Proceed() {
+    Level& level = levels_.back();
+    if (level.pending.empty()) return Leave();
+    const std::string name = std::move(level.pending.back());
+    level.pending.pop_back();
+    return Enter(level.folder.Get(), name, level.path);
+  }
+
+  Status Enter(int above, const std::string& name, std::uint64_t path) {
     constexpr int kFlags = O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
-    auto entries = FolderStream::Open(
-        UniqueFd(Retry([&] { return ::openat(folder_, path.c_str(), kFlags); })));
+    UniqueFd folder(Retry([&] { return ::openat(above, name.c_str(), kFlags); }));
+    if (!folder) return LastError();
+    const auto identity = IdentityOf(folder.Get());
+    if (!identity) return identity.Reason();
+    levels_.push_back({std::move(folder), identity.Value(), HashOf(path, name), {}});
+    if (levels_.size() > kOpenLevels) levels_[levels_.size() - 1 - kOpenLevels].folder.Reset();
+    return VisitEntries(&levels_.back());
+  }
+
+  Status VisitEntries(Level* level) {
+    constexpr int kFlags = O_RDONLY | O_DIRECTORY | O_CLOEXEC;
+    const int folder = level->folder.Get();
+    auto entries =
+        FolderStream::Open(UniqueFd(Retry([&] { return ::openat(folder, ".", kFlags); })));
     if (!entries) return entries.Reason();
     for (bool isFirst = true;; isFirst = false) {
       const auto entry = entries.Value().Next();
       if (!entry) return entry.Reason();
       if (entry.Value().name == nullptr) return {};
-      if (isFirst) LookForPermission(entries.Value().Descriptor());
-      const Status visited = Visit(path + '/' + entry.Value().name);
-      if (!visited) return visited;
+      if (isFirst) LookForPermission(folder);
+      const auto isFolder = Visit(folder, entry.Value().name, level->path);
+      if (!isFolder) return isFolder.Reason();
+      if (isFolder.Value()) level->pending.emplace_back(entry.Value().name);
     }
   }
 
-  const int folder_;
+  Status Leave() {
+    const Level left = std::move(levels_.back());
+    levels_.pop_back();
+    if (levels_.empty() || levels_.back().folder) return {};
+    auto above = OpenAbove(left.folder.Get(), levels_.back().identity);
+    if (!above) return above.Reason();
+    levels_.back().folder = std::move(above).Value();
+    return {};
+  }
+
   const SurveyFor purpose_;
   TreeSurvey survey_;
   std::optional<dev_t> device_;
-  std::vector<std::string> pending_;  // Folders that were seen and not entered yet.
+  std::vector<Level> levels_;
 };
 
 }  // namespace
 
 Result<TreeSurvey> SurveyTree(int folder, const std::string& name, SurveyFor purpose) {
-  return Surveyor(folder, purpose).Survey(name);
+  return Surveyor(purpose).Survey(folder, name);
 }
 
 }  // namespace orb::platform

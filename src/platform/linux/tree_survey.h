@@ -23,7 +23,7 @@ struct TreeSurvey {
 enum class SurveyFor { kSize, kRemoval };
 
 /// Looks at the item at `name` in an open folder and, without following links, at all below it.
-/// kSize asks for the size alone. Fails for a tree that is deeper than a path can tell.
+/// kSize does not ask whether it can be removed.
 Result<TreeSurvey> SurveyTree(int folder, const std::string& name, SurveyFor purpose);
 
 }  // namespace orb::platform
