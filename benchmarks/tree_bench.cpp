@@ -4,6 +4,7 @@
 #include <orb/fileops/copy.h>
 #include <orb/fileops/remove.h>
 #include <sys/stat.h>
+#include <sys/xattr.h>
 #include <unistd.h>
 
 #include <array>
@@ -15,6 +16,9 @@
 
 #include "scratch_volume.h"
 
+#ifdef ORB_BENCH_GLIB  // Before Qt, whose macros its names meet.
+#include <gio/gio.h>
+#endif
 #ifdef ORB_BENCH_QT
 #include <QDir>
 #include <QFile>
@@ -192,6 +196,50 @@ bool CopyStd(const ScratchVolume& volume, benchmark::State& state) {
   });
 }
 
+/// Nothing but the system calls that a file with its times costs, for what these calls bound.
+bool CopyBare(const fs::path& source, const fs::path& copy, bool inPlace) {
+  const int from = ::open(source.c_str(), O_RDONLY | O_NOATIME | O_CLOEXEC);
+  struct statx status {};
+  ::statx(from, "", AT_EMPTY_PATH, STATX_BASIC_STATS | STATX_BTIME, &status);
+  const int to = inPlace ? ::open(copy.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0644)
+                         : ::open(copy.parent_path().c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0644);
+  std::array<char, kSmallFile> block;
+  const ssize_t count = ::read(from, block.data(), block.size());
+  bool done = count > 0 && ::write(to, block.data(), block.size()) == count;
+  done = done && ::fsetxattr(to, "user.orb.bench", "1400000000 123456789", 20, 0) == 0;
+  const timespec times[2] = {{status.stx_atime.tv_sec, status.stx_atime.tv_nsec},
+                             {status.stx_mtime.tv_sec, status.stx_mtime.tv_nsec}};
+  done = done && ::futimens(to, times) == 0;
+  if (!inPlace) done = done && ::linkat(to, "", AT_FDCWD, copy.c_str(), AT_EMPTY_PATH) == 0;
+  ::close(to);
+  ::close(from);
+  return done;
+}
+
+bool CopyTreeBare(const ScratchVolume& volume, benchmark::State& state, bool inPlace) {
+  return RunHere(state, [&] {
+    const fs::path copy = volume / "copy";
+    bool done = fs::create_directory(copy);
+    for (const auto& folder : fs::directory_iterator(volume / "source")) {
+      const fs::path below = copy / folder.path().filename();
+      done = done && fs::create_directory(below);
+      for (const auto& file : fs::directory_iterator(folder))
+        done = done && CopyBare(file.path(), below / file.path().filename(), inPlace);
+    }
+    return done;
+  });
+}
+
+/// A file is seen before it is complete, and half of it stays when the process is killed.
+bool CopyTreeInPlace(const ScratchVolume& volume, benchmark::State& state) {
+  return CopyTreeBare(volume, state, true);
+}
+
+/// Complete or absent, as ours.
+bool CopyTreeNameless(const ScratchVolume& volume, benchmark::State& state) {
+  return CopyTreeBare(volume, state, false);
+}
+
 bool GoOn(void* calls) {
   ++*static_cast<int*>(calls);
   return true;
@@ -263,6 +311,20 @@ bool RemoveQt(const ScratchVolume& volume, benchmark::State& state) {
 }
 #endif
 
+#ifdef ORB_BENCH_GLIB
+bool CopyGio(const ScratchVolume& volume, benchmark::State& state) {
+  return RunHere(state, [&] {
+    GFile* source = g_file_new_for_path((volume / "source").c_str());
+    GFile* copy = g_file_new_for_path((volume / "copy").c_str());
+    const gboolean copied =
+        g_file_copy(source, copy, G_FILE_COPY_ALL_METADATA, nullptr, nullptr, nullptr, nullptr);
+    g_object_unref(source);
+    g_object_unref(copy);
+    return copied != FALSE;
+  });
+}
+#endif
+
 #ifdef ORB_BENCH_BOOST
 bool CopyBoost(const ScratchVolume& volume, benchmark::State& state) {
   return RunHere(state, [&] {
@@ -284,6 +346,8 @@ bool RemoveBoost(const ScratchVolume& volume, benchmark::State& state) {
 
 const std::vector<Row> kTreeCopies = {
     {"Orb", CopyTreeOrb},
+    {"limit-in-place", CopyTreeInPlace},
+    {"limit-nameless", CopyTreeNameless},
     {"cp", CopyCp},
     {"std", CopyStd},
 #ifdef ORB_BENCH_BOOST
@@ -297,6 +361,9 @@ const std::vector<Row> kFileCopies = {
     {"std", CopyStd},
 #ifdef ORB_BENCH_QT
     {"Qt", CopyQt},
+#endif
+#ifdef ORB_BENCH_GLIB
+    {"GIO", CopyGio},
 #endif
 #ifdef ORB_BENCH_BOOST
     {"Boost", CopyBoost},

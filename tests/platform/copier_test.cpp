@@ -66,6 +66,7 @@ TEST(CopyItem, KeepsWhatLiesBesideTheContent) {
   ASSERT_TRUE(SetLock(source, true));
   ASSERT_TRUE(CopyItem(source, tree / "to/source"));
   EXPECT_EQ(StatusOf(tree / "to/source").st_atim.tv_nsec, 123456789);
+  EXPECT_EQ(StatusOf(source).st_atim.tv_nsec, 123456789);  // Copying is no use of the source.
   EXPECT_EQ(Describe(tree / "to"), Describe(tree / "from"));
   EXPECT_EQ(Items::Current().Read(tree / "to/source").Value().created.seconds, 1000000000);
   ASSERT_TRUE(CopyItem(tree / "bits", tree / "mine"));

@@ -123,7 +123,7 @@ TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
       ASSERT_EQ(::chown((tree / "a/tree").c_str(), c.user, c.user), 0);
       const Unchanged unchanged(tree / "a");
       ASSERT_EQ(::seteuid(c.user), 0);
-      // What makes way for the item asks before.
+      // What makes way for the item asks before. It does not look for pipes in a tree.
       const bool isObstacle = c.from != "a/tree" && c.obstacle.starts_with(c.from);
       const bool foreseen = c.user != 0 || c.obstacle.ends_with('!') || isObstacle;
       const std::string from = tree / c.from;
