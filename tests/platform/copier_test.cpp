@@ -200,8 +200,10 @@ TEST(CopyItem, LeavesCompleteCopiesOrNoneWhenTheProcessIsKilled) {
   for (int round = 0; round < 12 || (round < 99 && fs::is_empty(tree / "to")); ++round) {
     const pid_t child = ::fork();
     ASSERT_GE(child, 0);
-    for (int i = 0; child == 0; ++i)
-      (void)CopyItem(source, tree / "to/" + std::to_string(round * 10000 + i % 4));
+    if (child == 0) {
+      for (int i = 0;; ++i)
+        (void)CopyItem(source, tree / "to/" + std::to_string(round * 10000 + i % 4));
+    }
     std::this_thread::sleep_for(std::chrono::milliseconds(3 + round * 2));
     ::kill(child, SIGKILL);
     ASSERT_EQ(::waitpid(child, nullptr, 0), child);
