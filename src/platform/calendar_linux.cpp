@@ -77,10 +77,14 @@ Block Survey(std::int64_t index) {
   std::int32_t offset = AskOffset(begin);
   block.offsets[0] = offset;
   for (std::int64_t at = begin; at < begin + kBlockLength; at += kProbeDistance) {
-    const std::int32_t next = AskOffset(at + kProbeDistance);
-    if (next == offset) continue;
-    AddChange(&block, FindChange(at, at + kProbeDistance, offset), next);
-    offset = next;
+    const std::int64_t end = at + kProbeDistance;
+    const std::int32_t next = AskOffset(end);
+    // A leap second may come with the zone's own change.
+    for (std::int64_t from = at; offset != next && from != end;) {
+      from = FindChange(from, end, offset);
+      offset = AskOffset(from);
+      AddChange(&block, from, offset);
+    }
   }
   return block;
 }
@@ -141,7 +145,12 @@ class TzEntry {
     if (environment_ == nullptr || environ != environment_) return false;
     // An environment that was emptied and filled again may be a shorter one in the same place.
     if (HasNull(environment_, position_)) return false;
-    return environ[position_] == entry_ && (entry_ == nullptr || environ[position_ + 1] == next_);
+    if (environ[position_] != entry_) return false;
+    return entry_ == nullptr || (environ[position_ + 1] == next_ && IsTz(entry_) == isSet_);
+  }
+
+  static bool IsTz(const char* entry) {
+    return std::strncmp(entry, kName.data(), kName.size()) == 0;
   }
 
   void Find() {
@@ -155,7 +164,7 @@ class TzEntry {
     position_ = position;
     entry_ = environment_[position];
     next_ = environment_[position + 1];
-    isSet_ = std::string_view(entry_).starts_with(kName);
+    isSet_ = IsTz(entry_);
   }
 
   char** environment_ = nullptr;
@@ -251,8 +260,11 @@ std::int64_t InstantFromLocal(const CivilTime& local) {
   const std::int32_t after = zone.Offset(seconds + kFarthestOffset);
   const std::int64_t early = seconds - before;
   if (before == after || zone.Offset(early) == before) return early;
-  const std::int64_t late = seconds - after;
-  return zone.Offset(late) == after ? late : early;
+  // With a leap second beside the change there is a third offset between the two.
+  for (const std::int32_t offset : {after, zone.Offset(early), zone.Offset(seconds - after)}) {
+    if (zone.Offset(seconds - offset) == offset) return seconds - offset;
+  }
+  return early;
 }
 
 }  // namespace orb::platform

@@ -28,9 +28,10 @@ COrbStringData TailFrom(const Utf8Text& text, std::size_t at) {
 }
 
 std::string_view Utf8Of(const COrbStringData& s) {
-  // Reading comes first: it gives a string without value one, whose length can then be asked.
+  // Reading comes first: it gives a string without value one, whose length can then be asked. There
+  // may be memory for the copy only when it is asked for again.
   const char* text = s.GetPtrUtf8();
-  return {text, s.GetLengthByteUtf8()};
+  return text == nullptr ? std::string_view() : std::string_view(text, s.GetLengthByteUtf8());
 }
 
 COrbStringData Joined(const COrbStringData& a, const COrbStringData& b) {

@@ -6,6 +6,13 @@
 #include <string>
 #include <vector>
 
+/// Must not make the compiler warn.
+static COrbStringData LastOf(const COrbStringData& a, const COrbStringData& b) {
+  std::vector<COrbStringData> list(3, a);
+  list.push_back(b);
+  return list.back();
+}
+
 int main(int, char** argv) {
   const COrbStringData path(OrbCharUtf8("/card/DCIM/IMG_0001.CR2"));
   std::vector<COrbStringData> pieces;
@@ -17,7 +24,7 @@ int main(int, char** argv) {
   const COrbCriticalSection lock;
   lock.Enter();
   lock.Leave();
-  const bool right = pieces.size() == 3 &&
+  const bool right = pieces.size() == 3 && !LastOf(path, pieces[0]).IsEmpty() &&
                      OrbPathFindExtensionType(path, false) == eOrbFileType_Cr2 &&
                      time.Initialize(2026, 11, 22, 9, 30, 5, 0, 0, 0) == kOrbNoErr &&
                      own.GetFileSize() > 0 && OrbIsSubFolder(pieces[0], pieces[0]);

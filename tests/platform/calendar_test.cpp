@@ -54,6 +54,8 @@ TEST(Calendar, AgreesWithTheSystemInEveryZone) {
     for (int i = 0; i < 3000; ++i) ExpectAgreement(anyInstant(random));
     for (std::int64_t at = 1'700'000'000; at < 1'732'000'000; at += 1799) ExpectAgreement(at);
   }
+  const TimeZone zone("right/Indian/Chagos");  // Went ahead an hour after a leap second.
+  for (std::int64_t at = 820'000'000; at < 820'800'000; at += 599) ExpectAgreement(at);
 }
 
 TEST(Calendar, SkippedAndRepeatedTimesHaveOneInstant) {
@@ -107,6 +109,11 @@ TEST(Calendar, NoticesAnotherZoneWhereverItStands) {
   entries[0] = tokyo;  // Emptied and filled again in the same place, TZ=UTC behind its end.
   entries[1] = nullptr;
   EXPECT_EQ(LocalFromInstant(0).hour, 9u);
+  entries[1] = utc;
+  EXPECT_EQ(LocalFromInstant(0).hour, 9u);
+  tokyo[0] = 'X';  // As the owner of an entry may write in it.
+  EXPECT_EQ(LocalFromInstant(0).hour, 0u);
+  tokyo[0] = 'T';
 
   for (std::size_t end = 1; end < 40; ++end) {
     std::vector<char*> many(40, other);

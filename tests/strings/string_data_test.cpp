@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: MIT
 #include <gtest/gtest.h>
 #include <orb/strings/string_data.h>
+#include <orb/strings/string_functions.h>
 
 #include <algorithm>
 #include <array>
 #include <atomic>
+#include <functional>
 #include <future>
 #include <memory>
 #include <new>
@@ -37,9 +39,24 @@ std::u16string UnitsOf(const COrbStringData& text) {
 
 // What the library makes without throwing are the locks of its texts, and this program uses the
 // library's own objects.
-void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept try {
   return areLocksScarce ? nullptr : ::operator new(size);
+} catch (const std::bad_alloc&) {
+  return nullptr;
 }
+
+#if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+/// So many blocks are to be had, then one is not. Below 0 all are.
+thread_local int blocksBeforeTheLostOne = -1;
+
+extern "C" {
+void* __libc_malloc(std::size_t size);  // NOLINT(bugprone-reserved-identifier)
+void* malloc(std::size_t size) {
+  const bool isLost = blocksBeforeTheLostOne >= 0 && blocksBeforeTheLostOne-- == 0;
+  return isLost ? nullptr : __libc_malloc(size);
+}
+}
+#endif
 
 namespace {
 
@@ -335,6 +352,38 @@ TEST(StringData, WithoutMemoryForACopyHasNone) {
   EXPECT_FALSE(late.HasValueUtf8());
   EXPECT_EQ(late.GetLengthChar(), 0U);
   EXPECT_STREQ(late.GetPtrUtf8(), "");
+}
+
+/// What finds no memory at one moment may find it at the next.
+TEST(StringData, OutlivesTheLossOfAnyBlock) {
+  const COrbStringData find{OrbCharUtf8("\xC3\xAF")};
+  COrbStringData made;
+  std::vector<COrbStringData> pieces;
+  using Operation = std::function<void(COrbStringData&)>;
+  const Operation kOperations[] = {
+      [&](COrbStringData& s) { made = s + find; },
+      [&](COrbStringData& s) { made = find + s; },
+      [&](COrbStringData& s) { s += s; },
+      [&](COrbStringData& s) { made = s.Mid(1, 3); },
+      [&](COrbStringData& s) { made = OrbStringDataStr(s, find); },
+      [&](COrbStringData& s) { made = OrbStringDataReplace(s, find, s); },
+      [&](COrbStringData& s) { made = OrbStringDataUpper(s); },
+      [&](COrbStringData& s) { OrbStringDataSplit(s, find, &pieces); },
+      [](COrbStringData& s) { CFRelease(s.CreateCopyCFString()); },
+  };
+  for (const Operation& operation : kOperations) {
+    for (int lost = 0; lost < 8; ++lost) {
+      COrbStringData text{OrbCharUnicode(Units(u"na\u00EFve"))};
+      const COrbStringData copy(text);
+      blocksBeforeTheLostOne = lost;
+      try {
+        operation(text);
+      } catch (const std::bad_alloc&) {  // May be said, too.
+      }
+      blocksBeforeTheLostOne = -1;
+      EXPECT_EQ(Text(copy), "na\xC3\xAFve");
+    }
+  }
 }
 #endif
 

@@ -229,8 +229,10 @@ inline void COrbStringData::Share(const COrbStringData& other) {
   }
   COrbStringData* const behind = other.next.load(std::memory_order_relaxed);
   value = theirs;
-  prev.store(const_cast<COrbStringData*>(&other), std::memory_order_relaxed);
-  next.store(behind, std::memory_order_relaxed);
+  // Nobody else reads these yet: made anew and not stored to, for which the compiler would warn a
+  // caller that fills a vector.
+  ::new (&prev) std::atomic<COrbStringData*>(const_cast<COrbStringData*>(&other));
+  ::new (&next) std::atomic<COrbStringData*>(behind);
   if (behind != nullptr) behind->prev.store(this, std::memory_order_relaxed);
   other.next.store(this, std::memory_order_relaxed);
 }
