@@ -331,6 +331,16 @@ ORB_SSE_INLINE bool ConvertBlock(Place* place, __m128i bytes, unsigned nonAscii,
   return true;
 }
 
+/// Fewer bytes than a block at the end of a text that has a block. Where that one is ASCII it is
+/// taken whole, over what is done of it.
+ORB_SSE_INLINE bool WidenTail(const char* at, std::size_t left, char16_t* out) {
+  const std::size_t again = kBlock - left;
+  const __m128i bytes = Load(at - again);
+  if (Mask(bytes) != 0) return false;
+  StoreAscii(out - again, bytes);
+  return true;
+}
+
 /// The last bytes, from a copy that zeros follow: a character that they cut short is no UTF-8.
 ORB_SSE_INLINE char16_t* ConvertTail(const char* at, std::size_t left, char16_t* out) {
   std::array<char, 3 * kBlock> padded{};
@@ -380,7 +390,11 @@ ORB_SSE std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
     }
     if (!ConvertBlock(&place, bytes, nonAscii, kBlock)) return kNotUtf8;
   }
-  if (left() != 0) place.out = ConvertTail(place.at, left(), place.out);
+  if (left() == 0) return static_cast<std::size_t>(place.out - out);
+  if (left() < kBlock && text.size() >= kBlock && WidenTail(place.at, left(), place.out)) {
+    return static_cast<std::size_t>(place.out - out) + left();
+  }
+  place.out = ConvertTail(place.at, left(), place.out);
   return place.out == nullptr ? kNotUtf8 : static_cast<std::size_t>(place.out - out);
 }
 
@@ -575,6 +589,15 @@ ORB_SSE_INLINE std::size_t CopyAscii(std::u16string_view text, char* out) {
   return at + kUnits;
 }
 
+/// The same with units as WidenTail() does with bytes.
+ORB_SSE_INLINE bool NarrowTail(std::u16string_view tail, char* out) {
+  const std::size_t again = kUnits - tail.size();
+  const __m128i units = Load(tail.data() - again);
+  if (!AreAscii(units)) return false;
+  StoreAscii(out - again, units);
+  return true;
+}
+
 /// How long the text begins with ASCII, in whole steps of 64.
 ORB_SSE_INLINE std::size_t AsciiLength(std::string_view text) {
   std::size_t at = 0;
@@ -617,6 +640,7 @@ ORB_SSE std::size_t Utf16LengthOfValid(std::string_view text) {
 
 ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
   const char* const begin = out;
+  const bool hasBlock = text.size() >= kUnits;
   bool wasAscii = false;
   while (text.size() >= kUnits) {
     const __m128i units = Load(text.data());
@@ -651,7 +675,9 @@ ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
     }
     text.remove_prefix(kUnits - cut);
   }
-  return static_cast<std::size_t>(out - begin) + portable::Utf8FromUtf16(text, out);
+  const auto done = static_cast<std::size_t>(out - begin);
+  if (hasBlock && !text.empty() && NarrowTail(text, out)) return done + text.size();
+  return done + portable::Utf8FromUtf16(text, out);
 }
 
 }  // namespace orb::platform::sse

@@ -34,7 +34,7 @@ enum Master : std::uint8_t { kNone = 0, kSystem = 1, kUtf8 = 2, kUnicode = 3 };
 /// Up to here a text is converted on the stack and then copied at its size.
 constexpr std::size_t kShort = 256;
 constexpr std::size_t kMostOnStack = 3072;
-/// How much of a text is looked at before it is taken for ASCII.
+/// How much of a longer text is looked at before it is taken for ASCII.
 constexpr std::size_t kFirstLook = 64;
 
 /// Null without memory.
@@ -151,8 +151,8 @@ Copy<unsigned short> ShortUnicode(std::string_view utf8) {
 /// The second half of the room takes what the conversion overwrites. A text with fewer units than a
 /// third of its bytes is no UTF-8, and one with more has that much room.
 Copy<unsigned short> UnicodeFrom(std::string_view utf8) {
-  if (const auto ascii = UnicodeFromAscii(utf8)) return *ascii;
   if (utf8.size() <= kShort) return ShortUnicode(utf8);
+  if (const auto ascii = UnicodeFromAscii(utf8)) return *ascii;
   static_assert(kShort / 3 > kSlack);
   const std::size_t most = Utf16LengthOfValid(utf8);
   if (most < utf8.size() / 3) return ShortUnicode({});

@@ -127,6 +127,7 @@ TEST(Transcode, OfRandomTextsIsWhatThePlainWayGives) {
       if (c > 0xFFFF) units += static_cast<char16_t>(0xD7C0 + (c >> 10));
       units += static_cast<char16_t>(c > 0xFFFF ? 0xDC00 + (c & 0x3FF) : c);
     }
+    if (random(2) == 0) units.append(random(24), u'z');
     std::string bytes = Bytes(portable::Utf8FromUtf16, units);
     ASSERT_EQ(Bytes(sse::Utf8FromUtf16, units), bytes);
     ASSERT_EQ(Units(sse::Utf16FromUtf8, bytes), units);
