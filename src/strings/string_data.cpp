@@ -148,8 +148,8 @@ Copy<unsigned short> ShortUnicode(std::string_view utf8) {
 /// The second half of the room takes what the conversion overwrites. A text with fewer units than a
 /// third of its bytes is no UTF-8, and one with more has that much room.
 Copy<unsigned short> UnicodeFrom(std::string_view utf8) {
-  if (const auto ascii = UnicodeFromAscii(utf8)) return *ascii;
   if (utf8.size() <= kShort) return ShortUnicode(utf8);
+  if (const auto ascii = UnicodeFromAscii(utf8)) return *ascii;
   static_assert(kShort / 3 > kSlack);
   const std::size_t most = Utf16LengthOfValid(utf8);
   if (most < utf8.size() / 3) return ShortUnicode({});
