@@ -291,6 +291,27 @@ ORB_SSE_INLINE void ConvertGroup(Place* place, __m128i bytes, unsigned nonAscii,
   *place = {at, out};
 }
 
+ORB_SSE_INLINE bool HasTooSmallLead(__m128i bytes) {
+  const __m128i pairs = _mm_and_si128(bytes, _mm_set1_epi8(-2));
+  return Mask(_mm_cmpeq_epi8(pairs, _mm_set1_epi8(static_cast<char>(0xC0)))) != 0;
+}
+
+/// ConvertBlock() for a whole block without a lead of three bytes or more, as most European text
+/// has them.
+ORB_SSE_INLINE bool ConvertUpToTwoBytes(Place* place, __m128i bytes, unsigned nonAscii) {
+  const unsigned continuation = Mask(_mm_cmplt_epi8(bytes, _mm_set1_epi8(-64)));
+  const unsigned expected = (nonAscii & ~continuation) << 1 & 0xFFFF;
+  if (continuation != expected || HasTooSmallLead(bytes)) return false;
+  const bool isCut = static_cast<unsigned char>(place->at[kBlock - 1]) >= 0xC0;
+  const __m128i second = Load(place->at + 1);
+  place->at += isCut ? kBlock - 1 : kBlock;
+  place->out = StoreKept(place->out,
+                         UpToTwoBytes(_mm_unpacklo_epi8(second, bytes)),
+                         UpToTwoBytes(_mm_unpackhi_epi8(second, bytes)),
+                         ~continuation & (isCut ? 0x7FFF : 0xFFFF));
+  return true;
+}
+
 /// Converts the characters that lie whole in the first `limit` bytes of the block, which begins
 /// with one and holds one that is not ASCII. False for what is no UTF-8.
 ORB_SSE_INLINE bool ConvertBlock(Place* place, __m128i bytes, unsigned nonAscii, unsigned limit) {
@@ -302,9 +323,7 @@ ORB_SSE_INLINE bool ConvertBlock(Place* place, __m128i bytes, unsigned nonAscii,
     place->at += 15;
     return place->out != nullptr;
   }
-  const __m128i tooSmall = _mm_cmpeq_epi8(_mm_and_si128(bytes, _mm_set1_epi8(-2)),
-                                          _mm_set1_epi8(static_cast<char>(0xC0)));
-  if (leads.continuation != Expected(leads) || Mask(tooSmall) != 0) return false;
+  if (leads.continuation != Expected(leads) || HasTooSmallLead(bytes)) return false;
   const unsigned whole = Whole(place->at);
   const unsigned consumed = whole < limit ? whole : limit;
   const unsigned inside = (1U << consumed) - 1;
@@ -383,6 +402,10 @@ ORB_SSE std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
       continue;
     }
     if (left() < kBlock + kReadAhead) break;
+    if (AtLeast(bytes, 0xE0) == 0) {
+      if (!ConvertUpToTwoBytes(&place, bytes, nonAscii)) return kNotUtf8;
+      continue;
+    }
     if (AtLeast(bytes, 0xF0) != 0) {
       const char* const before = place.at;
       ConvertGroup(&place, bytes, nonAscii, end);
