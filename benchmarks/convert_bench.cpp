@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cstdint>
 #include <cstdlib>
+#include <cstring>
 #include <ctime>
 #include <string>
 #include <vector>
@@ -30,7 +31,9 @@
 ///   Road:   the text made in one encoding, the other one asked for, and all of it ended.
 ///   Bare:   the conversion alone, into a buffer; of Qt, which has none, its whole call.
 /// The UTF-16 copy is to have twice the room of its units, all zero behind them: limit-zeroed only
-/// asks for that memory, as the least that Derive and Road can cost.
+/// asks for that memory, as the least that Derive and Road can cost. A value has a copy of the text
+/// it was made from: limit-kept makes that copy and asks for the room of the other one, and
+/// converts nothing; the peers convert the caller's text.
 
 namespace {
 
@@ -116,6 +119,43 @@ void ZeroedUnicode(benchmark::State& state, Kind kind) {
     benchmark::DoNotOptimize(block);
     std::free(block);
   }
+}
+
+/// A text measured and copied, room for its other form, and both ended.
+template <typename Measure, typename Ask>
+void Keep(benchmark::State& state, const void* text, Measure measure, Ask ask) {
+  for (auto _ : state) {
+    const std::size_t size = measure();
+    void* kept = std::malloc(size);
+    std::memcpy(kept, text, size);
+    void* room = ask();
+    benchmark::DoNotOptimize(kept);
+    benchmark::DoNotOptimize(room);
+    benchmark::ClobberMemory();
+    std::free(room);
+    std::free(kept);
+  }
+}
+
+void KeepForUnicode(benchmark::State& state, Kind kind) {
+  const std::string text = SampleBytes(state, kind);
+  const std::size_t units = SampleUnits(state, kind).size();
+  Keep(
+      state,
+      text.c_str(),
+      [&] { return std::strlen(text.c_str()) + 1; },
+      [&] { return std::calloc(units + 1, 4); });
+}
+
+void KeepForUtf8(benchmark::State& state, Kind kind) {
+  const std::size_t size = SampleBytes(state, kind).size();
+  const std::u16string text = SampleUnits(state, kind);
+  const auto* units = reinterpret_cast<const unsigned short*>(text.c_str());
+  Keep(
+      state,
+      units,
+      [&] { return (orb::platform::Utf16Length(units) + 1) * sizeof *units; },
+      [&] { return std::malloc(size + 1); });
 }
 
 void RoadUnicodeOrb(benchmark::State& state, Kind kind) {
@@ -263,10 +303,12 @@ constexpr Row kRows[] = {
     {"ToUtf16Derive", "Orb", DeriveUnicodeOrb, Clock::kOwn},
     {"ToUtf16Derive", "limit-zeroed", ZeroedUnicode},
     {"ToUtf16Road", "Orb", RoadUnicodeOrb},
+    {"ToUtf16Road", "limit-kept", KeepForUnicode},
     {"ToUtf16Bare", "Orb", BareUnicodeOrb},
     {"ToUtf16Bare", "ICU", BareUnicodeIcu},
     {"ToUtf8Derive", "Orb", DeriveUtf8Orb, Clock::kOwn},
     {"ToUtf8Road", "Orb", RoadUtf8Orb},
+    {"ToUtf8Road", "limit-kept", KeepForUtf8},
     {"ToUtf8Bare", "Orb", BareUtf8Orb},
     {"ToUtf8Bare", "ICU", BareUtf8Icu},
 #ifdef ORB_BENCH_QT

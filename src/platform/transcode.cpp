@@ -8,6 +8,7 @@
 #include <cstring>
 
 #include "platform/icu.h"
+#include "platform/transcode_avx.h"
 #include "platform/transcode_sse.h"
 
 #if defined(__SSE2__)
@@ -234,7 +235,11 @@ std::size_t Utf16LengthOfValid(std::string_view text) {
 }  // namespace portable
 
 std::size_t Utf16LengthOfValid(std::string_view text) {
-  return sse::IsSupported() ? sse::Utf16LengthOfValid(text) : portable::Utf16LengthOfValid(text);
+  if (!avx::IsSupported()) {
+    return sse::IsSupported() ? sse::Utf16LengthOfValid(text) : portable::Utf16LengthOfValid(text);
+  }
+  const std::string_view rest = text.substr(text.size() / avx::kGroup * avx::kGroup);
+  return avx::Utf16LengthOfGroups(text) + sse::Utf16LengthOfValid(rest);
 }
 
 std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
@@ -295,29 +300,42 @@ bool Narrow(const char16_t* from, char* to) {
   return true;
 }
 
-/// In steps of 64 and 16; the last step may go over what the one before has done.
+/// Goes on behind what is done, in steps of 64 and 16; the last one may go over what the one before
+/// has done.
 template <typename From, typename To>
 std::size_t InBlocks(const From* from,
                      std::size_t size,
+                     std::size_t at,
                      To* to,
                      bool (*four)(const From*, To*),
                      bool (*one)(const From*, To*)) {
-  std::size_t at = 0;
   while (size - at >= 4 * kBlock && four(from + at, to + at)) at += 4 * kBlock;
   while (size - at >= kBlock && one(from + at, to + at)) at += kBlock;
   const bool nearEnd = size - at < kBlock && size >= kBlock;
   return nearEnd && one(from + size - kBlock, to + size - kBlock) ? size : at;
 }
 
+bool MayGoWide(std::size_t size) { return size >= 4 * avx::kGroup && avx::IsSupported(); }
+
+/// Whether the units at `block` begin a group that may be read whole, far enough in a text to be
+/// worth it.
+bool IsGroupOfLongText(const void* block, std::size_t before) {
+  constexpr std::size_t kGroupSize = avx::kGroup * sizeof(char16_t);
+  return before >= 2 * kGroupSize && reinterpret_cast<std::uintptr_t>(block) % kGroupSize == 0 &&
+         avx::IsSupported();
+}
+
 }  // namespace
 
 std::size_t Utf16FromAscii(std::string_view text, char16_t* out) {
-  const std::size_t done = InBlocks(text.data(), text.size(), out, Widen<4>, Widen<1>);
+  const std::size_t wide = MayGoWide(text.size()) ? avx::Utf16FromAscii(text, out) : 0;
+  const std::size_t done = InBlocks(text.data(), text.size(), wide, out, Widen<4>, Widen<1>);
   return done + portable::Utf16FromAscii(text.substr(done), out + done);
 }
 
 std::size_t AsciiFromUtf16(std::u16string_view text, char* out) {
-  const std::size_t done = InBlocks(text.data(), text.size(), out, Narrow<4>, Narrow<1>);
+  const std::size_t wide = MayGoWide(text.size()) ? avx::AsciiFromUtf16(text, out) : 0;
+  const std::size_t done = InBlocks(text.data(), text.size(), wide, out, Narrow<4>, Narrow<1>);
   return done + portable::AsciiFromUtf16(text.substr(done), out + done);
 }
 
@@ -331,6 +349,12 @@ __attribute__((no_sanitize("address", "thread"))) std::size_t Utf16Length(
       reinterpret_cast<const __m128i*>(reinterpret_cast<const char*>(text) - before);
   unsigned inText = 0xFFFFU << before;  // Drops what the first block has before the text.
   for (std::size_t at = 0;; at += sizeof *block, ++block) {
+    if (IsGroupOfLongText(block, at)) {
+      const auto* units = reinterpret_cast<const unsigned short*>(block);
+      const unsigned short* last = avx::GroupWithZero(units);
+      at += static_cast<std::size_t>(last - units) * sizeof *units;
+      block = reinterpret_cast<const __m128i*>(last);
+    }
     const __m128i zeros = _mm_cmpeq_epi16(*block, _mm_setzero_si128());
     const unsigned found = static_cast<unsigned>(_mm_movemask_epi8(zeros)) & inText;
     if (found != 0) {
@@ -357,6 +381,34 @@ std::size_t Utf16Length(const unsigned short* text) {
 }
 
 #endif
+
+namespace {
+
+/// Eight bytes at a time; the last ones once more, with those before them.
+template <typename Unit>
+bool IsAsciiInWords(std::basic_string_view<Unit> text) {
+  constexpr std::size_t kStep = sizeof(std::uint64_t) / sizeof(Unit);
+  const std::size_t size = text.size();
+  if (size < kStep)
+    return std::all_of(text.begin(), text.end(), [](Unit unit) {
+      return (static_cast<unsigned>(unit) & ~0x7FU) == 0;
+    });
+  std::uint64_t any = 0;
+  const auto add = [&](std::size_t at) {
+    std::uint64_t word = 0;
+    std::memcpy(&word, text.data() + at, sizeof word);
+    any |= word;
+  };
+  for (std::size_t at = 0; size - at >= kStep; at += kStep) add(at);
+  add(size - kStep);
+  return (any & (sizeof(Unit) == 1 ? 0x8080808080808080 : 0xFF80FF80FF80FF80)) == 0;
+}
+
+}  // namespace
+
+bool IsAscii(std::string_view text) { return IsAsciiInWords(text); }
+
+bool IsAscii(std::u16string_view text) { return IsAsciiInWords(text); }
 
 std::optional<std::u16string> Utf16FromUtf8(std::string_view text) {
   std::u16string out(text.size() + kSlack, u'\0');

@@ -23,6 +23,9 @@ std::size_t Utf16LengthOfValid(std::string_view text);
 /// number. `out` needs room for 3 * text.size() + kSlack bytes.
 std::size_t Utf8FromUtf16(std::u16string_view text, char* out);
 
+bool IsAscii(std::string_view text);
+bool IsAscii(std::u16string_view text);
+
 /// Convert the ASCII that a text begins with and return how much that is. They write no more than
 /// as many as the text has.
 std::size_t Utf16FromAscii(std::string_view text, char16_t* out);

@@ -291,6 +291,27 @@ ORB_SSE_INLINE void ConvertGroup(Place* place, __m128i bytes, unsigned nonAscii,
   *place = {at, out};
 }
 
+ORB_SSE_INLINE bool HasTooSmallLead(__m128i bytes) {
+  const __m128i pairs = _mm_and_si128(bytes, _mm_set1_epi8(-2));
+  return Mask(_mm_cmpeq_epi8(pairs, _mm_set1_epi8(static_cast<char>(0xC0)))) != 0;
+}
+
+/// ConvertBlock() for a whole block without a lead of three bytes or more, as most European text
+/// has them.
+ORB_SSE_INLINE bool ConvertUpToTwoBytes(Place* place, __m128i bytes, unsigned nonAscii) {
+  const unsigned continuation = Mask(_mm_cmplt_epi8(bytes, _mm_set1_epi8(-64)));
+  const unsigned expected = (nonAscii & ~continuation) << 1 & 0xFFFF;
+  if (continuation != expected || HasTooSmallLead(bytes)) return false;
+  const bool isCut = static_cast<unsigned char>(place->at[kBlock - 1]) >= 0xC0;
+  const __m128i second = Load(place->at + 1);
+  place->at += isCut ? kBlock - 1 : kBlock;
+  place->out = StoreKept(place->out,
+                         UpToTwoBytes(_mm_unpacklo_epi8(second, bytes)),
+                         UpToTwoBytes(_mm_unpackhi_epi8(second, bytes)),
+                         ~continuation & (isCut ? 0x7FFF : 0xFFFF));
+  return true;
+}
+
 /// Converts the characters that lie whole in the first `limit` bytes of the block, which begins
 /// with one and holds one that is not ASCII. False for what is no UTF-8.
 ORB_SSE_INLINE bool ConvertBlock(Place* place, __m128i bytes, unsigned nonAscii, unsigned limit) {
@@ -302,9 +323,7 @@ ORB_SSE_INLINE bool ConvertBlock(Place* place, __m128i bytes, unsigned nonAscii,
     place->at += 15;
     return place->out != nullptr;
   }
-  const __m128i tooSmall = _mm_cmpeq_epi8(_mm_and_si128(bytes, _mm_set1_epi8(-2)),
-                                          _mm_set1_epi8(static_cast<char>(0xC0)));
-  if (leads.continuation != Expected(leads) || Mask(tooSmall) != 0) return false;
+  if (leads.continuation != Expected(leads) || HasTooSmallLead(bytes)) return false;
   const unsigned whole = Whole(place->at);
   const unsigned consumed = whole < limit ? whole : limit;
   const unsigned inside = (1U << consumed) - 1;
@@ -328,6 +347,16 @@ ORB_SSE_INLINE bool ConvertBlock(Place* place, __m128i bytes, unsigned nonAscii,
   }
   if (bad.Any()) return false;
   place->out = StoreKept(place->out, units.low, units.high, keep);
+  return true;
+}
+
+/// Fewer bytes than a block at the end of a text that has a block. Where that one is ASCII it is
+/// taken whole, over what is done of it.
+ORB_SSE_INLINE bool WidenTail(const char* at, std::size_t left, char16_t* out) {
+  const std::size_t again = kBlock - left;
+  const __m128i bytes = Load(at - again);
+  if (Mask(bytes) != 0) return false;
+  StoreAscii(out - again, bytes);
   return true;
 }
 
@@ -373,6 +402,10 @@ ORB_SSE std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
       continue;
     }
     if (left() < kBlock + kReadAhead) break;
+    if (AtLeast(bytes, 0xE0) == 0) {
+      if (!ConvertUpToTwoBytes(&place, bytes, nonAscii)) return kNotUtf8;
+      continue;
+    }
     if (AtLeast(bytes, 0xF0) != 0) {
       const char* const before = place.at;
       ConvertGroup(&place, bytes, nonAscii, end);
@@ -380,7 +413,11 @@ ORB_SSE std::size_t Utf16FromUtf8(std::string_view text, char16_t* out) {
     }
     if (!ConvertBlock(&place, bytes, nonAscii, kBlock)) return kNotUtf8;
   }
-  if (left() != 0) place.out = ConvertTail(place.at, left(), place.out);
+  if (left() == 0) return static_cast<std::size_t>(place.out - out);
+  if (left() < kBlock && text.size() >= kBlock && WidenTail(place.at, left(), place.out)) {
+    return static_cast<std::size_t>(place.out - out) + left();
+  }
+  place.out = ConvertTail(place.at, left(), place.out);
   return place.out == nullptr ? kNotUtf8 : static_cast<std::size_t>(place.out - out);
 }
 
@@ -575,6 +612,15 @@ ORB_SSE_INLINE std::size_t CopyAscii(std::u16string_view text, char* out) {
   return at + kUnits;
 }
 
+/// The same with units as WidenTail() does with bytes.
+ORB_SSE_INLINE bool NarrowTail(std::u16string_view tail, char* out) {
+  const std::size_t again = kUnits - tail.size();
+  const __m128i units = Load(tail.data() - again);
+  if (!AreAscii(units)) return false;
+  StoreAscii(out - again, units);
+  return true;
+}
+
 /// How long the text begins with ASCII, in whole steps of 64.
 ORB_SSE_INLINE std::size_t AsciiLength(std::string_view text) {
   std::size_t at = 0;
@@ -617,6 +663,7 @@ ORB_SSE std::size_t Utf16LengthOfValid(std::string_view text) {
 
 ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
   const char* const begin = out;
+  const bool hasBlock = text.size() >= kUnits;
   bool wasAscii = false;
   while (text.size() >= kUnits) {
     const __m128i units = Load(text.data());
@@ -651,7 +698,9 @@ ORB_SSE std::size_t Utf8FromUtf16(std::u16string_view text, char* out) {
     }
     text.remove_prefix(kUnits - cut);
   }
-  return static_cast<std::size_t>(out - begin) + portable::Utf8FromUtf16(text, out);
+  const auto done = static_cast<std::size_t>(out - begin);
+  if (hasBlock && !text.empty() && NarrowTail(text, out)) return done + text.size();
+  return done + portable::Utf8FromUtf16(text, out);
 }
 
 }  // namespace orb::platform::sse

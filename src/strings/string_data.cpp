@@ -19,6 +19,7 @@ namespace {
 
 using orb::TextBuffer;
 using orb::platform::AsciiFromUtf16;
+using orb::platform::IsAscii;
 using orb::platform::kNotUtf8;
 using orb::platform::kSlack;
 using orb::platform::MacRomanFromUtf16;
@@ -35,7 +36,7 @@ enum Master : std::uint8_t { kNone = 0, kSystem = 1, kUtf8 = 2, kUnicode = 3 };
 constexpr std::size_t kShort = 256;
 constexpr std::size_t kMostOnStack = 3072;
 /// How much of a text is looked at before it is taken for ASCII.
-constexpr std::size_t kFirstLook = 64;
+constexpr std::size_t kFirstLook = 32;
 
 /// Null without memory.
 void* BlockFor(std::size_t size) noexcept try {
@@ -110,9 +111,7 @@ Copy<unsigned short> Terminated(unsigned short* text, std::size_t length) {
 /// Nothing where the text is not ASCII alone. Most texts that are not show it where they begin, and
 /// what others have cost by then is little.
 std::optional<Copy<unsigned short>> UnicodeFromAscii(std::string_view utf8) {
-  std::array<char16_t, kFirstLook> head;
-  const std::string_view first = utf8.substr(0, kFirstLook);
-  if (Utf16FromAscii(first, head.data()) != first.size()) return std::nullopt;
+  if (!IsAscii(utf8.substr(0, kFirstLook))) return std::nullopt;
   auto* made = Buffer<unsigned short>(UnicodeSize(utf8.size()));
   if (made == nullptr) return std::nullopt;
   const std::size_t length = Utf16FromAscii(utf8, reinterpret_cast<char16_t*>(made));
@@ -122,9 +121,7 @@ std::optional<Copy<unsigned short>> UnicodeFromAscii(std::string_view utf8) {
 }
 
 std::optional<Copy<char>> Utf8FromAscii(std::u16string_view units) {
-  std::array<char, kFirstLook> head;
-  const std::u16string_view first = units.substr(0, kFirstLook);
-  if (AsciiFromUtf16(first, head.data()) != first.size()) return std::nullopt;
+  if (!IsAscii(units.substr(0, kFirstLook))) return std::nullopt;
   auto* made = Buffer<char>(units.size() + 1);
   if (made == nullptr) return std::nullopt;
   made[units.size()] = '\0';
@@ -151,8 +148,8 @@ Copy<unsigned short> ShortUnicode(std::string_view utf8) {
 /// The second half of the room takes what the conversion overwrites. A text with fewer units than a
 /// third of its bytes is no UTF-8, and one with more has that much room.
 Copy<unsigned short> UnicodeFrom(std::string_view utf8) {
-  if (const auto ascii = UnicodeFromAscii(utf8)) return *ascii;
   if (utf8.size() <= kShort) return ShortUnicode(utf8);
+  if (const auto ascii = UnicodeFromAscii(utf8)) return *ascii;
   static_assert(kShort / 3 > kSlack);
   const std::size_t most = Utf16LengthOfValid(utf8);
   if (most < utf8.size() / 3) return ShortUnicode({});

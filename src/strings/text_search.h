@@ -87,7 +87,8 @@ class LiteralSearch {
     if constexpr (kRule == Case::kAscii) return MatchesFolded(here);
     return std::memcmp(here, needle_.data(), needle_.size()) == 0;
   }
-  /// The same for needles of up to eight bytes, where eight bytes can be read.
+  /// The same for needles of up to eight bytes, where eight bytes can be read: without a call, for
+  /// which the loop would have to put away what it has in registers.
   bool MatchesHeadAt(const char* here) const {
     std::uint64_t head;
     std::memcpy(&head, here, sizeof head);
@@ -99,7 +100,7 @@ class LiteralSearch {
     const unsigned char lower = Folded(needle_[i]);
     return rule_ == Case::kAscii && lower >= 'a' && lower <= 'z' ? 0x20 : 0;
   }
-  template <Case kRule, typename OnMatch>
+  template <Case kRule, bool kHasHead, typename OnMatch>
   void ForEachByRule(std::string_view text, OnMatch&& onMatch) const;
   template <typename OnMatch>
   void ForEachSlowly(std::string_view text, std::size_t from, OnMatch&& onMatch) const;
@@ -170,14 +171,16 @@ void LiteralSearch::ForEachSlowly(std::string_view text,
 
 template <typename OnMatch>
 void LiteralSearch::ForEach(std::string_view text, OnMatch&& onMatch) const {
-  if (rule_ == Case::kExact) {
-    ForEachByRule<Case::kExact>(text, onMatch);
+  if (rule_ == Case::kAscii) {
+    ForEachByRule<Case::kAscii, false>(text, onMatch);
+  } else if (needle_.size() <= sizeof(head_)) {
+    ForEachByRule<Case::kExact, true>(text, onMatch);
   } else {
-    ForEachByRule<Case::kAscii>(text, onMatch);
+    ForEachByRule<Case::kExact, false>(text, onMatch);
   }
 }
 
-template <LiteralSearch::Case kRule, typename OnMatch>
+template <LiteralSearch::Case kRule, bool kHasHead, typename OnMatch>
 void LiteralSearch::ForEachByRule(std::string_view text, OnMatch&& onMatch) const {
   const std::size_t size = needle_.size();
   std::size_t next = 0;  // Nothing before this place is looked at any more.
@@ -185,18 +188,16 @@ void LiteralSearch::ForEachByRule(std::string_view text, OnMatch&& onMatch) cons
 #ifdef __SSE2__
   const PairTest<kRule> test(*this);
   const char* const data = text.data();
-  std::size_t wasted = 0;                       // Bytes of long needles compared in vain.
-  const std::size_t end = text.size() - last_;  // Of the places where a match can begin.
-  const bool hasHead = kRule == Case::kExact && size <= sizeof(head_);
-  const std::size_t headEnd =
-      hasHead && text.size() >= sizeof(head_) ? text.size() - sizeof(head_) + 1 : 0;
+  std::size_t wasted = 0;  // Bytes of long needles compared in vain.
+  // Of the places where a match can be tested; the few behind it are looked at by themselves.
+  const std::size_t behind = kHasHead ? sizeof(head_) - 1 : last_;
+  const std::size_t end = text.size() > behind ? text.size() - behind : 0;
   for (std::size_t block = 0; end >= kStep && next < end; block += kStep) {
     if (block + kStep > end) block = end - kStep;  // The last step looks at some places again.
     for (std::uint64_t hits = test.Hits(data + block); hits != 0; hits &= hits - 1) {
       const std::size_t place = block + static_cast<std::size_t>(std::countr_zero(hits));
       if (place < next) continue;
-      const bool matches =
-          place < headEnd ? MatchesHeadAt(data + place) : MatchesAt<kRule>(data + place);
+      const bool matches = kHasHead ? MatchesHeadAt(data + place) : MatchesAt<kRule>(data + place);
       if (!matches) {
         wasted += size;
         if (wasted > 16 * (place + 4096)) return ForEachSlowly(text, place + 1, onMatch);
@@ -208,7 +209,7 @@ void LiteralSearch::ForEachByRule(std::string_view text, OnMatch&& onMatch) cons
     if (next < block + kStep) next = block + kStep;
   }
 #endif
-  if (text.size() - next > size + kStep) return ForEachSlowly(text, next, onMatch);
+  if (text.size() - next > size + kStep + sizeof(head_)) return ForEachSlowly(text, next, onMatch);
   while (next + size <= text.size()) {
     if (!MatchesAt<kRule>(text.data() + next)) {
       ++next;

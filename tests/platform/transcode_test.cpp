@@ -122,6 +122,7 @@ TEST(Transcode, OfRandomTextsIsWhatThePlainWayGives) {
       if (c > 0xFFFF) units += static_cast<char16_t>(0xD7C0 + (c >> 10));
       units += static_cast<char16_t>(c > 0xFFFF ? 0xDC00 + (c & 0x3FF) : c);
     }
+    if (random(2) == 0) units.append(random(24), u'z');
     std::string bytes = Bytes(portable::Utf8FromUtf16, units);
     ASSERT_EQ(Bytes(sse::Utf8FromUtf16, units), bytes);
     ASSERT_EQ(Units(sse::Utf16FromUtf8, bytes), units);
@@ -147,8 +148,9 @@ TEST(Transcode, OfRandomTextsIsWhatThePlainWayGives) {
   EXPECT_GT(invalid, 10'000);
 }
 
+// Beyond a few hundred bytes wider steps are taken.
 TEST(Transcode, OfAsciiEndsAtTheFirstCharacterBeyondAndWritesNoFurther) {
-  for (std::size_t size = 0; size < 200; ++size) {
+  for (std::size_t size = 0; size < 500; size += size < 100 || size > 400 ? 1 : 37) {
     for (std::size_t bad = 0; bad <= size; bad += 1 + size / 20) {
       std::string bytes;
       for (std::size_t i = 0; i < size; ++i) bytes += static_cast<char>(1 + i % 127);
@@ -157,6 +159,8 @@ TEST(Transcode, OfAsciiEndsAtTheFirstCharacterBeyondAndWritesNoFurther) {
       if (bad < size) units[bad] = size % 2 == 0 ? u'\x80' : u'\xFF00';
       std::u16string wide(size + 1, u'!');
       std::string narrow(size + 1, '!');
+      ASSERT_EQ(IsAscii(bytes), bad == size);
+      ASSERT_EQ(IsAscii(units), bad == size);
       ASSERT_EQ(Utf16FromAscii(bytes, wide.data()), bad);
       ASSERT_EQ(AsciiFromUtf16(units, narrow.data()), bad);
       ASSERT_EQ(wide.substr(0, bad), units.substr(0, bad));
@@ -165,6 +169,34 @@ TEST(Transcode, OfAsciiEndsAtTheFirstCharacterBeyondAndWritesNoFurther) {
       ASSERT_EQ(narrow[size], '!');
     }
   }
+}
+
+TEST(Utf16, IsAsLongAsItsUnitsBeforeTheZeroWhereverItLies) {
+  std::vector<unsigned short> units(2000, 0x0100);
+  for (std::size_t from = 0; from < 66; ++from) {
+    for (const std::size_t size : {0U, 1U, 7U, 8U, 63U, 64U, 127U, 128U, 129U, 192U, 255U, 1500U}) {
+      units[from + size] = 0;
+      ASSERT_EQ(Utf16Length(&units[from]), size) << from;
+      units[from + size] = 0x0100;
+    }
+  }
+}
+
+TEST(Utf16, HasTheLengthOfLongTextsCounted) {
+  Random random;
+  for (const unsigned kinds : {1U, 3U, 6U, 16U, 31U}) {
+    std::string bytes;
+    while (bytes.size() < 20'000) {
+      const auto c = RandomCharacter(random, kinds);
+      char16_t pair[] = {static_cast<char16_t>(c), 0};
+      if (c > 0xFFFF) pair[0] = static_cast<char16_t>(0xD7C0 + (c >> 10));
+      if (c > 0xFFFF) pair[1] = static_cast<char16_t>(0xDC00 + (c & 0x3FF));
+      bytes += Bytes(portable::Utf8FromUtf16, {pair, c > 0xFFFF ? 2U : 1U});
+    }
+    EXPECT_EQ(Utf16LengthOfValid(bytes), portable::Utf16LengthOfValid(bytes)) << kinds;
+  }
+  const std::string leads(20'000, '\xF0');  // The most that can be counted.
+  EXPECT_EQ(Utf16LengthOfValid(leads), 40'000U);
 }
 
 TEST(MacRoman, GivesAllItsBytesBack) {
