@@ -132,8 +132,9 @@ class Memory {
   std::uint64_t tickets_ = 0;
 };
 
+/// Never destroyed: a static object's destructor may still make a file.
 Memory& TheMemory() {
-  static Memory memory;
+  static Memory& memory = *new Memory;
   return memory;
 }
 

@@ -6,6 +6,7 @@
 
 #include <atomic>
 #include <cstddef>
+#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -184,6 +185,22 @@ TEST(CreateUniqueFile, HoldsADescriptorForLongSeriesOnly) {
     EXPECT_EQ(OpenDescriptors(), before);
   };
   ORB_IN_CHILD(orb::test::RunInChild([] { return true; }, count));
+}
+
+void MakeAtExit() {
+  const TempFolder folder;
+  MakeLong(folder.Path(), "p");
+  for (int i = 0; i < 9; ++i) Unique(folder.Path(), "p.jpg");
+  if (!fs::exists(folder / "p_8.jpg")) ::_exit(1);
+}
+
+TEST(CreateUniqueFile, WorksUntilTheProgramHasEnded) {
+  const auto useAndExit = [] {
+    std::atexit(MakeAtExit);
+    MakeAtExit();
+    std::exit(0);
+  };
+  EXPECT_EXIT(useAndExit(), testing::ExitedWithCode(0), "");
 }
 
 TEST(TakenRuns, AreEndedByWhatMayBeAnotherSpelling) {
