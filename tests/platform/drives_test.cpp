@@ -4,6 +4,7 @@
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <sys/sysmacros.h>
 #include <unistd.h>
 
 #include <filesystem>
@@ -208,6 +209,26 @@ TEST(Drives, LearnOfOneMountWhatTheTableTells) {
   };
   fs::create_directory(folder / "ro");
   ORB_IN_CHILD(test::RunWithPrivateMounts(compare));
+}
+
+TEST(Drives, LookForARealVolumesDiskInWhatIsMountedAsSysfs) {
+  Machine machine;
+  const std::string folder = machine.Folder().Path();
+  struct stat status;
+  ASSERT_EQ(::stat(folder.c_str(), &status), 0);
+  if (major(status.st_dev) == 0) GTEST_SKIP() << "the folder is on no disk";
+  const std::string number =
+      std::to_string(major(status.st_dev)) + ':' + std::to_string(minor(status.st_dev));
+  machine.AddDevice("pci0/usb1/1-1/block/sdx", number);
+  const auto isEjectable = [&] {
+    const auto drives = MakeDrives({});
+    const VolumeId volume = drives->VolumeOf(folder).Value();
+    return drives->Read(folder, volume).Value().ejectable;
+  };
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    ASSERT_TRUE(test::BindMount(folder + "/sys", "/sys"));
+    EXPECT_TRUE(isEjectable());
+  }));
 }
 
 TEST(Drives, DoNotWaitForAServerThatDoesNotAnswer) {
