@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "platform/drives.h"
 
-#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
@@ -235,11 +234,8 @@ TEST(Drives, DoNotWaitForAServerThatDoesNotAnswer) {
   const test::TempFolder folder;
   fs::create_directory(folder / "share");
   ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
-    const int server = ::open("/dev/fuse", O_RDWR | O_CLOEXEC);
-    const std::string options =
-        "fd=" + std::to_string(server) + ",rootmode=40000,user_id=0,group_id=0";
     const std::string share = folder / "share";
-    if (::mount("nas:", share.c_str(), "fuse.sshfs", 0, options.c_str()) != 0) return;
+    if (!test::MountDeadShare(share)) return;
     ::alarm(20);
     for (const char* below : {"", "/photo.jpg"}) {
       const auto drives = MakeDrives({});

@@ -21,6 +21,7 @@ namespace {
 
 namespace fs = std::filesystem;
 using orb::platform::Error;
+using orb::platform::ExpectRemovable;
 using orb::platform::IsItemOrAbove;
 using orb::platform::Items;
 using orb::platform::kBusy;
@@ -107,6 +108,17 @@ TEST(RemoveItem, DoesNotEnterAVolumeMountedInside) {
     EXPECT_EQ(ErrorOf(RemoveItem(folder / "tree")), kBusy);
     EXPECT_EQ(ErrorOf(RemoveItem(folder / "tree/mounted")), kBusy);
     EXPECT_EQ(ReadAll(folder / "tree/mounted/photo"), "x");
+  }));
+}
+
+TEST(RemoveItem, DoesNotAskAServerThatIsGoneAboutAVolumeMountedInside) {
+  const TempFolder folder;
+  fs::create_directories(folder / "tree/share");
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    if (!orb::test::MountDeadShare(folder / "tree/share")) return;
+    ::alarm(20);
+    EXPECT_EQ(ErrorOf(ExpectRemovable(folder / "tree")), kNotPermitted);
+    EXPECT_EQ(ErrorOf(RemoveItem(folder / "tree")), kBusy);
   }));
 }
 
