@@ -25,8 +25,11 @@ using platform::Result;
 using platform::Status;
 using platform::TakenRun;
 
-/// So many names are tried one by one before the folder is listed: mostly one is free.
+/// So many names are tried before anything else is asked: mostly one is free.
 constexpr std::uint32_t kProbes = 4;
+/// Where this number is taken there are many: listing the folder is faster than trying them, and
+/// what the list says worth remembering.
+constexpr std::uint32_t kLongSeries = 100;
 
 TakenNumbers ReadTakenNumbers(const std::string& folder, const NumberedName& names) {
   std::vector<std::uint32_t> numbers;
@@ -44,27 +47,33 @@ class UniqueFile {
       : folderPath_(path), names_(name), folder_(HeldFolder::Open(path)) {}
 
   OrbResult Create(COrbFilePath* result) {
-    const bool canRemember = folder_ && names_.AreOfEntries();
-    TakenRun run = canRemember ? platform::RecallRun(folder_.Value(), names_.With(0)) : TakenRun();
+    TakenRun run =
+        CanRemember() ? platform::RecallRun(folder_.Value(), names_.With(0)) : TakenRun();
     const std::uint32_t probesEnd = run.end + kProbes;
     while (run.end < probesEnd && IsTaken(run.end)) ++run.end;
-    if (run.end == probesEnd) {
-      if (canRemember)
-        run.ticket = platform::WatchRun(folder_.Value(), names_.With(0), names_.Stem());
-      run.end = CreateBeyond(run.end);
-    }
+    if (run.end == probesEnd) CreateBeyond(&run);
     if (!created_) return DiagnoseCreation(created_, path_);
     platform::KeepRun({run.end + 1, run.ticket});
     return Deliver(path_, result);
   }
 
  private:
+  bool CanRemember() const { return folder_ && names_.AreOfEntries(); }
+
+  bool IsLong() const {
+    return Items::Current().Exists(JoinPath(folderPath_, names_.With(kLongSeries)));
+  }
+
   /// Gives the number that is free.
-  std::uint32_t CreateBeyond(std::uint32_t start) {
-    const TakenNumbers taken = ReadTakenNumbers(folderPath_, names_);
-    std::uint32_t number = taken.NextFree(start);
-    while (IsTaken(number)) number = taken.NextFree(number + 1);
-    return number;
+  void CreateBeyond(TakenRun* run) {
+    const bool isLong = IsLong();
+    if (isLong && run->ticket == 0 && CanRemember()) {
+      // What was taken before the watch may have left before it.
+      *run = {0, platform::WatchRun(folder_.Value(), names_.With(0), names_.Stem())};
+    }
+    const TakenNumbers taken = isLong ? ReadTakenNumbers(folderPath_, names_) : TakenNumbers({});
+    run->end = taken.NextFree(run->end);
+    while (IsTaken(run->end)) run->end = taken.NextFree(run->end + 1);
   }
 
   /// Where nothing may be made a name that is there counts as taken too: the diagnosis needs one

@@ -3,6 +3,7 @@
 
 #include <fcntl.h>
 #include <linux/magic.h>
+#include <linux/major.h>
 #include <sys/stat.h>
 #include <sys/vfs.h>
 #include <unistd.h>
@@ -200,13 +201,16 @@ std::optional<Device> FindMapping(const std::string& sysfs, std::string_view sou
   return std::nullopt;
 }
 
+std::optional<Device> FindDevice(const std::string& sysfs, DeviceNumber number) {
+  return FindDevice(sysfs + "/dev/block/" + std::to_string(number.major) + ':' +
+                    std::to_string(number.minor));
+}
+
 /// The device that a volume is on, if it is on one. Volumes that may be on several, such as those
 /// of btrfs, have no device number and are found by their source.
 std::optional<Device> FindDevice(const std::string& sysfs, const Mount& mount) {
   if (mount.device.major != 0) {
-    const std::string number =
-        std::to_string(mount.device.major) + ':' + std::to_string(mount.device.minor);
-    if (auto device = FindDevice(sysfs + "/dev/block/" + number)) return device;
+    if (auto device = FindDevice(sysfs, mount.device)) return device;
   }
   const std::string name = SysfsName(mount.source);
   if (name.empty()) return std::nullopt;
@@ -221,17 +225,47 @@ bool CallerMayWrite(const Mount& mount, const Device& device) {
   return ::faccessat(AT_FDCWD, mount.folder.c_str(), W_OK, AT_EACCESS) == 0;
 }
 
-DriveTraits TraitsOf(const Mount& mount, const std::string& sysfs) {
+/// Nothing where there is none that a volume could be on.
+DriveTraits TraitsOf(const std::optional<Device>& device) {
   constexpr std::string_view kScsiOptical = "5";
+  if (!device || IsNeverTakenOut(*device)) return {};
+  const std::string type = TypeOf(*device);
+  const bool optical = type == kScsiOptical;
+  return {.optical = optical, .ejectable = optical || IsEjectable(*device, type)};
+}
+
+DriveTraits TraitsOf(const Mount& mount, const std::string& sysfs) {
   if (IsRemote(mount)) return {.remote = true};
   const std::optional<Device> device = FindDevice(sysfs, mount);
-  if (!device || IsNeverTakenOut(*device)) return {};
-  DriveTraits traits;
-  const std::string type = TypeOf(*device);
-  traits.optical = type == kScsiOptical;
-  traits.ejectable = traits.optical || IsEjectable(*device, type);
+  DriveTraits traits = TraitsOf(device);
   traits.writable = traits.ejectable && CallerMayWrite(mount, *device);
   return traits;
+}
+
+/// Where something else has been put in the place of the kernel's files, the kernel does not know.
+bool IsOfKernel(const std::string& path, decltype(statfs::f_type) type) {
+  struct statfs volume;
+  return ::statfs(path.c_str(), &volume) == 0 && volume.f_type == type;
+}
+
+/// File systems that are on one disk of this machine, to which their number leads.
+bool IsOnOneDisk(const MountedVolume& volume) {
+  constexpr std::uint64_t kTypes[] = {EXFAT_SUPER_MAGIC,
+                                      EXT4_SUPER_MAGIC,
+                                      F2FS_SUPER_MAGIC,
+                                      ISOFS_SUPER_MAGIC,
+                                      MSDOS_SUPER_MAGIC,
+                                      SQUASHFS_MAGIC,
+                                      XFS_SUPER_MAGIC};
+  return volume.device.major != 0 && std::ranges::find(kTypes, volume.magic) != std::end(kTypes);
+}
+
+/// Images in files are not taken out, and sysfs would take longer to say so than all the rest.
+bool IsFixed(const MountedVolume& volume, const std::string& sysfs) {
+  if (!IsOnOneDisk(volume)) return false;
+  if (volume.device.major == LOOP_MAJOR && IsOfKernel(sysfs, SYSFS_MAGIC)) return true;
+  const std::optional<Device> device = FindDevice(sysfs, volume.device);
+  return device && !TraitsOf(device).ejectable;
 }
 
 // --- The volume of an item
@@ -339,7 +373,7 @@ class SystemDrives final : public Drives {
  public:
   explicit SystemDrives(SystemRoots roots)
       : sysfs_(std::move(roots.sysfs)),
-        isOfKernel_(IsOfKernel(roots.mountTable)),
+        isOfKernel_(IsOfKernel(roots.mountTable, PROC_SUPER_MAGIC)),
         mounts_(std::move(roots.mountTable)) {}
 
   Result<VolumeId> VolumeOf(const std::string& path) const override {
@@ -357,6 +391,8 @@ class SystemDrives final : public Drives {
     const ErrnoKeeper errnoKeeper;
     const bool hasUniqueNumber = volume.device == 0;
     if (isOfKernel_ && hasUniqueNumber) {
+      const auto known = ReadVolume(volume.mount);
+      if (known && IsFixed(*known, sysfs_)) return DriveTraits{};
       if (const auto mount = ReadMount(volume.mount)) return TraitsOf(*mount, sysfs_);
     }
     if (mounts_.FindRemote(path)) return DriveTraits{.remote = true};
@@ -370,12 +406,6 @@ class SystemDrives final : public Drives {
   }
 
  private:
-  /// Where something else has been put in the table's place, the kernel does not know of it.
-  static bool IsOfKernel(const std::string& mountTable) {
-    struct statfs volume;
-    return ::statfs(mountTable.c_str(), &volume) == 0 && volume.f_type == PROC_SUPER_MAGIC;
-  }
-
   bool MayDoWithoutTable() const {
     if (!isOfKernel_ || mounts_.IsFresh()) return false;
     if (withoutTable_.fetch_add(1, std::memory_order_relaxed) < kMostWithoutTable) return true;

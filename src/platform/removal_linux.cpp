@@ -78,6 +78,7 @@ Result<Outcome> RemoveFolderEntry(int folder, const char* name) {
 
 /// Removes an entry that is no folder with content, whatever it may be by now.
 Result<Outcome> RemoveEntry(int folder, const char* name, unsigned char type) {
+  if (type == DT_DIR && IsMountPoint(folder, name)) return kBusy;
   if (Status open = RefuseLockedEntry(folder, name); !open) return open.Reason();
   if (type == DT_DIR) return RemoveFolderEntry(folder, name);
   if (Unlink(folder, name, 0) == 0) return Outcome::kGone;

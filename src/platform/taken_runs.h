@@ -14,8 +14,9 @@
 /// Where the kernel does not see everybody's changes, as on a network volume, nothing is
 /// remembered.
 ///
-/// Costs one descriptor and the watch of a few folders. May be called from any thread; a forked
-/// child begins anew.
+/// Costs one descriptor and the watch of a few folders, so it is for long series. Where the kernel
+/// grants no more of them, nothing is remembered. May be called from any thread; a forked child
+/// begins anew.
 
 namespace orb::platform {
 
@@ -31,7 +32,7 @@ struct TakenRun {
 TakenRun RecallRun(const HeldFolder& folder, const std::string& name);
 
 /// Gives a ticket. From now on it is seen what leaves the folder: look then which numbers are
-/// taken, and keep that. All names of the series begin with `stem`.
+/// taken, from the first one on, and keep that. All names of the series begin with `stem`.
 std::uint64_t WatchRun(const HeldFolder& folder, const std::string& name, const std::string& stem);
 
 /// For numbers that were taken, all of them, at some time since the ticket was given. It is

@@ -45,7 +45,7 @@ struct Series {
   TakenRun run;
 };
 
-/// The owner of the lock calls it.
+/// The owner of the lock calls it. It has a descriptor only while it has a series.
 class Memory {
  public:
   std::mutex lock;
@@ -58,7 +58,7 @@ class Memory {
     ssize_t size = 0;
     while ((size = Retry([&] { return ::read(events_.Get(), block.data(), block.size()); })) > 0)
       ForgetDeparted({block.data(), static_cast<std::size_t>(size)});
-    if (errno != EAGAIN) Clear();
+    if (errno != EAGAIN || series_.empty()) Clear();
   }
 
   Series* Find(const Identity& folder, const std::string& name) {
@@ -74,7 +74,10 @@ class Memory {
     if (!events_) events_ = UniqueFd(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
     const std::string path = "/proc/self/fd/" + std::to_string(folder);
     series.watch = ::inotify_add_watch(events_.Get(), path.c_str(), kDepartures);
-    if (series.watch < 0) return nullptr;
+    if (series.watch < 0) {
+      if (series_.empty()) Clear();
+      return nullptr;
+    }
     series.run.ticket = ++tickets_;
     return &series_.emplace_back(std::move(series));
   }
@@ -129,8 +132,9 @@ class Memory {
   std::uint64_t tickets_ = 0;
 };
 
+/// Never destroyed: a static object's destructor may still make a file.
 Memory& TheMemory() {
-  static Memory memory;
+  static Memory& memory = *new Memory;
   return memory;
 }
 

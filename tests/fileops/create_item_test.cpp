@@ -2,6 +2,8 @@
 #include <orb/fileops/create.h>
 #include <orb/fileops/path_relations.h>
 
+#include <atomic>
+#include <cstdlib>
 #include <random>
 #include <thread>
 #include <vector>
@@ -69,11 +71,17 @@ void Disturb(const fs::path& folder, int number, int kind) {
   fs::create_directory(folder, ignored);
 }
 
+/// What is known of a series is kept only of one that has this number.
+void MakeLong(const fs::path& folder, const std::string& stem) {
+  std::ofstream file(folder / (stem + "_100.jpg"));
+}
+
 void CompareWithFirstFree(const std::string& folder) {
   std::mt19937 random(7);
   fs::create_directory(folder);
   for (int i = 0; i < 500; ++i) {
     const std::string stem = random() % 3 == 0 ? "q" : "p";
+    MakeLong(folder, stem);
     const std::string expected = FirstFree(folder, stem, ".jpg");
     ASSERT_EQ(Unique(folder, stem + ".jpg"), expected) << i;
     if (random() % 4 == 0)
@@ -102,18 +110,72 @@ TEST(CreateUniqueFile, SeesInAChildAndBesideItWhatTheOtherRemoves) {
     fs::remove(folder / "p_5.jpg");
     Unique(folder.Path(), "other.jpg");  // Looks at what has happened.
   };
+  MakeLong(folder.Path(), "p");
   for (int i = 0; i < 20; ++i) Unique(folder.Path(), "p.jpg");
   ORB_IN_CHILD(RunInChild([] { return true; }, child));
   EXPECT_EQ(Unique(folder.Path(), "p.jpg"), "p_5.jpg");
 }
 
-TEST(CreateUniqueFile, HoldsAtMostOneDescriptor) {
-  const auto before = OpenDescriptors();
-  for (int i = 0; i < 12; ++i) {
-    const Tree folder;
-    for (int j = 0; j < 7; ++j) Unique(folder.Path(), "p.jpg");
+// Somebody removes a name while it is found out which are taken.
+TEST(CreateUniqueFile, RemembersNothingThatLeftBeforeItWatched) {
+  const Tree parent;
+  std::mt19937 random(7);
+  for (int round = 0; round < 200; ++round) {
+    const std::string folder = parent / std::to_string(round);
+    fs::create_directory(folder);
+    for (const char* name : {"p.jpg", "p_1.jpg", "p_2.jpg", "p_3.jpg", "p_100.jpg"})
+      std::ofstream(fs::path(folder) / name).put('x');
+    std::atomic<bool> begun = false;
+    std::thread other([&] {
+      while (!begun) continue;
+      for (volatile auto wait = random() % 20'000; wait > 0;) wait = wait - 1;
+      fs::remove(folder + "/p_2.jpg");
+    });
+    begun = true;
+    const std::string made = Unique(folder, "p.jpg");
+    other.join();
+    ASSERT_EQ(Unique(folder, "p.jpg"), made == "p_2.jpg" ? "p_4.jpg" : "p_2.jpg") << round;
   }
-  EXPECT_LE(OpenDescriptors(), before + 1);
+}
+
+void MakeTenSeries(const std::string& folder, const std::string& stem, int size) {
+  for (int i = 0; i < 10; ++i) {
+    for (int j = 0; j < size; ++j) Unique(folder, stem + std::to_string(i));
+  }
+}
+
+TEST(CreateUniqueFile, HoldsADescriptorForLongSeriesOnly) {
+  const Tree parent;
+  const std::string folder = parent / "folder";
+  const auto count = [&] {
+    fs::create_directory(folder);
+    Unique(folder, "first");
+    const auto before = OpenDescriptors();
+    MakeTenSeries(folder, "short", 50);
+    EXPECT_EQ(OpenDescriptors(), before);
+    MakeTenSeries(folder, "long", 110);
+    EXPECT_EQ(OpenDescriptors(), before + 1);
+    fs::remove_all(folder);
+    Unique(parent.Path(), "last");
+    EXPECT_EQ(OpenDescriptors(), before);
+  };
+  ORB_IN_CHILD(RunInChild([] { return true; }, count));
+}
+
+void MakeAtExit() {
+  const Tree folder;
+  MakeLong(folder.Path(), "p");
+  for (int i = 0; i < 9; ++i) Unique(folder.Path(), "p.jpg");
+  if (!fs::exists(folder / "p_8.jpg")) ::_exit(1);
+}
+
+TEST(CreateUniqueFile, WorksUntilTheProgramHasEnded) {
+  const auto useAndExit = [] {
+    std::atexit(MakeAtExit);
+    MakeAtExit();
+    std::exit(0);
+  };
+  EXPECT_EXIT(useAndExit(), testing::ExitedWithCode(0), "");
 }
 
 TEST(TakenRuns, AreEndedByWhatMayBeAnotherSpelling) {
@@ -146,6 +208,7 @@ TEST(CreateUniqueFile, EndsWhereNoNumberCanHelp) {
       {"locked", longest, kOrbErrInvalidName},
       {"locked", "a", kOrbErrAccessDenied},
   };
+  Unique(tree.Path(), "first");  // Lets go of folders that were watched and are gone.
   const Unchanged unchanged(tree.Path());
   for (const auto& [folder, name, expected] : kCases)
     EXPECT_EQ(Unique(tree.At(folder), name), std::to_string(expected)) << folder << name;

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 #include "platform/drives.h"
 
-#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <sys/sysmacros.h>
 #include <unistd.h>
 
 #include <array>
@@ -214,15 +214,32 @@ TEST(Drives, LearnOfOneMountWhatTheTableTells) {
   ORB_IN_CHILD(test::RunWithPrivateMounts(compare));
 }
 
+TEST(Drives, LookForARealVolumesDiskInWhatIsMountedAsSysfs) {
+  Machine machine;
+  const std::string folder = machine.Folder().Path();
+  struct stat status;
+  ASSERT_EQ(::stat(folder.c_str(), &status), 0);
+  if (major(status.st_dev) == 0) GTEST_SKIP() << "the folder is on no disk";
+  const std::string number =
+      std::to_string(major(status.st_dev)) + ':' + std::to_string(minor(status.st_dev));
+  machine.AddDevice("pci0/usb1/1-1/block/sdx", number);
+  const auto isEjectable = [&] {
+    const auto drives = MakeDrives({});
+    const VolumeId volume = drives->VolumeOf(folder).Value();
+    return drives->Read(folder, volume).Value().ejectable;
+  };
+  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+    ASSERT_TRUE(test::BindMount(folder + "/sys", "/sys"));
+    EXPECT_TRUE(isEjectable());
+  }));
+}
+
 TEST(Drives, DoNotWaitForAServerThatDoesNotAnswer) {
   const test::TempFolder folder;
   fs::create_directory(folder / "share");
   ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
-    const int server = ::open("/dev/fuse", O_RDWR | O_CLOEXEC);
-    const std::string options =
-        "fd=" + std::to_string(server) + ",rootmode=40000,user_id=0,group_id=0";
     const std::string share = folder / "share";
-    if (::mount("nas:", share.c_str(), "fuse.sshfs", 0, options.c_str()) != 0) return;
+    if (!test::MountDeadShare(share)) return;
     ::alarm(20);
     for (const char* below : {"", "/photo.jpg"}) {
       const auto drives = MakeDrives({});

@@ -64,6 +64,16 @@ TEST(RemoveItem, DoesNotEnterAVolumeMountedInside) {
   }));
 }
 
+TEST(RemoveItem, DoesNotAskAServerThatIsGoneAboutAVolumeMountedInside) {
+  const Tree folder("tree/share/");
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    if (!MountDeadShare(folder / "tree/share")) return;
+    ::alarm(20);
+    EXPECT_EQ(ErrorOf(ExpectRemovable(folder / "tree")), kNotPermitted);
+    EXPECT_EQ(ErrorOf(RemoveItem(folder / "tree")), kBusy);
+  }));
+}
+
 // Somebody exchanges a folder in the tree for a link to a folder outside, again and again.
 TEST(RemoveItem, LeavesTheTreeThroughNoSwappedLink) {
   const Tree tree("outside/photo=x, trap -> outside");

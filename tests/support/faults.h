@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #pragma once
 
+#include <fcntl.h>
 #include <grp.h>
 #include <gtest/gtest.h>
 #include <sched.h>
@@ -76,6 +77,14 @@ inline bool MountTmpfs(const std::string& folder, const std::string& options) {
 /// What is at `source` appears at `target` as well, which becomes busy.
 inline bool BindMount(const std::string& source, const std::string& target) {
   return ::mount(source.c_str(), target.c_str(), nullptr, MS_BIND, nullptr) == 0;
+}
+
+/// A network volume whose server is gone: nothing that is asked of it is answered.
+inline bool MountDeadShare(const std::string& folder) {
+  const int server = ::open("/dev/fuse", O_RDWR | O_CLOEXEC);
+  const std::string options =
+      "fd=" + std::to_string(server) + ",rootmode=40000,user_id=0,group_id=0";
+  return ::mount("nas:", folder.c_str(), "fuse.sshfs", 0, options.c_str()) == 0;
 }
 
 /// The folder becomes a read-only volume that holds what it held.

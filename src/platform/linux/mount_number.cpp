@@ -66,6 +66,13 @@ std::string TypeOf(const MountReply& reply) {
   return type.append(".").append(&reply.texts[reply.subtype]);
 }
 
+/// Whether all that is needed is known.
+bool Ask(std::uint64_t number, std::uint64_t needed, std::uint64_t wanted, MountReply* reply) {
+  const MountRequest request{sizeof request, 0, number, needed | wanted};
+  return ::syscall(kStatmount, &request, reply, sizeof *reply, 0) == 0 &&
+         (reply->known & needed) == needed;
+}
+
 }  // namespace
 
 std::optional<std::uint64_t> MountNumberInMemory(const std::string& path) {
@@ -82,12 +89,16 @@ std::optional<std::uint64_t> MountNumberInMemory(const std::string& path) {
   return told != 0 && errno == EOVERFLOW ? std::optional(number) : std::nullopt;
 }
 
-std::optional<Mount> ReadMount(std::uint64_t number) {
-  constexpr std::uint64_t kNeeded = kOfFileSystem | kOfMount | kFolder | kType;
-  const MountRequest request{sizeof request, 0, number, kNeeded | kSubtype | kSource};
+std::optional<MountedVolume> ReadVolume(std::uint64_t number) {
   MountReply reply;
-  if (::syscall(kStatmount, &request, &reply, sizeof reply, 0) != 0) return std::nullopt;
-  if ((reply.known & kNeeded) != kNeeded) return std::nullopt;
+  if (!Ask(number, kOfFileSystem, 0, &reply)) return std::nullopt;
+  return MountedVolume{{reply.major, reply.minor}, reply.magic};
+}
+
+std::optional<Mount> ReadMount(std::uint64_t number) {
+  MountReply reply;
+  constexpr std::uint64_t kNeeded = kOfFileSystem | kOfMount | kFolder | kType;
+  if (!Ask(number, kNeeded, kSubtype | kSource, &reply)) return std::nullopt;
   Mount mount;
   mount.id = number;
   mount.device = {reply.major, reply.minor};

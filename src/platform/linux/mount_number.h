@@ -18,6 +18,16 @@ namespace orb::platform {
 /// system is not asked, so that a server that is gone does not hang the answer.
 std::optional<std::uint64_t> MountNumberInMemory(const std::string& path);
 
+/// What is mounted.
+struct MountedVolume {
+  DeviceNumber device;
+  /// The file system's, as statfs() tells it.
+  std::uint64_t magic = 0;
+};
+
+/// The volume of the mount with such a number. The texts take the kernel longer than all the rest.
+std::optional<MountedVolume> ReadVolume(std::uint64_t number);
+
 /// The mount with such a number, which is its id as well.
 std::optional<Mount> ReadMount(std::uint64_t number);
 

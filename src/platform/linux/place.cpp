@@ -2,6 +2,8 @@
 #include "platform/linux/place.h"
 
 #include <fcntl.h>
+#include <linux/openat2.h>
+#include <sys/syscall.h>
 
 #include <optional>
 #include <utility>
@@ -40,6 +42,15 @@ UniqueFd OpenFile(int folder, const char* name, int flags) {
   const int all = flags | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
   UniqueFd file(Retry([&] { return ::openat(folder, name, all); }));
   return file || errno != EWOULDBLOCK ? std::move(file) : OpenLeased(folder, name, flags);
+}
+
+bool IsMountPoint(int folder, const char* name) {
+  open_how how{};
+  how.flags = O_PATH | O_NOFOLLOW | O_CLOEXEC;
+  how.resolve = RESOLVE_NO_XDEV;
+  const auto open = [&] { return ::syscall(SYS_openat2, folder, name, &how, sizeof how); };
+  const UniqueFd item(static_cast<int>(Retry(open)));
+  return !item && errno == EXDEV;
 }
 
 Result<Place> Locate(const std::string& path) {

@@ -37,6 +37,10 @@ Result<struct stat> ReadStatus(const Place& place);
 /// and errno, when it fails.
 UniqueFd OpenFile(int folder, const char* name, int flags);
 
+/// Whether something is mounted on an entry. That itself is not asked: its server may be gone.
+/// Kernels before 5.6 do not tell.
+bool IsMountPoint(int folder, const char* name);
+
 /// Which file or folder it is, for as long as somebody holds it open.
 struct Identity {
   dev_t device = 0;

@@ -80,6 +80,15 @@ class Surveyor {
     return S_ISDIR(status.st_mode);
   }
 
+  /// A volume mounted inside takes up no space on this one and cannot be removed.
+  Result<bool> VisitEntry(const FolderStream::Entry& entry) {
+    const Level& level = levels_.back();
+    const bool isMounted = entry.type == DT_DIR && IsMountPoint(level.folder.Get(), entry.name);
+    if (!isMounted) return Visit(level.folder.Get(), entry.name, level.path);
+    survey_.canBeRemoved = false;
+    return false;
+  }
+
   Status LookForLock(int folder, const char* name) {
     constexpr int kFlags = O_PATH | O_NOFOLLOW | O_CLOEXEC;
     const UniqueFd item(Retry([&] { return ::openat(folder, name, kFlags); }));
@@ -126,7 +135,7 @@ class Surveyor {
       if (!entry) return entry.Reason();
       if (entry.Value().name == nullptr) return {};
       if (isFirst) LookForPermission(folder);
-      const auto isFolder = Visit(folder, entry.Value().name, level->path);
+      const auto isFolder = VisitEntry(entry.Value());
       if (!isFolder) return isFolder.Reason();
       if (isFolder.Value()) level->pending.emplace_back(entry.Value().name);
     }
