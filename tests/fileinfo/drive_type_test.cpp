@@ -6,9 +6,11 @@
 #include <atomic>
 #include <string>
 #include <thread>
+#include <utility>
 #include <vector>
 
 #include "platform/drives.h"
+#include "support/paths.h"
 #include "support/temp_folder.h"
 
 namespace {
@@ -17,8 +19,8 @@ using orb::platform::DriveTraits;
 using orb::platform::Result;
 using orb::platform::VolumeId;
 
-/// A machine of one volume, which counts how often it is looked at. Every test takes a number of
-/// its own, because what was found out stays.
+/// This machine while it lives: one of one volume, which counts how often it is looked at. Every
+/// test takes a number of its own, because what was found out stays.
 class OneVolume final : public orb::platform::Drives {
  public:
   OneVolume(std::uint64_t number, Result<DriveTraits> traits) : number_(number), traits_(traits) {}
@@ -37,20 +39,15 @@ class OneVolume final : public orb::platform::Drives {
  private:
   std::uint64_t number_;
   Result<DriveTraits> traits_;
+  orb::platform::ScopedDrives scoped_{*this};
 };
 
-unsigned int DriveTypeOf(const char* path) {
-  const COrbStringData text(OrbCharUtf8{path});
-  COrbFileHandle handle;
-  handle.Initialize(&text);
-  return handle.GetDriveType();
+unsigned int DriveTypeOf(const std::string& path) {
+  return COrbFileHandle(PathOf(path)).GetDriveType();
 }
 
 TEST(GetDriveType, TakesTheFirstThatHolds) {
-  const struct {
-    DriveTraits traits;
-    unsigned int type;
-  } kCases[] = {
+  const std::pair<DriveTraits, unsigned int> kCases[] = {
       {{}, 0x100},
       {{.writable = true}, 0x100},
       {{.optical = true, .remote = true, .ejectable = true}, 0x200},
@@ -59,12 +56,11 @@ TEST(GetDriveType, TakesTheFirstThatHolds) {
       {{.ejectable = true}, 0x1000},
   };
   std::uint64_t number = 1000;
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.type);
-    const OneVolume volume(++number, c.traits);
-    const orb::platform::ScopedDrives scoped(volume);
-    EXPECT_EQ(DriveTypeOf("/a"), c.type);
-    EXPECT_EQ(DriveTypeOf("/b"), c.type);
+  for (const auto& [traits, type] : kCases) {
+    SCOPED_TRACE(type);
+    const OneVolume volume(++number, traits);
+    EXPECT_EQ(DriveTypeOf("/a"), type);
+    EXPECT_EQ(DriveTypeOf("/b"), type);
     EXPECT_EQ(volume.reads, 1) << "kept for the volume";
   }
 }
@@ -72,14 +68,12 @@ TEST(GetDriveType, TakesTheFirstThatHolds) {
 TEST(GetDriveType, KeepsAVolumesTypeAndNoFailure) {
   {
     const OneVolume broken(2001, orb::platform::kNotPermitted);
-    const orb::platform::ScopedDrives scoped(broken);
     EXPECT_EQ(DriveTypeOf("/a"), 0x100u);
     EXPECT_EQ(DriveTypeOf("/gone"), 0x100u);
     EXPECT_EQ(broken.reads, 1);
   }
   {
     const OneVolume stick(2001, DriveTraits{.ejectable = true, .writable = true});
-    const orb::platform::ScopedDrives scoped(stick);
     EXPECT_EQ(DriveTypeOf("/gone"), 0x100u);
     EXPECT_EQ(DriveTypeOf(""), 0x100u);
     EXPECT_EQ(DriveTypeOf("/\xff"), 0x100u) << "no text that names an item";
@@ -105,9 +99,9 @@ TEST(GetDriveType, MayBeAskedFromSeveralThreads) {
 
 TEST(GetDriveType, AnswersForThisMachine) {
   const orb::test::TempFolder folder;
-  const unsigned int type = DriveTypeOf(folder.Path().c_str());
+  const unsigned int type = DriveTypeOf(folder.Path());
   EXPECT_TRUE(type == 0x100 || type == 0x400 || type == 0x800) << type;
-  EXPECT_EQ(DriveTypeOf((folder / "gone").c_str()), 0x100u);
+  EXPECT_EQ(DriveTypeOf(folder / "gone"), 0x100u);
 }
 
 }  // namespace

@@ -1,41 +1,20 @@
 // SPDX-License-Identifier: MIT
-#include <gtest/gtest.h>
-#include <orb/fileinfo/file_handle.h>
-#include <sys/stat.h>
-
 #include <cerrno>
-#include <filesystem>
-#include <string>
-#include <tuple>
 
 #include "fileinfo/item_times.h"
-#include "platform/items.h"
-#include "support/faults.h"
+#include "support/files.h"
 #include "support/forwarding_items.h"
-#include "support/temp_folder.h"
-#include "support/texts.h"
 
+namespace orb::test {
 namespace {
 
-namespace fs = std::filesystem;
-using orb::platform::ItemInfo;
-using orb::platform::Items;
-using orb::platform::PathText;
-using orb::platform::Result;
-using orb::platform::Timestamp;
-using orb::test::TempFolder;
+using platform::Timestamp;
 
 constexpr unsigned int kUsual =
     kOrbFileAttrVolumeWritable | kOrbFileAttrReadable | kOrbFileAttrWritable;
-constexpr uid_t kStranger = 65534;
 constexpr gid_t kNobodysGroup = 54321;
 
-COrbFileHandle HandleOf(const std::string& path) {
-  COrbFileHandle handle;
-  const COrbStringData text = S(path);
-  handle.Initialize(&text);
-  return handle;
-}
+COrbFileHandle HandleOf(const std::string& path) { return COrbFileHandle(PathOf(path)); }
 
 unsigned int AttributesOf(const std::string& path) { return HandleOf(path).GetAttribute(); }
 
@@ -44,100 +23,79 @@ std::uint64_t Seconds(const UTCDateTime& time) {
 }
 
 /// Answers for the real item, with a change that a test makes.
-struct AlteredItems : orb::test::ForwardingItems {
-  Result<ItemInfo> Read(PathText path) const override {
+struct AlteredItems : ForwardingItems {
+  platform::Result<platform::ItemInfo> Read(platform::PathText path) const override {
     if (failure) return *failure;
-    Result<ItemInfo> info = ForwardingItems::Read(path);
+    auto info = ForwardingItems::Read(path);
     if (volumeFailure) info.Value().volumeReadOnly = *volumeFailure;
     return info;
   }
-  std::optional<orb::platform::Error> failure;
-  std::optional<orb::platform::Error> volumeFailure;
+  std::optional<platform::Error> failure;
+  std::optional<platform::Error> volumeFailure;
 };
 
 TEST(Collect, TellsFilesFoldersPackagesAndLinks) {
-  const TempFolder folder;
-  folder.Write("a.jpg", "12345");
-  folder.Write("\xC3\xA4%n.JPEG", "");
-  fs::permissions(folder / "\xC3\xA4%n.JPEG", fs::perms(0444));
-  for (const char* name : {"x.jpg", "p.app", "P.Bundle", ".app", "p.apps", "q.mov/Contents"}) {
-    fs::create_directories(folder / name);
-  }
-  folder.Write("q.mov/Contents/Info.plist", "");
-  folder.Write("file.app", "");
-  fs::create_symlink("a.jpg", folder / "link.jpg");
-  ASSERT_EQ(::mkfifo((folder / "fifo.txt").c_str(), 0600), 0);
+  const Tree tree("a.jpg=12345, \xC3\xA4%n.JPEG= 0444, x.jpg/, p.app/, P.Bundle/, .app/, p.apps/");
+  tree.Make("q.mov/Contents/Info.plist, file.app=, link.jpg -> a.jpg, fifo.txt|");
   constexpr unsigned int kUsualFolder = kUsual | kOrbFileAttrFolder;
-  const struct {
-    const char* path;
-    const char* name;
-    unsigned int attributes;
-    eOrbFileType type;
-    std::uint64_t size;
-  } kCases[] = {
+  constexpr eOrbFileType kUnknown = eOrbFileType_Unknown;
+  const std::tuple<const char*, const char*, unsigned, eOrbFileType, std::uint64_t> kCases[] = {
       {"a.jpg", "a.jpg", kUsual, eOrbFileType_Jpeg, 5},
       {"\xC3\xA4%n.JPEG", "\xC3\xA4%n.JPEG", 0x0C, eOrbFileType_Jpeg, 0},
-      {"x.jpg", "x.jpg", kUsualFolder, eOrbFileType_Unknown, 0},
-      {"x.jpg//", "x.jpg", kUsualFolder, eOrbFileType_Unknown, 0},
-      {"p.app/", "p.app", kUsual, eOrbFileType_Unknown, 0},
-      {"P.Bundle", "P.Bundle", kUsual, eOrbFileType_Unknown, 0},
-      {".app", ".app", kUsualFolder, eOrbFileType_Unknown, 0},
-      {"p.apps", "p.apps", kUsualFolder, eOrbFileType_Unknown, 0},
-      {"file.app", "file.app", kUsual, eOrbFileType_Unknown, 0},
+      {"x.jpg", "x.jpg", kUsualFolder, kUnknown, 0},
+      {"x.jpg//", "x.jpg", kUsualFolder, kUnknown, 0},
+      {"p.app/", "p.app", kUsual, kUnknown, 0},
+      {"P.Bundle", "P.Bundle", kUsual, kUnknown, 0},
+      {".app", ".app", kUsualFolder, kUnknown, 0},
+      {"p.apps", "p.apps", kUsualFolder, kUnknown, 0},
+      {"file.app", "file.app", kUsual, kUnknown, 0},
       {"q.mov", "q.mov", kUsual, eOrbFileType_Mov, 0},  // Marked, and typed by its name.
-      {"link.jpg", "link.jpg", kUsual, eOrbFileType_Unknown, 5},
+      {"link.jpg", "link.jpg", kUsual, kUnknown, 5},
       {"fifo.txt", "fifo.txt", kUsual, eOrbFileType_Txt, 0},  // Nobody waits for its other end.
+      {"/", "/", kUsualFolder, kUnknown, 0},
   };
   errno = 1234;
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.path);
-    const COrbFileHandle handle = HandleOf(folder / c.path);
+  for (const auto& [path, name, attributes, type, size] : kCases) {
+    SCOPED_TRACE(path);
+    const COrbFileHandle handle = HandleOf(tree.At(path));
     COrbStringData actual, shown;
     EXPECT_EQ(handle.GetActualName(actual), kOrbNoErr);
     EXPECT_EQ(handle.GetDisplayName(shown), kOrbNoErr);
-    EXPECT_EQ(Text(actual), c.name);
-    EXPECT_EQ(Text(shown), c.name);
-    EXPECT_EQ(handle.GetAttribute(), c.attributes);
-    EXPECT_EQ(handle.GetFileType(), c.type);
-    EXPECT_EQ(handle.GetFileSize(), c.size);
+    EXPECT_EQ(Text(actual), name);
+    EXPECT_EQ(Text(shown), name);
+    EXPECT_EQ(handle.GetAttribute(), attributes);
+    EXPECT_EQ(handle.GetFileType(), type);
+    EXPECT_EQ(handle.GetFileSize(), size);
   }
   EXPECT_EQ(errno, 1234);  // The host's own is left alone.
-  COrbStringData root;
-  EXPECT_EQ(HandleOf("/").GetActualName(root), kOrbNoErr);
-  EXPECT_EQ(Text(root), "/");
 }
 
 TEST(GetAttribute, AsksForTheCallerAndTheVolume) {
-  const TempFolder folder;
-  fs::permissions(folder.Path(), fs::perms(0755));
-  const std::string open = folder.Write("open", "");
-  const std::string closed = folder.Write("closed", "");
-  fs::create_symlink("open", folder / "link");
-  fs::permissions(open, fs::perms(0666));
-  fs::permissions(closed, fs::perms(0664));
+  const Tree tree("in/open 0666, in/closed 0664, in/link -> open, in/ 0755");
+  const std::string open = tree / "in/open";
+  const std::string closed = tree / "in/closed";
   for (const std::string& path : {open, closed}) {
     if (::chown(path.c_str(), 0, kNobodysGroup) != 0) GTEST_SKIP() << "needs root";
   }
-  ORB_IN_CHILD(orb::test::RunAsUser(kStranger, [&] {
+  ORB_IN_CHILD(RunAsUser(kStranger, [&] {
     EXPECT_EQ(AttributesOf(open), kUsual);
     COrbFileHandle handle = HandleOf(closed);
     EXPECT_EQ(handle.GetAttribute(), 0x0CU);
     EXPECT_EQ(handle.SetAttribute(kOrbFileAttrLocked), kOrbErrAccessDenied);
     EXPECT_EQ(handle.SetUpdateTime(COrbTime(1ULL)), kOrbErrAccessDenied);
   }));
-  ORB_IN_CHILD(orb::test::RunWithPrivateMounts([&] {
-    ASSERT_TRUE(orb::test::MakeReadOnlyVolume(folder.Path()));
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(MakeReadOnlyVolume(tree.Path()));
     EXPECT_EQ(AttributesOf(open), kOrbFileAttrReadable);
-    EXPECT_EQ(AttributesOf(folder / "link"), kOrbFileAttrReadable);
-    EXPECT_EQ(AttributesOf(folder.Path()), kOrbFileAttrReadable | kOrbFileAttrFolder);
+    EXPECT_EQ(AttributesOf(tree / "in/link"), kOrbFileAttrReadable);
+    EXPECT_EQ(AttributesOf(tree / "in"), kOrbFileAttrReadable | kOrbFileAttrFolder);
     EXPECT_EQ(HandleOf(open).SetUpdateTime(COrbTime(1ULL)), kOrbErrAccessDenied);
   }));
 }
 
 TEST(GetAttribute, OfAPathReadsTheRecordAlone) {
-  const TempFolder folder;
-  const std::string file = folder.Write("file", "");
-  fs::create_directory(folder / "p.app");
+  const Tree folder("file, p.app/");
+  const std::string file = folder / "file";
   for (const auto& [mode, attributes] : {std::pair(0644, kUsual),
                                          {0440, kOrbFileAttrReadable},
                                          {0040, kOrbFileAttrReadable},
@@ -155,25 +113,22 @@ TEST(GetAttribute, OfAPathReadsTheRecordAlone) {
 }
 
 TEST(Collect, GivesNeutralAnswersWhereNothingIs) {
-  const TempFolder folder;
-  folder.Write("\xFF", "");  // A name that is no UTF-8 is out of reach.
-  fs::create_symlink("nowhere", folder / "dangling");
+  const Tree tree("\xFF, dangling -> nowhere");
   const std::pair<std::string, OrbResult> kCases[] = {
       {"", kOrbErrNoSuchFile},
-      {folder / "no", kOrbErrNotFound},
-      {folder / "\xFF", kOrbErrNoSuchFile},
-      {folder / "dangling", kOrbNoErr},  // The entry itself has times.
-      {folder / std::string(300, 'n'), kOrbErrInvalidName},
+      {"no", kOrbErrNotFound},
+      {"\xFF", kOrbErrNoSuchFile},  // A name that is no UTF-8 is out of reach.
+      {"dangling", kOrbNoErr},      // The entry itself has times.
+      {std::string(300, 'n'), kOrbErrInvalidName},
   };
   for (const auto& [path, timesResult] : kCases) {
     SCOPED_TRACE(path);
-    COrbFileHandle handle = HandleOf(path);
+    COrbFileHandle handle = HandleOf(tree.At(path));
     EXPECT_FALSE(handle.IsExist());
     EXPECT_EQ(handle.CollectFileInformatioin(), kOrbErrNoSuchFile);
     EXPECT_EQ(handle.Update(), kOrbErrNoSuchFile);
-    EXPECT_EQ(handle.GetAttribute(), 0U);
-    EXPECT_EQ(handle.GetFileType(), eOrbFileType_Unknown);
-    EXPECT_EQ(handle.GetFileSize(), 0U);
+    EXPECT_EQ(std::tuple(handle.GetAttribute(), handle.GetFileType(), handle.GetFileSize()),
+              std::tuple(0U, eOrbFileType_Unknown, 0U));
     COrbStringData name = S("kept");
     EXPECT_EQ(handle.GetDisplayName(name), kOrbErrNotFound);
     EXPECT_EQ(handle.GetActualName(name), kOrbErrNotFound);
@@ -211,20 +166,20 @@ TEST(Collect, LeavesWhatAFailedPassHadFound) {
   COrbFileHandle old = HandleOf(file);
   EXPECT_EQ(old.GetAttribute(), kUsual);
   AlteredItems items;
-  const orb::platform::ScopedItems scope(items);
+  const platform::ScopedItems scope(items);
 
-  items.volumeFailure = orb::platform::Error{orb::platform::ErrorDomain::kPosix, ENOSPC};
+  items.volumeFailure = platform::Error{platform::ErrorDomain::kPosix, ENOSPC};
   EXPECT_EQ(fresh.CollectFileInformatioin(), kOrbErrDiskFull);
   EXPECT_EQ(fresh.GetFileSize(), 0U);  // Not collected: it is asked again.
   EXPECT_EQ(old.Update(), kOrbErrNoSuchFile);
   EXPECT_EQ(old.GetAttribute(), kOrbFileAttrReadable);
   EXPECT_EQ(old.GetFileSize(), 3U);
 
-  items.volumeFailure = orb::platform::kBusy;  // No answer and no reason: goes on.
+  items.volumeFailure = platform::kBusy;  // No answer and no reason: goes on.
   EXPECT_EQ(fresh.CollectFileInformatioin(), kOrbNoErr);
   EXPECT_EQ(fresh.GetAttribute(), kOrbFileAttrReadable);
 
-  items.failure = orb::platform::kNotPermitted;
+  items.failure = platform::kNotPermitted;
   EXPECT_EQ(old.CollectFileInformatioin(), kOrbErrAccessDenied);
   EXPECT_EQ(old.GetAttribute(), 0U);
   EXPECT_EQ(old.GetFileType(), eOrbFileType_Jpeg);
@@ -338,8 +293,7 @@ TEST(IsEqual, ComparesTextWithoutCase) {
 }
 
 TEST(FindExtensionType, LooksAtFoldersWhenAsked) {
-  const TempFolder folder;
-  fs::create_directory(folder / "y.mov");
+  const Tree folder("y.mov/");
   for (const auto& [path, type] : {std::pair(std::string("/a/b.JPEG"), eOrbFileType_Jpeg),
                                    {"/a.jpg/b", eOrbFileType_Unknown},
                                    {folder / "y.mov", eOrbFileType_Mov},
@@ -354,11 +308,7 @@ TEST(FindExtensionType, LooksAtFoldersWhenAsked) {
 }
 
 TEST(ItemTimes, AreExactAndStayInRange) {
-  const struct {
-    Timestamp time;
-    std::uint64_t ticks, seconds;
-    unsigned fraction;
-  } kCases[] = {
+  const std::tuple<Timestamp, std::uint64_t, std::uint64_t, unsigned> kCases[] = {
       {{0, 0}, 20'828'448'000'000'000, 2'082'844'800, 0},
       {{1'588'334'400, 750'000'099}, 36'711'792'007'500'000, 3'671'179'200, 49152},
       {{1'588'334'400, 999'999'999}, 36'711'792'009'999'999, 3'671'179'200, 65535},
@@ -367,13 +317,13 @@ TEST(ItemTimes, AreExactAndStayInRange) {
       {{-9'223'372'036'854'775'807, 0}, 0, 0, 0},
       {{9'223'372'036'854'775'807, 0}, 18'446'744'073'709'551'615U, 1'844'674'407'370, 62597},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.time.seconds);
-    EXPECT_EQ(orb::TicksOf(c.time), c.ticks);
-    EXPECT_EQ(Seconds(orb::UtcOf(c.time)), c.seconds);
-    EXPECT_EQ(orb::UtcOf(c.time).fraction, c.fraction);
+  for (const auto& [time, ticks, seconds, fraction] : kCases) {
+    SCOPED_TRACE(time.seconds);
+    EXPECT_EQ(TicksOf(time), ticks);
+    EXPECT_EQ(Seconds(UtcOf(time)), seconds);
+    EXPECT_EQ(UtcOf(time).fraction, fraction);
   }
-  EXPECT_EQ(orb::TimestampOf({1, 5, 9}), (Timestamp{2'212'122'501, 0}));
+  EXPECT_EQ(TimestampOf({1, 5, 9}), (Timestamp{2'212'122'501, 0}));
 }
 
 TEST(Times, AreSetInWholeSecondsAndSeenAfterUpdate) {
@@ -411,3 +361,4 @@ TEST(Times, OfTheLastAccessAreReadNow) {
 }
 
 }  // namespace
+}  // namespace orb::test

@@ -1,40 +1,19 @@
 // SPDX-License-Identifier: MIT
-#include <gtest/gtest.h>
-#include <orb/fileinfo/file_handle.h>
 #include <orb/fileops/copy.h>
-#include <sys/resource.h>
-#include <unistd.h>
 
-#include <csignal>
-#include <filesystem>
 #include <functional>
-#include <string>
 
-#include "support/faults.h"
-#include "support/paths.h"
-#include "support/temp_folder.h"
-#include "support/trees.h"
+#include "support/files.h"
 
 /// \file
 /// The copies to a full path.
 
+namespace orb::test {
 namespace {
 
-namespace fs = std::filesystem;
-using orb::test::Describe;
-using orb::test::ReadAll;
-using orb::test::TempFolder;
-
 TEST(CopyFile, TakesTwoTextsAndReplacesNothing) {
-  const TempFolder folder;
-  folder.Write("a", "a");
-  folder.Write("taken", "old");
-  fs::create_symlink("nowhere", folder / "dangling");
-  const struct {
-    const char* from;
-    const char* to;
-    OrbResult expected;
-  } kCases[] = {
+  const Tree tree("a, taken, dangling -> nowhere");
+  const Row<OrbResult> kCases[] = {
       {"a", "taken", kOrbErrUnknown},
       {"a", "a", kOrbErrUnknown},
       {"a", "missing/new", kOrbErrNotFound},
@@ -42,42 +21,29 @@ TEST(CopyFile, TakesTwoTextsAndReplacesNothing) {
       {"dangling", "new", kOrbErrNoSuchFile},
       {"\xff", "new", kOrbErrNoSuchFile},
   };
-  const auto before = Describe(folder.Path());
-  for (const auto& c : kCases)
-    EXPECT_EQ(OrbCopyFile(S(folder / c.from), S(folder / c.to)), c.expected) << c.from << c.to;
-  EXPECT_EQ(Describe(folder.Path()), before);
-  EXPECT_EQ(OrbCopyFile(S(folder / "a"), S(folder / "new")), kOrbNoErr);
-  EXPECT_EQ(ReadAll(folder / "new"), "a");
+  const auto copy = [](auto&& from, auto&& to) { return OrbCopyFile(S(from), S(to)); };
+  ExpectRefusals(tree, kCases, copy);
+  EXPECT_EQ(OrbCopyFile(S(tree / "a"), S(tree / "new")), kOrbNoErr);
+  EXPECT_EQ(tree.Read("new"), "a");
 }
 
 TEST(CopyFileOverwrite, TakesTwoFullPathsThatDifferInCaseAlone) {
-  const TempFolder folder;
-  fs::create_directory(folder / "sub");
-  fs::create_directory_symlink("sub", folder / "link");
-  folder.Write("sub/a", "new");
-  folder.Write("sub/A", "old");
-  const struct {
-    const char* from;
-    const char* to;
-    OrbResult expected;
-  } kRefused[] = {
+  const Tree tree("sub/a, sub/A, sub/locked!, link -> sub");
+  const Row<OrbResult> kRefused[] = {
       {"sub/a", "sub/a", kOrbErrAccessDenied},
       {"sub/a", "link/a", kOrbErrInsideSource},
       {"sub/a", "sub//a", kOrbErrInsideSource},
       {"sub/a", "sub", kOrbErrInsideSource},
       {"sub", "sub/A", kOrbErrInsideSource},
       {"missing", "sub/A", kOrbErrNotFound},
+      {"sub/a", "sub/locked", kOrbErrAccessDenied},
   };
-  const auto before = Describe(folder.Path());
-  const auto copy = [&](const char* from, const char* to) {
-    return OrbCopyFileOverwrite(PathOf(folder / from), PathOf(folder / to));
+  const auto copy = [](auto&& from, auto&& to) {
+    return OrbCopyFileOverwrite(PathOf(from), PathOf(to));
   };
-  for (const auto& c : kRefused) EXPECT_EQ(copy(c.from, c.to), c.expected) << c.from << c.to;
-  EXPECT_EQ(Describe(folder.Path()), before);
-  EXPECT_EQ(copy("sub/a", "sub/A"), kOrbNoErr);
-  EXPECT_EQ(ReadAll(folder / "sub/A"), "new");
-  ASSERT_TRUE(Lock(folder / "sub/A"));
-  EXPECT_EQ(copy("sub/a", "sub/A"), kOrbErrAccessDenied);
+  ExpectRefusals(tree, kRefused, copy);
+  EXPECT_EQ(OrbCopyFileOverwrite(PathOf(tree / "sub/a"), PathOf(tree / "sub/A")), kOrbNoErr);
+  EXPECT_EQ(tree.Read("sub/A"), "sub/a");
 }
 
 /// What the callback does at its first, second, ... call.
@@ -95,58 +61,43 @@ struct Calls {
 };
 
 OrbResult CopyOnto(const std::string& source, const std::string& destination, Calls* calls) {
-  return OrbCopyFileEx(
-      PathOf(source), PathOf(destination), calls != nullptr ? Calls::Call : nullptr, calls);
+  const auto call = calls != nullptr ? Calls::Call : nullptr;
+  return OrbCopyFileEx(PathOf(source), PathOf(destination), call, calls);
 }
 
 TEST(HandleCopy, OverwritesAnExistingFileFromItsStart) {
-  const TempFolder folder;
   for (const std::size_t size : {0u, 5u, 65536u, 65537u, 200000u}) {
     SCOPED_TRACE(size);
-    folder.Write("source", std::string(size, 's'));
-    folder.Write("old", std::string(100000, 'o'));
+    const std::string old(100000, 'o');
+    const std::string bytes(size, 's');
+    const Tree tree("source=" + bytes + ", old=" + old);
     Calls calls;
-    EXPECT_EQ(CopyOnto(folder / "source", folder / "old", &calls), kOrbNoErr);
+    EXPECT_EQ(CopyOnto(tree / "source", tree / "old", &calls), kOrbNoErr);
     EXPECT_EQ(calls.count, static_cast<int>((size + 65535) / 65536));
-    const std::size_t rest = size < 100000 ? 100000 - size : 0;
-    EXPECT_TRUE(ReadAll(folder / "old") == std::string(size, 's') + std::string(rest, 'o'));
+    EXPECT_TRUE(tree.Read("old") == bytes + (size < old.size() ? old.substr(size) : ""));
+    EXPECT_EQ(CopyOnto(tree / "source", tree / "old", nullptr), kOrbNoErr);
   }
-  EXPECT_EQ(CopyOnto(folder / "source", folder / "old", nullptr), kOrbNoErr);
 }
 
 TEST(HandleCopy, CarriesTimesAndLock) {
-  const TempFolder folder;
-  COrbFileHandle source(PathOf(folder.Write("source", "new")));
-  folder.Write("old", "old");
-  const COrbTime created(std::uint64_t{37000000000000000});
-  const COrbTime updated(std::uint64_t{38000000000000000});
-  ASSERT_EQ(source.SetCreateTime(created), kOrbNoErr);
-  ASSERT_EQ(source.SetUpdateTime(updated), kOrbNoErr);
-  ASSERT_TRUE(Lock(folder / "source"));
-  EXPECT_EQ(CopyOnto(folder / "source", folder / "old", nullptr), kOrbNoErr);
-  COrbFileHandle copy(PathOf(folder / "old"));
-  COrbTime time;
-  EXPECT_EQ(copy.GetCreateTime(&time), kOrbNoErr);
-  EXPECT_EQ(time.ticks, created.ticks);
-  EXPECT_EQ(copy.GetUpdateTime(&time), kOrbNoErr);
-  EXPECT_EQ(time.ticks, updated.ticks);
+  const Tree tree("source, old");
+  COrbFileHandle source(PathOf(tree / "source"));
+  const COrbTime times[] = {std::uint64_t{37000000000000000}, std::uint64_t{38000000000000000}};
+  ASSERT_EQ(source.SetCreateTime(times[0]), kOrbNoErr);
+  ASSERT_EQ(source.SetUpdateTime(times[1]), kOrbNoErr);
+  ASSERT_TRUE(SetLock(tree / "source", true));
+  EXPECT_EQ(CopyOnto(tree / "source", tree / "old", nullptr), kOrbNoErr);
+  const COrbFileHandle copy(PathOf(tree / "old"));
+  COrbTime read[2];
+  EXPECT_EQ(copy.GetCreateTime(&read[0]), kOrbNoErr);
+  EXPECT_EQ(copy.GetUpdateTime(&read[1]), kOrbNoErr);
+  EXPECT_TRUE(read[0] == times[0] && read[1] == times[1]);
   EXPECT_TRUE(copy.GetAttribute() & kOrbFileAttrLocked);
 }
 
 TEST(HandleCopy, RefusesBeforeItTouchesAnything) {
-  const TempFolder folder;
-  folder.Write("source", "new");
-  folder.Write("locked", "old");
-  folder.Write("old", "old");
-  fs::create_directory(folder / "tree");
-  fs::create_hard_link(folder / "source", folder / "hard");
-  fs::create_symlink("old", folder / "link");
-  ASSERT_TRUE(Lock(folder / "locked"));
-  const struct {
-    const char* from;
-    const char* to;
-    OrbResult expected;
-  } kCases[] = {
+  const Tree tree("source, locked!, old, tree/, hard => source, link -> old");
+  const Row<OrbResult> kCases[] = {
       {"missing", "old", kOrbErrNotFound},
       {"source", "missing", kOrbErrNotFound},
       {"source", "locked", kOrbErrAccessDenied},
@@ -157,46 +108,39 @@ TEST(HandleCopy, RefusesBeforeItTouchesAnything) {
       {"source", "tree", kOrbErrUnknown},
       {"\xff", "old", kOrbErrNotFound},
   };
-  const auto before = Describe(folder.Path());
-  const int descriptors = orb::test::OpenDescriptors();
   Calls calls;
-  for (const auto& c : kCases)
-    EXPECT_EQ(CopyOnto(folder / c.from, folder / c.to, &calls), c.expected) << c.from << c.to;
+  ExpectRefusals(tree, kCases, [&](auto&& from, auto&& to) { return CopyOnto(from, to, &calls); });
   EXPECT_EQ(calls.count, 0);
-  EXPECT_EQ(Describe(folder.Path()), before);
-  EXPECT_EQ(orb::test::OpenDescriptors(), descriptors);
 }
 
 TEST(HandleCopy, DeletesTheDestinationWhenItIsCanceledButNotWhenTheCallbackThrows) {
-  const TempFolder folder;
-  folder.Write("source", std::string(200000, 's'));
-  const int descriptors = orb::test::OpenDescriptors();
+  const Tree tree;
+  tree.Write("source", std::string(200000, 's'));
+  const int descriptors = OpenDescriptors();
   for (const int last : {1, 3}) {
-    folder.Write("old", "old");
+    tree.Make("old");
     Calls cancels{[=](int count) { return count < last; }};
-    EXPECT_EQ(CopyOnto(folder / "source", folder / "old", &cancels), kOrbErrCanceled);
+    EXPECT_EQ(CopyOnto(tree / "source", tree / "old", &cancels), kOrbErrCanceled);
     EXPECT_EQ(cancels.count, last);
-    EXPECT_FALSE(fs::exists(folder / "old"));
+    EXPECT_FALSE(tree.Has("old"));
   }
-  folder.Write("old", "old");
+  tree.Make("old");
   Calls throws{[](int count) { return count < 2 ? true : throw std::string("mine"); }};
-  EXPECT_THROW(CopyOnto(folder / "source", folder / "old", &throws), std::string);
-  EXPECT_TRUE(ReadAll(folder / "old") == std::string(65536, 's'));
-  EXPECT_EQ(orb::test::OpenDescriptors(), descriptors);
+  EXPECT_THROW(CopyOnto(tree / "source", tree / "old", &throws), std::string);
+  EXPECT_TRUE(tree.Read("old") == std::string(65536, 's'));
+  EXPECT_EQ(OpenDescriptors(), descriptors);
 }
 
 TEST(HandleCopy, DeletesTheDestinationWhenItCannotBeWritten) {
-  const TempFolder folder;
-  folder.Write("source", std::string(200000, 's'));
-  folder.Write("old", "old");
-  const auto limit = [] {
-    const rlimit size{100000, 100000};
-    return std::signal(SIGXFSZ, SIG_IGN) != SIG_ERR && ::setrlimit(RLIMIT_FSIZE, &size) == 0;
-  };
-  ORB_IN_CHILD(orb::test::RunInChild(limit, [&] {
-    EXPECT_EQ(CopyOnto(folder / "source", folder / "old", nullptr), kOrbErrUnknown);
-    EXPECT_FALSE(fs::exists(folder / "old"));
-  }));
+  const Tree tree("old");
+  tree.Write("source", std::string(200000, 's'));
+  ORB_IN_CHILD(RunInChild([] { return LimitFiles(100000); },
+                          [&] {
+                            EXPECT_EQ(CopyOnto(tree / "source", tree / "old", nullptr),
+                                      kOrbErrUnknown);
+                            EXPECT_FALSE(tree.Has("old"));
+                          }));
 }
 
 }  // namespace
+}  // namespace orb::test

@@ -1,32 +1,17 @@
 // SPDX-License-Identifier: MIT
-#include <gtest/gtest.h>
-#include <orb/fileinfo/file_handle.h>
 #include <orb/fileops/create.h>
 #include <orb/fileops/path_relations.h>
 
-#include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <random>
-#include <set>
-#include <string>
 #include <thread>
 #include <vector>
 
 #include "fileops/numbered_name.h"
 #include "platform/taken_runs.h"
-#include "support/faults.h"
-#include "support/paths.h"
-#include "support/temp_folder.h"
+#include "support/files.h"
 
+namespace orb::test {
 namespace {
-
-namespace fs = std::filesystem;
-using orb::NumberedName;
-using orb::TakenNumbers;
-using orb::test::ReadAll;
-using orb::test::RunWithPrivateMounts;
-using orb::test::TempFolder;
 
 /// The name that was made, or the code in its place.
 std::string Unique(const std::string& folder, const std::string& name) {
@@ -40,11 +25,8 @@ std::string Unique(const std::string& folder, const std::string& name) {
 }
 
 TEST(CreateUniqueFile, NumbersTheNameBeforeItsExtension) {
-  const TempFolder folder;
-  const struct {
-    const char* name;
-    std::vector<std::string> made;
-  } kCases[] = {
+  const Tree folder;
+  const std::pair<const char*, std::vector<std::string>> kCases[] = {
       {"photo.jpg", {"photo.jpg", "photo_1.jpg", "photo_2.jpg"}},
       {"a.b.jpg", {"a.b.jpg", "a.b_1.jpg"}},
       {"notes", {"notes", "notes_1"}},
@@ -52,20 +34,18 @@ TEST(CreateUniqueFile, NumbersTheNameBeforeItsExtension) {
       {"dot.", {"dot.", "dot_1"}},
       {"100%d.tif", {"100%d.tif", "100%d_1.tif"}},
   };
-  for (const auto& c : kCases) {
-    for (const std::string& made : c.made) EXPECT_EQ(Unique(folder.Path(), c.name), made);
-  }
+  for (const auto& [name, all] : kCases)
+    for (const std::string& made : all) EXPECT_EQ(Unique(folder.Path(), name), made);
 }
 
 TEST(CreateUniqueFile, TakesTheLowestFreeNumberOfMany) {
-  const TempFolder folder;
-  for (int i = 0; i < 300; ++i) Unique(folder.Path(), "p.jpg");
-  EXPECT_TRUE(fs::exists(folder / "p_299.jpg"));
-  fs::remove(folder / "p_7.jpg");
-  fs::remove(folder / "p_120.jpg");
-  fs::create_symlink("nowhere", folder / "p_300.jpg");  // Taken, although it leads nowhere.
+  const Tree tree;
+  for (int i = 0; i < 300; ++i) Unique(tree.Path(), "p.jpg");
+  EXPECT_TRUE(tree.Has("p_299.jpg"));
+  for (const char* name : {"p_7.jpg", "p_120.jpg"}) fs::remove(tree / name);
+  tree.Make("p_300.jpg -> nowhere");  // Taken, although it leads nowhere.
   for (const char* made : {"p_7.jpg", "p_120.jpg", "p_301.jpg"})
-    EXPECT_EQ(Unique(folder.Path(), "p.jpg"), made);
+    EXPECT_EQ(Unique(tree.Path(), "p.jpg"), made);
 }
 
 /// The name that trying one after the other gives.
@@ -102,7 +82,7 @@ void CompareWithFirstFree(const std::string& folder) {
 }
 
 TEST(CreateUniqueFile, GivesTheFirstFreeNameWhateverOthersDo) {
-  const TempFolder folder;
+  const Tree folder;
   CompareWithFirstFree(folder / "usual");
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
     const std::string unwatched = folder / "unwatched";
@@ -113,7 +93,7 @@ TEST(CreateUniqueFile, GivesTheFirstFreeNameWhateverOthersDo) {
 }
 
 TEST(CreateUniqueFile, SeesInAChildAndBesideItWhatTheOtherRemoves) {
-  const TempFolder folder;
+  const Tree folder;
   const auto child = [&] {
     fs::remove(folder / "p_3.jpg");
     EXPECT_EQ(Unique(folder.Path(), "p.jpg"), "p_3.jpg");
@@ -123,20 +103,17 @@ TEST(CreateUniqueFile, SeesInAChildAndBesideItWhatTheOtherRemoves) {
     Unique(folder.Path(), "other.jpg");  // Looks at what has happened.
   };
   for (int i = 0; i < 20; ++i) Unique(folder.Path(), "p.jpg");
-  ORB_IN_CHILD(orb::test::RunInChild([] { return true; }, child));
+  ORB_IN_CHILD(RunInChild([] { return true; }, child));
   EXPECT_EQ(Unique(folder.Path(), "p.jpg"), "p_5.jpg");
 }
 
 TEST(CreateUniqueFile, HoldsAtMostOneDescriptor) {
-  const auto count = [] {
-    return std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator());
-  };
-  const auto before = count();
+  const auto before = OpenDescriptors();
   for (int i = 0; i < 12; ++i) {
-    const TempFolder folder;
+    const Tree folder;
     for (int j = 0; j < 7; ++j) Unique(folder.Path(), "p.jpg");
   }
-  EXPECT_LE(count(), before + 1);
+  EXPECT_LE(OpenDescriptors(), before + 1);
 }
 
 TEST(TakenRuns, AreEndedByWhatMayBeAnotherSpelling) {
@@ -155,55 +132,44 @@ TEST(TakenRuns, AreEndedByWhatMayBeAnotherSpelling) {
       {".orb-0123456789abcdef", "photo", false},
       {"phone_7.jpg", "photo", false},
   };
-  for (const auto& c : kCases)
-    EXPECT_EQ(orb::platform::MayBeginWith(c.name, c.stem), c.may) << c.name;
+  for (const auto& c : kCases) EXPECT_EQ(platform::MayBeginWith(c.name, c.stem), c.may) << c.name;
 }
 
 TEST(CreateUniqueFile, EndsWhereNoNumberCanHelp) {
-  const TempFolder folder;
   const std::string longest = std::string(251, 'n') + ".jpg";
-  EXPECT_EQ(Unique(folder.Path(), longest), longest);
-  EXPECT_EQ(Unique(folder.Path(), longest), std::to_string(kOrbErrInvalidName));
-  EXPECT_EQ(Unique(folder.Path(), "n" + longest), std::to_string(kOrbErrInvalidName));
-  EXPECT_EQ(Unique(folder / "missing", "a"), std::to_string(kOrbErrAccessDenied));
-  EXPECT_EQ(Unique("", "a"), std::to_string(kOrbErrEmptyPath));
-  ASSERT_EQ(COrbFileHandle(PathOf(folder.Path())).SetAttribute(kOrbFileAttrLocked), 0u);
-  EXPECT_EQ(Unique(folder.Path(), longest), std::to_string(kOrbErrInvalidName));
-  folder.Write("a", "");
-  EXPECT_EQ(Unique(folder.Path(), "a"), std::to_string(kOrbErrAccessDenied));
+  const Tree tree(longest + ", locked/a, locked/" + longest + ", locked/!");
+  const Row<OrbResult> kCases[] = {
+      {"", longest, kOrbErrEmptyPath},
+      {tree.Path(), longest, kOrbErrInvalidName},
+      {tree.Path(), "n" + longest, kOrbErrInvalidName},
+      {"missing", "a", kOrbErrAccessDenied},
+      {"locked", longest, kOrbErrInvalidName},
+      {"locked", "a", kOrbErrAccessDenied},
+  };
+  const Unchanged unchanged(tree.Path());
+  for (const auto& [folder, name, expected] : kCases)
+    EXPECT_EQ(Unique(tree.At(folder), name), std::to_string(expected)) << folder << name;
 }
 
 TEST(CreateUniqueFile, GivesNoTwoCallersTheSameFile) {
-  constexpr int kThreads = 4;
-  constexpr int kFiles = 50;
-  const TempFolder folder;
-  std::vector<std::set<std::string>> made(kThreads);
+  const Tree tree;
   std::vector<std::thread> threads;
-  for (auto& mine : made) {
+  for (int i = 0; i < 4; ++i) {
     threads.emplace_back([&] {
-      for (int i = 0; i < kFiles; ++i) mine.insert(Unique(folder.Path(), "p.jpg"));
+      for (int k = 0; k < 50; ++k) Unique(tree.Path(), "p.jpg");
     });
   }
   for (auto& thread : threads) thread.join();
-  std::set<std::string> all;
-  for (const auto& mine : made) all.insert(mine.begin(), mine.end());
-  EXPECT_EQ(all.size(), std::size_t{kThreads * kFiles});
-  EXPECT_TRUE(all.contains("p_199.jpg"));
+  EXPECT_EQ(NamesIn(tree.Path()).size(), 200u);
+  EXPECT_TRUE(tree.Has("p_199.jpg"));
 }
 
 TEST(NumberedName, ReadsOnlyTheNamesThatItGives) {
   const NumberedName names(S("p.jpg"));
   EXPECT_EQ(names.NumberOf("p_12.jpg"), 12u);
-  for (const char* name : {"p.jpg",
-                           "p_.jpg",
-                           "p_0.jpg",
-                           "p_01.jpg",
-                           "p_+1.jpg",
-                           "p_1.JPG",
-                           "p_99999999999.jpg",
-                           "p_1x.jpg",
-                           "q_1.jpg"})
-    EXPECT_FALSE(names.NumberOf(name)) << name;
+  std::istringstream others(
+      "p.jpg p_.jpg p_0.jpg p_01.jpg p_+1.jpg p_1.JPG p_99999999999.jpg p_1x.jpg q_1.jpg");
+  for (std::string name; others >> name;) EXPECT_FALSE(names.NumberOf(name)) << name;
   const TakenNumbers taken({1, 2, 4, 9999});
   EXPECT_EQ(taken.NextFree(1), 3u);
   EXPECT_EQ(taken.NextFree(4), 5u);
@@ -211,75 +177,54 @@ TEST(NumberedName, ReadsOnlyTheNamesThatItGives) {
 }
 
 TEST(CreateFile, ReplacesAFileOrALinkByAnEmptyFile) {
-  const TempFolder folder;
-  folder.Write("old", "content");
-  folder.Write("outside", "content");
-  fs::create_symlink("outside", folder / "link");
+  const Tree tree("old, outside, link -> outside");
   COrbFilePath result;
   for (const char* name : {"new", "old", "link"}) {
-    EXPECT_EQ(OrbCreateFile(PathOf(folder.Path()), S(name), &result), kOrbNoErr) << name;
-    EXPECT_EQ(Text(result.GetFullPath()), folder / name);
-    EXPECT_TRUE(fs::is_regular_file(fs::symlink_status(folder / name)));
-    EXPECT_EQ(ReadAll(folder / name), "");
+    EXPECT_EQ(OrbCreateFile(PathOf(tree.Path()), S(name), &result), kOrbNoErr) << name;
+    EXPECT_EQ(Text(result.GetFullPath()), tree / name);
+    EXPECT_TRUE(fs::is_regular_file(fs::symlink_status(tree / name)));
+    EXPECT_EQ(tree.Read(name), "");
   }
-  EXPECT_EQ(ReadAll(folder / "outside"), "content");
+  EXPECT_EQ(tree.Read("outside"), "outside");
 }
 
-TEST(CreateFile, SaysWhyItCannot) {
-  const TempFolder folder;
-  fs::create_directory(folder / "folder");
-  folder.Write("locked", "x");
-  ASSERT_EQ(COrbFileHandle(PathOf(folder / "locked")).SetAttribute(kOrbFileAttrLocked), 0u);
-  const struct {
-    std::string folder;
-    std::string name;
-    OrbResult expected;
-  } kCases[] = {
-      {"", "new", kOrbErrEmptyPath},
-      {folder.Path(), "folder", kOrbErrFileExists},
-      {folder.Path(), "locked", kOrbErrFileExists},
-      {folder.Path(), std::string(256, 'n'), kOrbErrInvalidName},
-      {folder.Path(), "\xff", kOrbErrInvalidName},
-      {folder / "missing", "new", kOrbErrAccessDenied},
+TEST(CreateFile, AndCreateFolderSayWhyTheyCannot) {
+  const Tree tree("folder/, file, lock!, locked/!");
+  const std::tuple<std::string, std::string, OrbResult, OrbResult> kCases[] = {
+      {"", "new", kOrbErrEmptyPath, kOrbErrEmptyPath},
+      {tree.Path(), "folder", kOrbErrFileExists, kOrbErrFileExists},
+      {tree.Path(), "lock", kOrbErrFileExists, kOrbErrFileExists},
+      {tree.Path(), std::string(256, 'n'), kOrbErrInvalidName, kOrbErrInvalidName},
+      {tree.Path(), "\xff", kOrbErrInvalidName, kOrbErrInvalidName},
+      {"locked", "new", kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {"missing", "new", kOrbErrAccessDenied, kOrbNoErr},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.name);
+  for (const auto& [folder, name, file, made] : kCases) {
+    SCOPED_TRACE(folder + "/" + name);
     COrbFilePath result = PathOf("before");
-    EXPECT_EQ(OrbCreateFile(PathOf(c.folder), S(c.name), &result), c.expected);
+    EXPECT_EQ(OrbCreateFile(PathOf(tree.At(folder)), S(name), &result), file);
     EXPECT_EQ(Text(result.GetFullPath()), "before");
+    EXPECT_EQ(OrbCreateFolder(PathOf(tree.At(folder)), S(name), nullptr), made);
   }
-  EXPECT_EQ(ReadAll(folder / "locked"), "x");
+  EXPECT_EQ(tree.Read("lock"), "lock");
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
-    ASSERT_TRUE(orb::test::MountTmpfs(folder / "full", "size=1m,nr_inodes=1"));
+    ASSERT_TRUE(MountTmpfs(tree / "full", "size=1m,nr_inodes=1"));
     COrbFilePath result;
-    EXPECT_EQ(OrbCreateFile(PathOf(folder / "full"), S("new"), &result), kOrbErrDiskFull);
-    EXPECT_EQ(OrbCreateFolder(PathOf(folder / "full"), S("new"), nullptr), kOrbErrDiskFull);
+    EXPECT_EQ(OrbCreateFile(PathOf(tree / "full"), S("new"), &result), kOrbErrDiskFull);
+    EXPECT_EQ(OrbCreateFolder(PathOf(tree / "full"), S("new"), nullptr), kOrbErrDiskFull);
   }));
 }
 
 TEST(CreateFolder, MakesMissingFoldersAbove) {
-  const TempFolder folder;
-  folder.Write("file", "");
+  const Tree tree;
   COrbFilePath result;
-  const COrbFilePath above = PathOf(folder / "x/y");
-  EXPECT_EQ(OrbCreateFolder(above, S("z"), &result), kOrbNoErr);
-  EXPECT_EQ(Text(result.GetFullPath()), folder / "x/y/z");
-  EXPECT_TRUE(fs::is_directory(folder / "x/y/z"));
-  EXPECT_EQ(OrbCreateFolder(above, S("z"), nullptr), kOrbErrFileExists);
-  EXPECT_EQ(OrbCreateFolder(PathOf(folder.Path()), S("file"), nullptr), kOrbErrFileExists);
-  EXPECT_EQ(OrbCreateFolder(above, S(std::string(256, 'n')), nullptr), kOrbErrInvalidName);
-  EXPECT_EQ(OrbCreateFolder(PathOf(""), S("z"), nullptr), kOrbErrEmptyPath);
-  ASSERT_EQ(COrbFileHandle(above).SetAttribute(kOrbFileAttrLocked), 0u);
-  EXPECT_EQ(OrbCreateFolder(above, S("new"), nullptr), kOrbErrAccessDenied);
+  EXPECT_EQ(OrbCreateFolder(PathOf(tree / "x/y"), S("z"), &result), kOrbNoErr);
+  EXPECT_EQ(Text(result.GetFullPath()), tree / "x/y/z");
+  EXPECT_TRUE(fs::is_directory(tree / "x/y/z"));
 }
 
 TEST(PathRelations, WorkOnTheTextAlone) {
-  const struct {
-    const char* path;
-    OrbResult result;
-    const char* parent;
-    const char* name;
-  } kCases[] = {
+  const std::tuple<const char*, OrbResult, const char*, const char*> kCases[] = {
       {"/a/b/c", 0, "/a/b", "c"},
       {"/a/b/", 0, "/a/b", ""},
       {"a/b.jpg", 0, "a", "b.jpg"},
@@ -287,15 +232,15 @@ TEST(PathRelations, WorkOnTheTextAlone) {
       {"b.jpg", kOrbErrNotFound, "before", "b.jpg"},
       {"", kOrbErrNotFound, "before", ""},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.path);
+  for (const auto& [path, result, expectedParent, expectedName] : kCases) {
+    SCOPED_TRACE(path);
     COrbStringData parent = S("before");
-    EXPECT_EQ(OrbGetParentFolder(S(c.path), &parent), c.result);
-    EXPECT_EQ(Text(parent), c.parent);
-    EXPECT_EQ(OrbGetParentFolder(S(c.path), nullptr), c.result);
-    COrbStringData name = S(c.path);
+    EXPECT_EQ(OrbGetParentFolder(S(path), &parent), result);
+    EXPECT_EQ(Text(parent), expectedParent);
+    EXPECT_EQ(OrbGetParentFolder(S(path), nullptr), result);
+    COrbStringData name = S(path);
     EXPECT_EQ(OrbGetFileNameFromPath(name, &name), kOrbNoErr);  // The output may be the input.
-    EXPECT_EQ(Text(name), c.name);
+    EXPECT_EQ(Text(name), expectedName);
   }
   EXPECT_TRUE(OrbIsSubFolder(S("/a/b"), S("/A/B/c")));
   EXPECT_FALSE(OrbIsSubFolder(S("/a/b"), S("/a/bc")));
@@ -303,3 +248,4 @@ TEST(PathRelations, WorkOnTheTextAlone) {
 }
 
 }  // namespace
+}  // namespace orb::test

@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <tuple>
+
 namespace orb {
 namespace {
 
@@ -10,11 +12,7 @@ using platform::Error;
 using enum platform::ErrorDomain;
 
 TEST(MapError, ReadsTheTablesByDomainAndCode) {
-  const struct {
-    Error error;
-    OrbResult general;
-    OrbResult fileOperation;
-  } kCases[] = {
+  const std::tuple<Error, OrbResult, OrbResult> kCases[] = {
       // The Cocoa codes are where the two differ.
       {{kCocoa, 4}, kOrbErrNotFound, kOrbErrUnknown},
       {{kCocoa, 260}, kOrbErrNotFound, kOrbErrNotFound},
@@ -41,13 +39,11 @@ TEST(MapError, ReadsTheTablesByDomainAndCode) {
       {{kPosix, 30}, kOrbErrAccessDenied, kOrbErrAccessDenied},
       {platform::kBusy, kOrbNoErr, kOrbNoErr},  // There is no error object.
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.error.code);
-    EXPECT_EQ(OrbMapError(c.error), c.general);
-    EXPECT_EQ(OrbMapErrorForFileOperation(c.error), c.fileOperation);
+  for (const auto& [error, general, fileOperation] : kCases) {
+    EXPECT_EQ(OrbMapError(error), general) << error.code;
+    EXPECT_EQ(OrbMapErrorForFileOperation(error), fileOperation) << error.code;
   }
-  EXPECT_EQ(OrbMapError({}), kOrbNoErr);
-  EXPECT_EQ(OrbMapErrorForFileOperation({}), kOrbNoErr);
+  EXPECT_EQ(OrbMapError({}) + OrbMapErrorForFileOperation({}), kOrbNoErr);
 }
 
 }  // namespace

@@ -1,22 +1,10 @@
 // SPDX-License-Identifier: MIT
 #include "fileops/failure_diagnosis.h"
 
-#include <gtest/gtest.h>
+#include "support/files.h"
 
-#include <filesystem>
-#include <string>
-
-#include "platform/items.h"
-#include "support/faults.h"
-#include "support/temp_folder.h"
-#include "support/texts.h"
-
-namespace orb {
+namespace orb::test {
 namespace {
-
-namespace fs = std::filesystem;
-using platform::Items;
-using test::TempFolder;
 
 constexpr ErrorObject kNoError;
 
@@ -42,77 +30,66 @@ TEST(DiagnoseFailure, BelievesAnErrorThatTells) {
 }
 
 TEST(DiagnoseFailure, TestsExistenceThenNameThenPermission) {
-  const TempFolder folder;
-  const std::string file = folder.Write("file", "");
-  const std::string other = folder.Write("other", "");
-  std::string umlauts = folder / "";
+  const Tree tree("file, other");
+  std::string umlauts;
   for (int i = 0; i < 120; ++i) umlauts += "\xC3\xA4\xC3\xA4";  // 240 characters, 480 bytes.
-  std::string far = folder.Path();
+  std::string far = tree.Path();
   for (int i = 0; i < 6; ++i) far += "/" + std::string(200, 'f');
-  const struct {
-    std::string path;
-    eOrbFailedOperation operation;
-    OrbResult result;
-  } kCases[] = {
-      {folder / "no", kOrbOpRead, kOrbErrNoSuchFile},
-      {folder / "no", kOrbOpWrite, kOrbErrNoSuchFile},
-      {folder / "no", kOrbOpDelete, kOrbErrNoSuchFile},
-      {file, kOrbOpRead, kOrbErrUnknown},
-      {file, kOrbOpWrite, kOrbErrUnknown},
-      {file, kOrbOpDelete, kOrbErrUnknown},
-      {file, kOrbOpCreateFile, kOrbErrFileExists},
-      {folder.Path(), kOrbOpCreateFolder, kOrbErrFileExists},
-      {folder / "no", kOrbOpCreateFile, kOrbErrUnknown},
-      {folder / "no/no", kOrbOpCreateFile, kOrbErrAccessDenied},
-      {"bare", kOrbOpCreateFile, kOrbErrAccessDenied},
-      {folder / std::string(255, 'n'), kOrbOpCreateFile, kOrbErrUnknown},
-      {folder / std::string(256, 'n'), kOrbOpCreateFile, kOrbErrInvalidName},
-      {folder / std::string(256, 'n') + "/", kOrbOpCreateFolder, kOrbErrInvalidName},
+  const std::string n255(255, 'n');
+  const std::tuple<std::string, eOrbFailedOperation, OrbResult> kCases[] = {
+      {"no", kOrbOpRead, kOrbErrNoSuchFile},
+      {"no", kOrbOpWrite, kOrbErrNoSuchFile},
+      {"no", kOrbOpDelete, kOrbErrNoSuchFile},
+      {"file", kOrbOpRead, kOrbErrUnknown},
+      {"file", kOrbOpWrite, kOrbErrUnknown},
+      {"file", kOrbOpDelete, kOrbErrUnknown},
+      {"file", kOrbOpCreateFile, kOrbErrFileExists},
+      {tree.Path(), kOrbOpCreateFolder, kOrbErrFileExists},
+      {"no", kOrbOpCreateFile, kOrbErrUnknown},
+      {"no/no", kOrbOpCreateFile, kOrbErrAccessDenied},
+      {n255, kOrbOpCreateFile, kOrbErrUnknown},
+      {n255 + "n", kOrbOpCreateFile, kOrbErrInvalidName},
+      {n255 + "n/", kOrbOpCreateFolder, kOrbErrInvalidName},
       {umlauts, kOrbOpCreateFile, kOrbErrUnknown},
       {far, kOrbOpCreateFile, kOrbErrNameTooLong},
       {far, kOrbOpDelete, kOrbErrNoSuchFile},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.path);
-    EXPECT_EQ(Diagnose(c.path, c.operation), c.result);
-  }
-  EXPECT_EQ(DiagnoseRename(folder / "no", other), kOrbErrNoSuchFile);
-  EXPECT_EQ(DiagnoseRename(file, other), kOrbErrFileExists);
-  EXPECT_EQ(DiagnoseRename(file, folder / "new"), kOrbErrUnknown);
-  EXPECT_EQ(DiagnoseRename(file, folder / "no/new"), kOrbErrAccessDenied);
+  for (const auto& [path, operation, expected] : kCases)
+    EXPECT_EQ(Diagnose(tree.At(path), operation), expected) << path << " " << operation;
+  EXPECT_EQ(Diagnose("bare", kOrbOpCreateFile), kOrbErrAccessDenied);
+  const Row<OrbResult> kRenames[] = {
+      {"no", "other", kOrbErrNoSuchFile},
+      {"file", "other", kOrbErrFileExists},
+      {"file", "new", kOrbErrUnknown},
+      {"file", "no/new", kOrbErrAccessDenied},
+  };
+  ExpectRefusals(tree, kRenames, DiagnoseRename);
 }
 
 TEST(DiagnoseFailure, NamesALock) {
-  const TempFolder folder;
-  const std::string file = folder.Write("file", "");
-  fs::create_directory(folder / "target");
-  const std::string target = folder / "target/new";
-  const auto lock = [](const std::string& path, bool locked) {
-    ASSERT_TRUE(Items::Current().SetLocked(path, locked).Ok());
+  const Tree tree("file!, open, in/!, above/file, above/!");
+  EXPECT_EQ(Diagnose(tree / "file", kOrbOpDelete), kOrbErrAccessDenied);
+  EXPECT_EQ(Diagnose(tree / "file", kOrbOpWrite), kOrbErrUnknown);
+  EXPECT_EQ(Diagnose(tree / "in/new", kOrbOpCreateFolder), kOrbErrAccessDenied);
+  EXPECT_EQ(Diagnose(tree / "above/file", kOrbOpDelete), kOrbErrAccessDenied);
+  const Row<OrbResult> kRenames[] = {
+      {"file", "new", kOrbErrAccessDenied},
+      {"open", "in/new", kOrbErrAccessDenied},
+      {"above/file", "above/new", kOrbErrAccessDenied},
   };
-  lock(file, true);
-  EXPECT_EQ(Diagnose(file, kOrbOpDelete), kOrbErrAccessDenied);
-  EXPECT_EQ(DiagnoseRename(file, target), kOrbErrAccessDenied);
-  EXPECT_EQ(Diagnose(file, kOrbOpWrite), kOrbErrUnknown);
-  lock(file, false);
-  lock(folder / "target", true);
-  EXPECT_EQ(DiagnoseRename(file, target), kOrbErrAccessDenied);
-  EXPECT_EQ(Diagnose(target, kOrbOpCreateFolder), kOrbErrAccessDenied);
-  lock(folder.Path(), true);
-  EXPECT_EQ(Diagnose(file, kOrbOpDelete), kOrbErrAccessDenied);
-  EXPECT_EQ(DiagnoseRename(file, folder / "new"), kOrbErrAccessDenied);
+  ExpectRefusals(tree, kRenames, DiagnoseRename);
 }
 
 TEST(DiagnoseFailure, NamesAReadOnlyVolume) {
-  const TempFolder folder;
-  const std::string file = folder.Write("file", "");
-  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
-    ASSERT_TRUE(test::MakeReadOnlyVolume(folder.Path()));
-    EXPECT_EQ(Diagnose(file, kOrbOpDelete), kOrbErrAccessDenied);
-    EXPECT_EQ(Diagnose(folder / "new", kOrbOpCreateFile), kOrbErrAccessDenied);
-    EXPECT_EQ(DiagnoseRename(file, folder / "new"), kOrbErrUnknown);  // Readable is enough there.
+  const Tree tree("file");
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(MakeReadOnlyVolume(tree.Path()));
+    EXPECT_EQ(Diagnose(tree / "file", kOrbOpDelete), kOrbErrAccessDenied);
+    EXPECT_EQ(Diagnose(tree / "new", kOrbOpCreateFile), kOrbErrAccessDenied);
+    // Readable is enough there.
+    EXPECT_EQ(DiagnoseRename(tree / "file", tree / "new"), kOrbErrUnknown);
   }));
 }
 
 }  // namespace
-}  // namespace orb
+}  // namespace orb::test

@@ -1,44 +1,18 @@
 // SPDX-License-Identifier: MIT
-#include <gtest/gtest.h>
 #include <orb/fileops/copy.h>
 #include <orb/fileops/move.h>
-#include <sys/stat.h>
 
-#include <cstdint>
-#include <cstdlib>
-#include <filesystem>
 #include <functional>
 #include <map>
-#include <optional>
-#include <string>
 
 #include "fileops/transfer_checks.h"
-#include "platform/volumes.h"
-#include "support/faults.h"
-#include "support/paths.h"
-#include "support/temp_folder.h"
-#include "support/trees.h"
+#include "support/files.h"
 
 /// \file
 /// The forms of copy and move that take a folder and a name, side by side.
 
+namespace orb::test {
 namespace {
-
-namespace fs = std::filesystem;
-using orb::test::Describe;
-using orb::test::ReadAll;
-using orb::test::TempFolder;
-
-/// Counts its calls and answers false at one of them.
-struct Progress {
-  int falseAt = 0;
-  int calls = 0;
-
-  static bool Call(void* data) {
-    auto* self = static_cast<Progress*>(data);
-    return ++self->calls != self->falseAt;
-  }
-};
 
 struct Arguments {
   COrbFilePath source;
@@ -52,43 +26,29 @@ struct Arguments {
 };
 
 using Form = std::function<OrbResult(Arguments&)>;
+#define FORM(name, ...)                                                             \
+  {                                                                                 \
+#name, [](Arguments & a) { return Orb##name(a.source, a.folder, __VA_ARGS__); } \
+  }
 
 const std::map<std::string, Form> kForms = {
-    {"CopyFile", [](Arguments& a) { return OrbCopyFile(a.source, a.folder, a.name, &a.result); }},
-    {"CopyFileOverwrite",
-     [](Arguments& a) { return OrbCopyFileOverwrite(a.source, a.folder, a.Name(), &a.result); }},
-    {"CopyFileOverwriteEx",
-     [](Arguments& a) {
-       return OrbCopyFileOverwriteEx(a.source, a.folder, a.Name(), Progress::Call, &a.progress);
-     }},
-    {"CopyFolder",
-     [](Arguments& a) { return OrbCopyFolder(a.source, a.folder, a.name, &a.result); }},
-    {"CopyFolderEx",
-     [](Arguments& a) {
-       return OrbCopyFolderEx(a.source, a.folder, a.name, Progress::Call, &a.progress);
-     }},
-    {"CopyFolderOverwriteEx",
-     [](Arguments& a) {
-       return OrbCopyFolderOverwriteEx(a.source, a.folder, a.Name(), Progress::Call, &a.progress);
-     }},
-    {"MoveFile", [](Arguments& a) { return OrbMoveFile(a.source, a.folder, a.name, &a.result); }},
-    {"MoveFileEx",
-     [](Arguments& a) {
-       return OrbMoveFileEx(a.source, a.folder, a.name, Progress::Call, &a.progress);
-     }},
-    {"MoveFileOverwrite",
-     [](Arguments& a) { return OrbMoveFileOverwrite(a.source, a.folder, a.Name(), &a.result); }},
-    {"MoveFileOverwriteEx",
-     [](Arguments& a) {
-       return OrbMoveFileOverwriteEx(a.source, a.folder, a.Name(), Progress::Call, &a.progress);
-     }},
+    FORM(CopyFile, a.name, &a.result),
+    FORM(CopyFileOverwrite, a.Name(), &a.result),
+    FORM(CopyFileOverwriteEx, a.Name(), Progress::Call, &a.progress),
+    FORM(CopyFolder, a.name, &a.result),
+    FORM(CopyFolderEx, a.name, Progress::Call, &a.progress),
+    FORM(CopyFolderOverwriteEx, a.Name(), Progress::Call, &a.progress),
+    FORM(MoveFile, a.name, &a.result),
+    FORM(MoveFileEx, a.name, Progress::Call, &a.progress),
+    FORM(MoveFileOverwrite, a.Name(), &a.result),
+    FORM(MoveFileOverwriteEx, a.Name(), Progress::Call, &a.progress),
 };
 
 enum class Has : bool { kNo, kYes };
 using enum Has;
 
 /// What the forms differ in. A code of 0 says that the form does not ask.
-struct Row {
+struct FormRow {
   const char* form;
   Has moves;
   Has ownName;         // A null name is the source's own.
@@ -112,7 +72,7 @@ constexpr OrbResult kMissing = kOrbErrNotFound;
 constexpr OrbResult kUnknown = kOrbErrUnknown;
 
 // clang-format off
-const Row kRows[] = {
+const FormRow kRows[] = {
 //   form                     moves own   result calls  missing            unusable  same    inside    existing  itself    explained
     {"CopyFile",              kNo,  kNo,  kYes, 0, 0, kOrbErrNoSuchFile, kDenied, kUnknown, kUnknown, kUnknown, kUnknown, kUnknown},
     {"CopyFileOverwrite",     kNo,  kYes, kYes, 0, 0, kMissing,          kDenied, kUnknown, kUnknown, 0,        kInside,  kUnknown},
@@ -127,12 +87,7 @@ const Row kRows[] = {
 };
 // clang-format on
 
-class AlmostFull final : public orb::platform::Volumes {
- public:
-  std::optional<std::uint64_t> AvailableCapacity(const std::string&) const override {
-    return 104857599;
-  }
-};
+constexpr std::uint64_t kAlmostFull = 104857599;
 
 Arguments Ask(const std::string& source, const std::string& folder, const std::string& name) {
   Arguments arguments;
@@ -143,16 +98,8 @@ Arguments Ask(const std::string& source, const std::string& folder, const std::s
 }
 
 /// A tree and a file beside an empty folder, and a row's form to try on them.
-class FolderForms : public ::testing::TestWithParam<Row> {
+class FolderForms : public ::testing::TestWithParam<FormRow> {
  protected:
-  FolderForms() {
-    fs::create_directories(folder_ / "tree/sub");
-    fs::create_directory(folder_ / "to");
-    folder_.Write("tree/100%.jpg", "photo");
-    folder_.Write("tree/sub/old", "old");
-    folder_.Write("file", "new");
-  }
-
   OrbResult Run(Arguments& arguments) const { return kForms.at(row_.form)(arguments); }
   OrbResult Run(const std::string& source, const std::string& folder, const std::string& name) {
     Arguments arguments = Ask(source, folder, name);
@@ -162,8 +109,8 @@ class FolderForms : public ::testing::TestWithParam<Row> {
     return Run(folder_ / source, folder_ / folder, name);
   }
 
-  TempFolder folder_;
-  const Row row_ = GetParam();
+  const Tree folder_{"tree/100%.jpg, tree/sub/old=old, file=new, to/"};
+  const FormRow row_ = GetParam();
 };
 
 INSTANTIATE_TEST_SUITE_P(Forms, FolderForms, ::testing::ValuesIn(kRows), [](const auto& row) {
@@ -186,11 +133,11 @@ TEST_P(FolderForms, BringTheItem) {
     fs::remove_all(folder_ / "to/n\xc3\xa4me");
   }
   if (row_.ownName == kNo) return;
-  folder_.Write("a%20b", "x");
+  folder_.Make("a%20b");
   Arguments arguments = Ask(folder_ / "a%20b", folder_ / "to", "");
   arguments.ownName = true;
   EXPECT_EQ(Run(arguments), kOrbNoErr);
-  EXPECT_EQ(ReadAll(folder_ / "to/a%20b"), "x");
+  EXPECT_EQ(folder_.Read("to/a%20b"), "a%20b");
   arguments.source = PathOf(folder_ / "to/");
   arguments.folder = PathOf(folder_.Path());
   EXPECT_EQ(Run(arguments), kOrbErrInvalidName);
@@ -198,22 +145,14 @@ TEST_P(FolderForms, BringTheItem) {
 
 TEST_P(FolderForms, ReplaceWhatIsThereOrLeaveIt) {
   EXPECT_EQ(RunHere("file", "tree/sub", "old"), row_.existing);
-  EXPECT_EQ(ReadAll(folder_ / "tree/sub/old"), row_.existing == 0 ? "new" : "old");
+  EXPECT_EQ(folder_.Read("tree/sub/old"), row_.existing == 0 ? "new" : "old");
   EXPECT_EQ(fs::exists(folder_ / "file"), row_.moves == kNo || row_.existing != 0);
 }
 
 TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
-  fs::create_directory_symlink("tree", folder_ / "link");
-  folder_.Write("to/old", "old");
-  ASSERT_TRUE(Lock(folder_.Write("locked", "x")));
-  fs::create_directory(folder_ / "pinned");
-  folder_.Write("pinned/file", "x");
-  ASSERT_TRUE(Lock(folder_ / "pinned"));
-  fs::create_directories(folder_ / "to/full");
-  for (const char* name : {"to/full/a", "to/full/b", "to/full/c"}) folder_.Write(name, name);
-  ASSERT_TRUE(Lock(folder_ / "to/full/b"));
-  ASSERT_EQ(::mkfifo((folder_ / "pipe").c_str(), 0600), 0);
-  const auto before = Describe(folder_.Path());
+  folder_.Make("link -> tree, to/old=old, locked!, pipe|, pinned/file, pinned/!");
+  folder_.Make("to/full/a, to/full/b!, to/full/c");
+  const Unchanged unchanged(folder_.Path());
   EXPECT_EQ(RunHere("missing", "to", "old"), row_.missing);
   EXPECT_EQ(Run("", folder_ / "to", "old"), row_.missing);
   if (row_.existing == 0) {
@@ -237,14 +176,14 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
   }
   EXPECT_EQ(Run(folder_ / "file", "", "old"), kOrbErrEmptyPath);
   EXPECT_EQ(RunHere("file", "missing", "new"), kMissing);
-  EXPECT_TRUE(Describe(folder_.Path()) == before);
 }
 
 TEST_P(FolderForms, CallAndCanBeCanceledBefore) {
   Arguments arguments = Ask(folder_ / "file", folder_ / "to", "new");
   arguments.progress.falseAt = 1;
-  const AlmostFull volumes;
-  const orb::platform::ScopedVolumes scoped(volumes);
+  // What is there is gone by then: the caller asked for its removal first.
+  if (row_.existing == 0) folder_.Make("to/new");
+  const SpaceLeft space(kAlmostFull);
   const bool calls = row_.callsOnSuccess > 0;
   EXPECT_EQ(Run(arguments), calls ? kOrbErrCanceled : kOrbNoErr);
   EXPECT_EQ(arguments.progress.calls, calls ? 1 : 0);
@@ -257,9 +196,8 @@ TEST_P(FolderForms, CallAndCanBeCanceledBefore) {
 
 // An item that leads into itself fails for a reason that no table knows.
 TEST_P(FolderForms, TellWhyTheyFail) {
-  fs::create_directory_symlink("tree", folder_ / "link");
-  const AlmostFull volumes;
-  const orb::platform::ScopedVolumes scoped(volumes);
+  folder_.Make("link -> tree");
+  const SpaceLeft space(kAlmostFull);
   Arguments arguments = Ask(folder_ / "tree", folder_ / "link", "new");
   EXPECT_EQ(Run(arguments), row_.explained);
   EXPECT_EQ(arguments.progress.calls, row_.callsOnFailure);
@@ -267,10 +205,8 @@ TEST_P(FolderForms, TellWhyTheyFail) {
 }
 
 TEST_P(FolderForms, MayAskWhetherTheSourceCanBeUsed) {
-  const std::string secret = folder_.Write("secret", "x");
-  ASSERT_EQ(::chmod(secret.c_str(), 0), 0);
-  for (const char* name : {"", "to"}) ASSERT_EQ(::chmod((folder_ / name).c_str(), 0777), 0);
-  ORB_IN_CHILD(orb::test::RunAsUser(65534, [&] {
+  folder_.Make("secret 0000, to/ 0777");
+  ORB_IN_CHILD(RunAsUser(kStranger, [&] {
     EXPECT_EQ(RunHere("secret", "to", "new"), row_.unusable);
     EXPECT_EQ(fs::exists(folder_ / "to/new"), row_.unusable == 0);
   }));
@@ -278,92 +214,80 @@ TEST_P(FolderForms, MayAskWhetherTheSourceCanBeUsed) {
 
 // Only forms that are told nothing blame the volume there; the others keep what they were told.
 TEST(LowSpace, ExplainsWhatTheFormAllows) {
-  using orb::LowSpace;
   const TempFolder folder;
-  const AlmostFull volumes;
-  const orb::platform::ScopedVolumes scoped(volumes);
-  const struct {
-    LowSpace lowSpace;
-    bool explained;
-    OrbResult expected;
-  } kCases[] = {
-      {LowSpace::kNothing, false, kDenied},
-      {LowSpace::kNothing, true, kDenied},
-      {LowSpace::kUntold, false, kFull},
-      {LowSpace::kUntold, true, kDenied},
-      {LowSpace::kAnything, false, kFull},
-      {LowSpace::kAnything, true, kFull},
+  const std::tuple<std::uint64_t, LowSpace, bool, OrbResult> kCases[] = {
+      {kAlmostFull, LowSpace::kNothing, false, kDenied},
+      {kAlmostFull, LowSpace::kNothing, true, kDenied},
+      {kAlmostFull, LowSpace::kUntold, false, kFull},
+      {kAlmostFull, LowSpace::kUntold, true, kDenied},
+      {kAlmostFull, LowSpace::kAnything, false, kFull},
+      {kAlmostFull, LowSpace::kAnything, true, kFull},
+      {kAlmostFull + 1, LowSpace::kAnything, true, kDenied},
   };
-  for (const auto& c : kCases)
-    EXPECT_EQ(orb::ConsiderSpace({kDenied, c.explained}, c.lowSpace, PathOf(folder.Path())),
-              c.expected);
+  for (const auto& [available, lowSpace, explained, expected] : kCases) {
+    const SpaceLeft space(available);
+    EXPECT_EQ(ConsiderSpace({kDenied, explained}, lowSpace, PathOf(folder.Path())), expected);
+  }
 }
 
 TEST(MoveFile, TakesASeparatorInTheNameForALetter) {
-  const TempFolder folder;
+  const Tree tree("f");
+  const std::string name = "../a/\xcc\x88";  // Before a combining mark as well.
   COrbFilePath result;
-  // Before a combining mark as well.
-  const std::string name = "../a/\xcc\x88";
-  EXPECT_EQ(OrbMoveFile(PathOf(folder.Write("f", "x")), PathOf(folder.Path()), S(name), &result),
-            0u);
-  EXPECT_EQ(Text(result.GetFullPath()), folder / "..:a:\xcc\x88");
-  EXPECT_EQ(ReadAll(folder / "..:a:\xcc\x88"), "x");
+  EXPECT_EQ(OrbMoveFile(PathOf(tree / "f"), PathOf(tree.Path()), S(name), &result), kOrbNoErr);
+  EXPECT_EQ(Text(result.GetFullPath()), tree / "..:a:\xcc\x88");
+  EXPECT_EQ(tree.Read("..:a:\xcc\x88"), "f");
 }
 
 TEST(MoveFile, TakesTwoFullPaths) {
-  const TempFolder folder;
-  folder.Write("a", "a");
-  folder.Write("taken", "old");
-  fs::create_directory(folder / "tree");
-  const struct {
-    const char* from;
-    const char* to;
-    OrbResult asPaths;
-    OrbResult asTexts;
-  } kRefused[] = {
-      {"a", "taken", kDenied, kDenied},
-      {"a", "a", kDenied, kSame},
-      {"a", "A", 0, kSame},
-      {"A", "a", 0, kSame},
-      {"tree", "tree/new", kDenied, kInside},
-      {"missing", "new", kDenied, kMissing},
-      {"a", "missing/new", kDenied, kMissing},
-      {"a", "\xff", kDenied, kSame},  // What is no text compares as equal.
-      {"tree", "new", 0, 0},
+  const Tree tree("a, taken, tree/");
+  const auto asPaths = [](auto&& a, auto&& b) { return OrbMoveFile(PathOf(a), PathOf(b)); };
+  const auto asTexts = [](auto&& a, auto&& b) { return OrbMoveFile(S(a), S(b)); };
+  const Row<OrbResult> kAsPaths[] = {
+      {"a", "taken", kDenied},
+      {"a", "a", kDenied},
+      {"tree", "tree/new", kDenied},
+      {"missing", "new", kDenied},
+      {"a", "missing/new", kDenied},
+      {"a", "\xff", kDenied},
   };
-  for (const auto& c : kRefused) {
-    SCOPED_TRACE(std::string(c.from) + " to " + c.to);
-    EXPECT_EQ(OrbMoveFile(PathOf(folder / c.from), PathOf(folder / c.to)), c.asPaths);
-    if (std::string(c.to) == "new" && c.asPaths == 0) fs::rename(folder / "new", folder / "tree");
-    EXPECT_EQ(OrbMoveFile(S(folder / c.from), S(folder / c.to)), c.asTexts);
-  }
-  EXPECT_EQ(ReadAll(folder / "taken"), "old");
-  EXPECT_EQ(ReadAll(folder / "a"), "a");
-  EXPECT_TRUE(fs::exists(folder / "new"));
+  const Row<OrbResult> kAsTexts[] = {
+      {"a", "taken", kDenied},
+      {"a", "a", kSame},
+      {"a", "A", kSame},
+      {"tree", "tree/new", kInside},
+      {"missing", "new", kMissing},
+      {"a", "missing/new", kMissing},
+      {"a", "\xff", kSame},  // What is no text compares as equal.
+  };
+  ExpectRefusals(tree, kAsPaths, asPaths);
+  ExpectRefusals(tree, kAsTexts, asTexts);
+  EXPECT_EQ(asPaths(tree / "a", tree / "A"), kOrbNoErr);
+  EXPECT_EQ(asTexts(tree / "tree", tree / "new"), kOrbNoErr);
+  EXPECT_EQ(NamesIn(tree.Path()), (std::set<std::string>{"A", "new", "taken"}));
 }
 
 TEST(FormsWithoutAName, AreNotSupported) {
-  const TempFolder folder;
+  const Tree tree("a");
   Progress progress;
-  const COrbFilePath from = PathOf(folder.Write("a", "a"));
-  const COrbFilePath to = PathOf(folder / "b");
+  const COrbFilePath from = PathOf(tree / "a");
+  const COrbFilePath to = PathOf(tree / "b");
   EXPECT_EQ(OrbMoveFileEx(from, to, Progress::Call, &progress), kOrbErrNotSupported);
   EXPECT_EQ(OrbCopyFolderEx(from, to, Progress::Call, &progress), kOrbErrNotSupported);
   EXPECT_EQ(progress.calls, 0);
-  EXPECT_FALSE(fs::exists(folder / "b"));
+  EXPECT_FALSE(tree.Has("b"));
 }
 
 TEST(MoveFileOverwrite, MakesNoWayForAnImmutableItem) {
-  const TempFolder folder;
-  fs::create_directory(folder / "to");
-  folder.Write("to/name", "old");
-  const std::string flag = "chattr +i " + folder.Write("file", "new") + " 2>/dev/null";
-  if (std::system(flag.c_str()) != 0) GTEST_SKIP() << "no such flag here";
+  const Tree tree("to/name=old, file");
+  if (std::system(("chattr +i " + (tree / "file") + " 2>/dev/null").c_str()) != 0)
+    GTEST_SKIP() << "no such flag here";
   const COrbStringData name = S("name");
-  EXPECT_EQ(OrbMoveFileOverwrite(PathOf(folder / "file"), PathOf(folder / "to"), &name, nullptr),
+  EXPECT_EQ(OrbMoveFileOverwrite(PathOf(tree / "file"), PathOf(tree / "to"), &name, nullptr),
             kDenied);
-  EXPECT_EQ(ReadAll(folder / "to/name"), "old");
-  EXPECT_EQ(std::system(("chattr -i " + (folder / "file")).c_str()), 0);
+  EXPECT_EQ(tree.Read("to/name"), "old");
+  EXPECT_EQ(std::system(("chattr -i " + (tree / "file")).c_str()), 0);
 }
 
 }  // namespace
+}  // namespace orb::test

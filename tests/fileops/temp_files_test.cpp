@@ -1,31 +1,12 @@
 // SPDX-License-Identifier: MIT
-#include <gtest/gtest.h>
 #include <orb/fileops/temp_files.h>
-#include <sys/stat.h>
 
-#include <cstdlib>
-#include <filesystem>
-#include <fstream>
-#include <string>
 #include <thread>
 
-#include "support/faults.h"
-#include "support/paths.h"
-#include "support/temp_folder.h"
+#include "support/files.h"
 
+namespace orb::test {
 namespace {
-
-namespace fs = std::filesystem;
-using orb::test::ChildOutcome;
-using orb::test::ReadAll;
-using orb::test::RunInChild;
-using orb::test::TempFolder;
-
-mode_t ModeOf(const std::string& path) {
-  struct stat status {};
-  ::lstat(path.c_str(), &status);
-  return status.st_mode & 07777;
-}
 
 /// The path that was made, or the code in its place.
 std::string Create(const COrbFilePath* folder, const std::string& suffix) {
@@ -64,39 +45,30 @@ TEST(CreateTempFileDeathTest, CountsFromZeroInEveryProcess) {
 }
 
 TEST(CreateTempFile, TriesEveryNumberOnceAndEmptiesNobodysFile) {
-  const TempFolder folder;
+  const Tree tree;
   for (int i = 0; i < 10'000; ++i) {
     const std::string name = "OrbTmp" + std::to_string(10'000 + i).substr(1);
-    if (i == 4321) continue;
     // A link is a name that is taken, although it leads nowhere.
-    i % 2 == 0 ? (void)folder.Write(name, "photo") : fs::create_symlink("nowhere", folder / name);
+    if (i != 4321) tree.Make(name + (i % 2 == 0 ? "=photo" : " -> nowhere"));
   }
-  EXPECT_EQ(CreateIn(folder.Path(), ""), folder / "OrbTmp4321");
-  EXPECT_EQ(CreateIn(folder.Path(), ""), std::to_string(kOrbErrDiskFull));
-  EXPECT_EQ(ReadAll(folder / "OrbTmp0000"), "photo");
-  EXPECT_FALSE(fs::exists(folder / "nowhere"));
+  EXPECT_EQ(CreateIn(tree.Path(), ""), tree / "OrbTmp4321");
+  EXPECT_EQ(CreateIn(tree.Path(), ""), std::to_string(kOrbErrDiskFull));
+  EXPECT_EQ(tree.Read("OrbTmp0000"), "photo");
+  EXPECT_FALSE(tree.Has("nowhere"));
 }
 
 TEST(CreateTempFile, SaysWhyItCannot) {
-  const TempFolder folder;
-  fs::create_directory(folder / "locked");
-  ASSERT_TRUE(Lock(folder / "locked"));
-  const struct {
-    std::string folder;
-    std::string suffix;
-    OrbResult expected;
-  } kCases[] = {
+  const Tree tree("locked/!");
+  const Row<OrbResult> kCases[] = {
       {"", "", kOrbErrEmptyPath},
-      {folder / "missing", "", kOrbErrAccessDenied},
-      {folder / "locked", "", kOrbErrAccessDenied},
-      {folder.Path(), "/../../outside", kOrbErrAccessDenied},
-      {folder.Path(), "\xff", kOrbErrInvalidName},
-      {folder.Path(), std::string(250, 'n'), kOrbErrInvalidName},
+      {"missing", "", kOrbErrAccessDenied},
+      {"locked", "", kOrbErrAccessDenied},
+      {tree.Path(), "/../../outside", kOrbErrAccessDenied},
+      {tree.Path(), "\xff", kOrbErrInvalidName},
+      {tree.Path(), std::string(250, 'n'), kOrbErrInvalidName},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.folder + " " + c.suffix);
-    EXPECT_EQ(CreateIn(c.folder, c.suffix), std::to_string(c.expected));
-  }
+  for (const auto& [folder, suffix, expected] : kCases)
+    EXPECT_EQ(CreateIn(tree.At(folder), suffix), std::to_string(expected)) << folder << suffix;
 }
 
 // Threads of several processes, all with the same numbers, in one folder.
@@ -119,12 +91,9 @@ TEST(CreateTempFile, GivesNoTwoCallersTheSameFile) {
   int status = -1;
   EXPECT_EQ(::waitpid(child, &status, 0), child);
   EXPECT_EQ(status, 0);
-  int count = 0;
-  for (const auto& file : fs::directory_iterator(folder.Path())) {
-    EXPECT_EQ(ReadAll(file.path()).size(), 2u) << file.path();
-    ++count;
-  }
-  EXPECT_EQ(count, 4 * kFiles);
+  EXPECT_EQ(NamesIn(folder.Path()).size(), 4u * kFiles);
+  for (const std::string& name : NamesIn(folder.Path()))
+    EXPECT_EQ(ReadAll(folder / name).size(), 2u) << name;
 }
 
 /// $TMPDIR in a child process, where the project name may be changed as well.
@@ -153,11 +122,9 @@ TEST(ProjectTempFolder, IsMadeLevelByLevelWithItsOwnMode) {
 }
 
 TEST(ProjectTempFolder, RefusesNamesThatLeadElsewhere) {
-  const TempFolder folder;
-  fs::create_directories(folder / "temp/Calyx/RTL");
-  fs::create_directories(folder / "temp/RTL/photos");
-  fs::create_directories(folder / "RTL/photos");
-  WithTempDirectory(folder / "temp", [&] {
+  const Tree tree("temp/Calyx/RTL/, temp/RTL/photos/, RTL/photos/");
+  const Unchanged unchanged(tree.Path());
+  WithTempDirectory(tree / "temp", [&] {
     const std::string overlong(256, 'n');
     for (const char* name : {"..", "a/../..", "\xff", overlong.c_str()}) {
       SCOPED_TRACE(name);
@@ -167,39 +134,31 @@ TEST(ProjectTempFolder, RefusesNamesThatLeadElsewhere) {
       OrbClearProjectTempFolder();
     }
   });
-  EXPECT_TRUE(fs::exists(folder / "RTL/photos") && fs::exists(folder / "temp/RTL/photos"));
-  EXPECT_TRUE(fs::is_empty(folder / "temp/Calyx/RTL"));
 }
 
 TEST(ProjectTempFolder, TrustsNoLevelThatOthersControl) {
-  const struct {
-    const char* level;
-    void (*spoil)(const std::string& level, const std::string& elsewhere);
-  } kCases[] = {
-      {"Calyx", [](auto& level, auto& elsewhere) { fs::rename(level, elsewhere + "/own"); }},
-      {"Calyx/P/RTL", [](auto& level, auto& elsewhere) { fs::rename(level, elsewhere + "/own"); }},
-      {"Calyx", [](auto& level, auto&) { fs::permissions(level, fs::perms(0777)); }},
-      {"Calyx/P/RTL", [](auto& level, auto&) { fs::permissions(level, fs::perms(0775)); }},
-      {"Calyx/P/RTL", [](auto& level, auto&) { (void)!::chown(level.c_str(), 65534, 65534); }},
+  const char* const kCases[] = {
+      "mv Calyx ../own && ln -s ../own Calyx",
+      "mv Calyx/P/RTL ../own && ln -s ../../../own Calyx/P/RTL",
+      "chmod 0777 Calyx",
+      "chmod 0775 Calyx/P/RTL",
+      "chown 65534:65534 Calyx/P/RTL",
   };
   if (::geteuid() != 0) GTEST_SKIP() << "only root can give a folder away";
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.level);
-    const TempFolder folder;
-    fs::create_directories(folder / "elsewhere");
-    fs::create_directories(folder / "temp/Calyx/P/RTL/photos");
-    c.spoil(folder / "temp/" + c.level, folder / "elsewhere");
-    const bool moved = fs::exists(folder / "elsewhere/own");
-    if (moved) fs::create_directory_symlink(folder / "elsewhere/own", folder / "temp/" + c.level);
-    WithTempDirectory(folder / "temp", [&] {
+  for (const char* const spoil : kCases) {
+    SCOPED_TRACE(spoil);
+    const Tree tree("temp/Calyx/P/RTL/photos/");
+    ASSERT_EQ(std::system(("cd '" + (tree / "temp") + "' && " + spoil).c_str()), 0);
+    const Unchanged unchanged(tree.Path());
+    WithTempDirectory(tree / "temp", [&] {
       OrbSetProjectName(S("P"));
-      EXPECT_EQ(Project(), folder / "temp/Calyx/P/RTL");
+      EXPECT_EQ(Project(), tree / "temp/Calyx/P/RTL");
       EXPECT_EQ(Create(nullptr, ""), std::to_string(kOrbErrAccessDenied));
       OrbClearProjectTempFolder();
     });
-    EXPECT_TRUE(fs::exists(folder / "temp/Calyx/P/RTL/photos"));
-    EXPECT_EQ(std::distance(fs::directory_iterator(folder / "temp/Calyx/P/RTL"), {}), 1);
+    EXPECT_EQ(NamesIn(tree / "temp/Calyx/P/RTL"), std::set<std::string>{"photos"});
   }
 }
 
 }  // namespace
+}  // namespace orb::test

@@ -1,29 +1,17 @@
 // SPDX-License-Identifier: MIT
-#include <gtest/gtest.h>
 #include <orb/fileops/whole_file.h>
-#include <sys/stat.h>
 
-#include <filesystem>
-#include <string>
+#include "support/files.h"
 
-#include "support/faults.h"
-#include "support/paths.h"
-#include "support/temp_folder.h"
-
+namespace orb::test {
 namespace {
-
-namespace fs = std::filesystem;
-using orb::test::ReadAll;
-using orb::test::TempFolder;
 
 OrbResult Write(const std::string& path, const std::string& data) {
   return OrbWriteFile(PathOf(path), data.data(), static_cast<unsigned int>(data.size()));
 }
 
 TEST(ReadFile, FillsTheBufferAsFarAsTheFileGoes) {
-  const TempFolder folder;
-  folder.Write("file", "0123456789");
-  fs::create_symlink("file", folder / "link");
+  const Tree folder("file=0123456789, link -> file");
   for (const char* name : {"file", "link"}) {
     std::string buffer(100, '-');
     EXPECT_EQ(OrbReadFile(PathOf(folder / name), buffer.data(), 100), kOrbNoErr);
@@ -37,9 +25,8 @@ TEST(ReadFile, FillsTheBufferAsFarAsTheFileGoes) {
 }
 
 TEST(WriteFile, WritesOverTheStartOnly) {
-  const TempFolder folder;
-  const std::string file = folder.Write("file", "0123456789");
-  fs::create_symlink("file", folder / "link");
+  const Tree folder("file=0123456789, link -> file");
+  const std::string file = folder / "file";
   EXPECT_EQ(Write(file, "abcd"), kOrbNoErr);
   EXPECT_EQ(ReadAll(file), "abcd456789");
   EXPECT_EQ(OrbWriteFile(PathOf(file), nullptr, 0), kOrbNoErr);
@@ -50,39 +37,29 @@ TEST(WriteFile, WritesOverTheStartOnly) {
 }
 
 TEST(WholeFile, SaysWhatCannotBeOpened) {
-  const TempFolder folder;
-  folder.Write("locked", "photo");
-  ASSERT_TRUE(Lock(folder / "locked"));
-  fs::create_symlink("locked", folder / "link");
-  ASSERT_EQ(::mkfifo((folder / "pipe").c_str(), 0666), 0);
-  const struct {
-    std::string path;
-    OrbResult reading;
-    OrbResult writing;
-  } kCases[] = {
+  const Tree tree("locked=photo!, link -> locked, pipe| 0666, folder/");
+  const std::tuple<const char*, OrbResult, OrbResult> kCases[] = {
       {"", kOrbErrNotFound, kOrbErrNotFound},
-      {folder / "missing", kOrbErrNotFound, kOrbErrNotFound},
-      {folder / "\xff", kOrbErrNotFound, kOrbErrNotFound},
-      {folder.Path(), kOrbErrUnknown, kOrbErrUnknown},
-      {folder / "pipe", kOrbErrAccessDenied, kOrbErrAccessDenied},
-      {folder / "locked", kOrbNoErr, kOrbErrAccessDenied},
-      {folder / "link", kOrbNoErr, kOrbErrAccessDenied},
+      {"missing", kOrbErrNotFound, kOrbErrNotFound},
+      {"\xff", kOrbErrNotFound, kOrbErrNotFound},
+      {"folder", kOrbErrUnknown, kOrbErrUnknown},
+      {"pipe", kOrbErrAccessDenied, kOrbErrAccessDenied},
+      {"locked", kOrbNoErr, kOrbErrAccessDenied},
+      {"link", kOrbNoErr, kOrbErrAccessDenied},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.path);
+  const Unchanged unchanged(tree.Path());
+  for (const auto& [path, reading, writing] : kCases) {
     char letter = '-';
-    EXPECT_EQ(OrbReadFile(PathOf(c.path), &letter, 1), c.reading);
-    EXPECT_EQ(letter, c.reading == kOrbNoErr ? 'p' : '-');
-    EXPECT_EQ(Write(c.path, "x"), c.writing);
+    EXPECT_EQ(OrbReadFile(PathOf(tree.At(path)), &letter, 1), reading) << path;
+    EXPECT_EQ(letter, reading == kOrbNoErr ? 'p' : '-') << path;
+    EXPECT_EQ(Write(tree.At(path), "x"), writing) << path;
   }
-  EXPECT_EQ(ReadAll(folder / "locked"), "photo");
-  EXPECT_FALSE(fs::exists(folder / "missing"));
 }
 
 TEST(WriteFile, ThatCannotGrowLeavesTheFileAsItWas) {
   const TempFolder folder;
-  ORB_IN_CHILD(orb::test::RunWithPrivateMounts([&] {
-    ASSERT_TRUE(orb::test::MountTmpfs(folder / "small", "size=64k"));
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(MountTmpfs(folder / "small", "size=64k"));
     const std::string photo(10'000, 'p');
     const std::string file = folder.Write("small/photo", photo);
     EXPECT_EQ(Write(file, std::string(100'000, 'x')), kOrbErrUnknown);
@@ -92,3 +69,4 @@ TEST(WriteFile, ThatCannotGrowLeavesTheFileAsItWas) {
 }
 
 }  // namespace
+}  // namespace orb::test

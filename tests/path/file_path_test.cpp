@@ -2,24 +2,14 @@
 #include <gtest/gtest.h>
 #include <orb/path/file_path.h>
 
-#include <filesystem>
-#include <string>
+#include <tuple>
 #include <utility>
 
-#include "support/temp_folder.h"
-#include "support/texts.h"
+#include "support/files.h"
 
 namespace {
 
-namespace fs = std::filesystem;
-using orb::test::TempFolder;
-
-COrbFilePath Path(const std::string& text) {
-  COrbFilePath path;
-  const COrbStringData full = S(text);
-  path.Initialize(&full);
-  return path;
-}
+using namespace orb::test;
 
 std::string Text(const COrbFilePath& path) { return Text(path.GetFullPath()); }
 
@@ -71,7 +61,7 @@ TEST(FilePath, TakesPlatformTexts) {
   EXPECT_EQ(path.Initialize(&text), kOrbNoErr);
   EXPECT_TRUE(path.IsEmpty());
 
-  const CFURLRef url = Path("/a/b/").CreateCopyCFURL();
+  const CFURLRef url = PathOf("/a/b/").CreateCopyCFURL();
   EXPECT_EQ(path.Initialize(url), kOrbNoErr);
   EXPECT_EQ(Text(path), "/a/b");
   CFRelease(url);
@@ -81,37 +71,33 @@ TEST(FilePath, TakesPlatformTexts) {
 }
 
 TEST(GetParent, IsTheTextUpToTheLastSeparator) {
-  const struct {
-    const char *path, *parent;
-    OrbResult result = kOrbNoErr;
-  } kCases[] = {
-      {"/a/b", "/a"},
-      {"/a/b/", "/a"},
-      {"/a/b//", "/a/b"},
-      {"/a", "/"},
-      {"/a/", "/"},
-      {"//", "/"},
-      {"a/b", "a"},
-      {"/a/\xFF", "/a"},
+  const std::tuple<const char*, const char*, OrbResult> kCases[] = {
+      {"/a/b", "/a", kOrbNoErr},
+      {"/a/b/", "/a", kOrbNoErr},
+      {"/a/b//", "/a/b", kOrbNoErr},
+      {"/a", "/", kOrbNoErr},
+      {"/a/", "/", kOrbNoErr},
+      {"//", "/", kOrbNoErr},
+      {"a/b", "a", kOrbNoErr},
+      {"/a/\xFF", "/a", kOrbNoErr},
       {"", "", kOrbErrEmptyPath},
       {"/", "/", kOrbErrNoSuchFile},
       {"a", "a", kOrbErrNoSuchFile},
       {"a/", "a/", kOrbErrNoSuchFile},
   };
-  for (const auto& c : kCases) {
-    COrbFilePath path = Path(c.path);
-    EXPECT_EQ(path.GetParent(&path), c.result) << c.path;
-    EXPECT_EQ(Text(path), c.parent) << c.path;
+  for (const auto& [text, parent, result] : kCases) {
+    COrbFilePath path = PathOf(text);
+    EXPECT_EQ(path.GetParent(&path), result) << text;
+    EXPECT_EQ(Text(path), parent) << text;
   }
   WatchedPath parent;
-  EXPECT_EQ(Path("/a/b").GetParent(&parent), 0x77u);
+  EXPECT_EQ(PathOf("/a/b").GetParent(&parent), 0x77u);
   EXPECT_EQ(Text(parent), "/a");
 }
 
 TEST(FileReference, HoldsTheAbsolutePathOfAnExistingItem) {
-  const TempFolder folder;
-  const std::string file = folder.Write("\xC3\xA9 %s", "x");
-  fs::create_symlink("\xC3\xA9 %s", folder / "link");
+  const Tree folder("\xC3\xA9 %s, link -> \xC3\xA9 %s");
+  const std::string file = folder / "\xC3\xA9 %s";
   const fs::path old = fs::current_path();
   fs::current_path(folder.Path());
   const std::pair<std::string, std::string> kCases[] = {
@@ -122,7 +108,7 @@ TEST(FileReference, HoldsTheAbsolutePathOfAnExistingItem) {
       {"/", "/"}};
   for (const auto& [path, held] : kCases) {
     FSRef reference;
-    EXPECT_EQ(Path(path).GetFSRef(&reference), kOrbNoErr) << path;
+    EXPECT_EQ(PathOf(path).GetFSRef(&reference), kOrbNoErr) << path;
     COrbFilePath back;
     EXPECT_EQ(back.Initialize(&reference), kOrbNoErr) << path;
     EXPECT_EQ(Text(back), held);
@@ -131,14 +117,10 @@ TEST(FileReference, HoldsTheAbsolutePathOfAnExistingItem) {
 }
 
 TEST(FileReference, NeedsSomethingAtThePath) {
-  const TempFolder folder;
-  fs::create_symlink("nothing", folder / "dangling");
-  folder.Write("\xFF", "not UTF-8");
-  folder.Write("file", "");
-  for (const std::string& path :
-       {std::string(), folder / "none", folder / "dangling", folder / "\xFF", folder / "file/"}) {
+  const Tree tree("dangling -> nothing, \xFF, file");
+  for (const char* path : {"", "none", "dangling", "\xFF", "file/"}) {
     FSRef reference{};
-    EXPECT_EQ(Path(path).GetFSRef(&reference), kOrbErrNotFound) << path;
+    EXPECT_EQ(PathOf(tree.At(path)).GetFSRef(&reference), kOrbErrNotFound) << path;
     EXPECT_EQ(reference.hidden[0], 0);
     WatchedPath back;
     EXPECT_EQ(back.Initialize(&reference), kOrbErrNoSuchFile);
@@ -156,7 +138,7 @@ TEST(FileReference, GivesPathsOfUpTo2047Bytes) {
     const std::string path = deep + "/" + std::string(length - deep.size() - 1, 'f');
     std::ofstream(path) << 'x';
     FSRef reference;
-    ASSERT_EQ(Path(path).GetFSRef(&reference), kOrbNoErr);
+    ASSERT_EQ(PathOf(path).GetFSRef(&reference), kOrbNoErr);
     COrbStringData text = S("old");
     COrbFilePath back;
     const bool fits = length == 2047;

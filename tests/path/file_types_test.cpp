@@ -2,9 +2,11 @@
 #include "path/file_types.h"
 
 #include <gtest/gtest.h>
+#include <orb/strings/string_functions.h>
 
-#include <cctype>
+#include <sstream>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "support/texts.h"
@@ -27,10 +29,7 @@ Texts ExtensionsOf(std::uint32_t type, OrbResult result) {
 }
 
 TEST(FileType, GoesBothWays) {
-  const struct {
-    std::uint32_t type;
-    Texts extensions;
-  } kTypes[] = {
+  const std::pair<std::uint32_t, Texts> kTypes[] = {
       {0x01100001, {".jpeg", ".jpg"}}, {0x01100002, {".tif", ".tiff"}},
       {0x01100003, {".rwq"}},          {0x01100004, {".rwc"}},
       {0x01100005, {".mpo"}},          {0x01200001, {".pct", ".pict"}},
@@ -45,12 +44,10 @@ TEST(FileType, GoesBothWays) {
       {0x08000007, {".log"}},          {0x08000008, {".lga"}},
       {0x08000009, {".lgb"}},          {0x08000010, {".sdcq"}},
   };
-  for (const auto& c : kTypes) {
-    const auto type = static_cast<eOrbFileType>(c.type);
-    EXPECT_EQ(ExtensionsOf(c.type, kOrbNoErr), c.extensions);
-    for (const std::string& extension : c.extensions) {
-      std::string upper = extension;
-      for (char& letter : upper) letter = static_cast<char>(std::toupper(letter));
+  for (const auto& [type, extensions] : kTypes) {
+    EXPECT_EQ(ExtensionsOf(type, kOrbNoErr), extensions);
+    for (const std::string& extension : extensions) {
+      const std::string upper = Text(OrbStringDataUpper(S(extension)));
       EXPECT_EQ(TypeOf(extension), type) << extension;
       EXPECT_EQ(orb::FileTypeOfName("a.b" + upper), type) << upper;
     }
@@ -62,12 +59,11 @@ TEST(FileType, GoesBothWays) {
 
 TEST(FileType, OfOtherTextsIsUnknown) {
   EXPECT_EQ(OrbPathConvertExtensionToType(COrbStringData()), eOrbFileType_Unknown);
-  for (const char* text : {"", ".", "jpg", "..jpg", ".jp", ".jpgx", ".jpegs", ".d/b", ".jpgjpg"}) {
-    EXPECT_EQ(TypeOf(text), eOrbFileType_Unknown) << text;
-  }
-  for (const char* text : {".JP\xC7\xA6", ".jpg\xFF", "\xFF", ".jpg\xCC\x81", "\xEF\xBC\x8Ejpg"}) {
-    EXPECT_EQ(TypeOf(text), eOrbFileType_Unknown) << text;
-  }
+  std::istringstream texts(
+      ". jpg ..jpg .jp .jpgx .jpegs .d/b .jpgjpg .JP\xC7\xA6 .jpg\xFF \xFF .jpg\xCC\x81 "
+      "\xEF\xBC\x8Ejpg");
+  for (std::string text; texts >> text;) EXPECT_EQ(TypeOf(text), eOrbFileType_Unknown) << text;
+  EXPECT_EQ(TypeOf(""), eOrbFileType_Unknown);
 }
 
 TEST(FileType, OfANameIsThatOfItsLastPart) {

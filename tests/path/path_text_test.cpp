@@ -2,10 +2,12 @@
 #include <gtest/gtest.h>
 #include <orb/path/path_text.h>
 
+#include <array>
 #include <string>
+#include <tuple>
 #include <vector>
 
-#include "support/texts.h"
+#include "support/paths.h"
 
 namespace {
 
@@ -15,10 +17,7 @@ using Texts = std::vector<std::string>;
 template <typename Function, typename... Rest>
 std::string Both(Function function, const std::string& path, const Rest&... rest) {
   const std::string text = Text(function(S(path), rest...));
-  COrbFilePath filePath;
-  const COrbStringData full = S(path);
-  filePath.Initialize(&full);
-  const std::string ofPath = Text(function(filePath, rest...));
+  const std::string ofPath = Text(function(PathOf(path), rest...));
   EXPECT_EQ(ofPath, path.empty() ? "" : text);
   return text;
 }
@@ -35,9 +34,7 @@ Texts Pieces(const std::string& path) {
 }
 
 TEST(PathText, FindsExtensionAndFileName) {
-  const struct {
-    const char *path, *dotted, *extension, *name, *withoutExtension;
-  } kCases[] = {
+  const std::array<const char*, 5> kCases[] = {
       {"/a/b.tar.gz", ".gz", "gz", "b.tar.gz", "b.tar"},
       {"/a/b", "", "", "b", "b"},
       {"/a.d/b", ".d/b", "d/b", "b", "b"},
@@ -48,12 +45,12 @@ TEST(PathText, FindsExtensionAndFileName) {
       {"/a.\xCC\x81x", ".\xCC\x81x", "\xCC\x81x", "a.\xCC\x81x", "a"},  // Found literally.
       {"/\xFF.c", "", "", "/\xFF.c", "/\xFF.c"},  // Not UTF-8: nothing is found.
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.path);
-    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, c.path, true), c.dotted);
-    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, c.path, false), c.extension);
-    EXPECT_EQ(ORB_BOTH(OrbPathFindFileName, c.path, false), c.name);
-    EXPECT_EQ(ORB_BOTH(OrbPathFindFileName, c.path, true), c.withoutExtension);
+  for (const auto& [path, dotted, extension, name, withoutExtension] : kCases) {
+    SCOPED_TRACE(path);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, path, true), dotted);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindExtension, path, false), extension);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindFileName, path, false), name);
+    EXPECT_EQ(ORB_BOTH(OrbPathFindFileName, path, true), withoutExtension);
   }
 }
 
@@ -77,9 +74,7 @@ TEST(PathText, SplitsIntoThePiecesThatAreNotEmpty) {
 }
 
 TEST(PathText, RenamesFromThePieces) {
-  const struct {
-    const char *path, *given, *extensionRenamed, *nameRenamed;
-  } kCases[] = {
+  const std::array<const char*, 4> kCases[] = {
       {"/a/b.jpg", ".tif", "/a/b.tif", "/a/.tif.jpg"},
       {"/a/b.jpg", "c", "/a/b.c", "/a/c.jpg"},
       {"/a/b.jpg", ".", "/a/b", "/a/..jpg"},
@@ -91,17 +86,14 @@ TEST(PathText, RenamesFromThePieces) {
       {"//", "x", ".x", "x"},
       {"", "x", ".x", "x"},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(testing::Message() << c.path << " with " << c.given);
-    EXPECT_EQ(ORB_BOTH(OrbPathRenameExtension, c.path, S(c.given)), c.extensionRenamed);
-    EXPECT_EQ(ORB_BOTH(OrbPathRenameFileName, c.path, S(c.given)), c.nameRenamed);
+  for (const auto& [path, given, extensionRenamed, nameRenamed] : kCases) {
+    EXPECT_EQ(ORB_BOTH(OrbPathRenameExtension, path, S(given)), extensionRenamed) << path << given;
+    EXPECT_EQ(ORB_BOTH(OrbPathRenameFileName, path, S(given)), nameRenamed) << path << given;
   }
 }
 
 TEST(PathText, TakesAndAddsOneSeparator) {
-  const struct {
-    const char *path, *without, *with;
-  } kCases[] = {
+  const std::array<const char*, 3> kCases[] = {
       {"/a/", "/a", "/a/"},
       {"/a", "/a", "/a/"},
       {"/", "", "/"},
@@ -109,18 +101,14 @@ TEST(PathText, TakesAndAddsOneSeparator) {
       {"/a//", "/a/", "/a//"},
       {"\xFF/", "\xFF", "\xFF/"},
   };
-  for (const auto& c : kCases) {
-    EXPECT_EQ(ORB_BOTH(OrbPathRemoveBackslash, c.path), c.without) << c.path;
-    EXPECT_EQ(ORB_BOTH(OrbPathAddBackslash, c.path), c.with) << c.path;
+  for (const auto& [path, without, with] : kCases) {
+    EXPECT_EQ(ORB_BOTH(OrbPathRemoveBackslash, path), without) << path;
+    EXPECT_EQ(ORB_BOTH(OrbPathAddBackslash, path), with) << path;
   }
 }
 
 TEST(PathText, ComparesPathsAndTellsAncestors) {
-  const struct {
-    const char *a, *b;
-    int exact, noCase;
-    bool isPrefix, isAncestor;
-  } kCases[] = {
+  const std::tuple<const char*, const char*, int, int, bool, bool> kCases[] = {
       {"/a", "/a/", 0, 0, true, true},
       {"/ab", "/a", 1, 1, false, false},
       {"/a/b", "/a/bcde", -3, -3, true, false},
@@ -138,13 +126,13 @@ TEST(PathText, ComparesPathsAndTellsAncestors) {
       {"/ff", "/\xEF\xAC\x80", -1, -1, false, false},  // The ligature ff.
       {"/\xFF", "/a", 0, 0, true, true},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(testing::Message() << c.a << " and " << c.b);
-    EXPECT_EQ(OrbPathCompare(S(c.a), S(c.b)), c.exact);
-    EXPECT_EQ(OrbPathCompare(S(c.b), S(c.a)), -c.exact);
-    EXPECT_EQ(OrbPathCompareNoCase(S(c.a), S(c.b)), c.noCase);
-    EXPECT_EQ(OrbPathIsEqualOrRootActually(S(c.a), S(c.b), false), c.isPrefix);
-    EXPECT_EQ(OrbPathIsEqualOrRootActually(S(c.a), S(c.b), true), c.isAncestor);
+  for (const auto& [a, b, exact, noCase, isPrefix, isAncestor] : kCases) {
+    SCOPED_TRACE(testing::Message() << a << " and " << b);
+    EXPECT_EQ(OrbPathCompare(S(a), S(b)), exact);
+    EXPECT_EQ(OrbPathCompare(S(b), S(a)), -exact);
+    EXPECT_EQ(OrbPathCompareNoCase(S(a), S(b)), noCase);
+    EXPECT_EQ(OrbPathIsEqualOrRootActually(S(a), S(b), false), isPrefix);
+    EXPECT_EQ(OrbPathIsEqualOrRootActually(S(a), S(b), true), isAncestor);
   }
   EXPECT_FALSE(OrbPathIsEndofInvalidCharactor(S("/a.")));
 }

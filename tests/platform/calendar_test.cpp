@@ -7,15 +7,16 @@
 #include <cstdlib>
 #include <ctime>
 #include <random>
+#include <sstream>
 #include <string>
 #include <thread>
+#include <tuple>
 #include <utility>
 #include <vector>
 
 #include "support/time_zone.h"
 
 namespace orb::platform {
-
 namespace {
 
 using orb::test::TimeZone;
@@ -26,13 +27,12 @@ constexpr std::int64_t k2200 = 7'258'118'400;
 CivilTime SystemFields(std::time_t instant) {
   std::tm fields{};
   EXPECT_NE(::localtime_r(&instant, &fields), nullptr);
-  const auto field = [](int number) { return static_cast<unsigned>(number); };
-  return {fields.tm_year + std::int64_t{1900},
-          field(fields.tm_mon + 1),
-          field(fields.tm_mday),
-          field(fields.tm_hour),
-          field(fields.tm_min),
-          field(fields.tm_sec)};
+  CivilTime civil{fields.tm_year + std::int64_t{1900}, static_cast<unsigned>(fields.tm_mon + 1)};
+  civil.day = static_cast<unsigned>(fields.tm_mday);
+  civil.hour = static_cast<unsigned>(fields.tm_hour);
+  civil.minute = static_cast<unsigned>(fields.tm_min);
+  civil.second = static_cast<unsigned>(fields.tm_sec);
+  return civil;
 }
 
 void ExpectAgreement(std::int64_t instant) {
@@ -45,18 +45,10 @@ void ExpectAgreement(std::int64_t instant) {
 TEST(Calendar, AgreesWithTheSystemInEveryZone) {
   std::mt19937_64 random(1904);
   std::uniform_int_distribution<std::int64_t> anyInstant(k1904, k2200);
-  const char* const kZones[] = {"UTC",
-                                "Europe/Paris",
-                                "America/St_Johns",
-                                "America/Sao_Paulo",
-                                "America/Boa_Vista",
-                                "Australia/Lord_Howe",
-                                "Asia/Kathmandu",
-                                "Africa/Casablanca",
-                                "Pacific/Apia",
-                                "EST5EDT,M3.2.0,M11.1.0",
-                                "no such zone"};
-  for (const char* name : kZones) {
+  std::istringstream zones(
+      "UTC Europe/Paris America/St_Johns America/Sao_Paulo America/Boa_Vista Australia/Lord_Howe "
+      "Asia/Kathmandu Africa/Casablanca Pacific/Apia EST5EDT,M3.2.0,M11.1.0 no/such/zone");
+  for (std::string name; zones >> name;) {
     SCOPED_TRACE(name);
     const TimeZone zone(name);
     for (int i = 0; i < 3000; ++i) ExpectAgreement(anyInstant(random));
@@ -65,11 +57,7 @@ TEST(Calendar, AgreesWithTheSystemInEveryZone) {
 }
 
 TEST(Calendar, SkippedAndRepeatedTimesHaveOneInstant) {
-  const struct {
-    const char* zone;
-    CivilTime local;
-    std::int64_t instant;
-  } kCases[] = {
+  const std::tuple<const char*, CivilTime, std::int64_t> kCases[] = {
       {"Europe/Paris", {2024, 3, 31, 2, 30, 0}, 1'711'848'600},   // Skipped.
       {"Europe/Paris", {2024, 10, 27, 2, 30, 0}, 1'729'989'000},  // Repeated.
       {"Pacific/Apia", {2011, 12, 30, 12, 0, 0}, 1'325'282'400},  // A whole day skipped.
@@ -77,16 +65,16 @@ TEST(Calendar, SkippedAndRepeatedTimesHaveOneInstant) {
       {"Australia/Lord_Howe", {2024, 4, 7, 1, 45, 0}, 1'712'414'700},
       {"America/Sao_Paulo", {2018, 11, 4, 0, 15, 0}, 1'541'301'300},
   };
-  for (const auto& c : kCases) {
-    const TimeZone zone(c.zone);
-    SCOPED_TRACE(testing::Message() << c.zone << ' ' << c.instant);
-    EXPECT_EQ(InstantFromLocal(c.local), c.instant);
+  for (const auto& [name, local, instant] : kCases) {
+    const TimeZone zone(name);
+    SCOPED_TRACE(testing::Message() << name << ' ' << instant);
+    EXPECT_EQ(InstantFromLocal(local), instant);
     for (const int daylight : {1, 0}) {  // mktime remembers which it was.
       std::tm other{};
       other.tm_year = 124;
       other.tm_isdst = daylight;
       std::mktime(&other);
-      EXPECT_EQ(InstantFromLocal(c.local), c.instant);
+      EXPECT_EQ(InstantFromLocal(local), instant);
     }
   }
 }

@@ -5,6 +5,8 @@
 #include <array>
 #include <limits>
 #include <string>
+#include <tuple>
+#include <utility>
 
 namespace {
 
@@ -37,18 +39,12 @@ TEST(CFString, IsNullForWhatItCannotRead) {
   EXPECT_EQ(CFStringCreateWithCharacters(nullptr, nullptr, 1), nullptr);
   const UniChar unit = 'a';
   EXPECT_EQ(CFStringCreateWithCharacters(nullptr, &unit, -1), nullptr);
-  EXPECT_EQ(CFStringCreateWithCharacters(nullptr, &unit, std::numeric_limits<CFIndex>::max()),
-            nullptr);
+  constexpr CFIndex kMost = std::numeric_limits<CFIndex>::max();
+  EXPECT_EQ(CFStringCreateWithCharacters(nullptr, &unit, kMost), nullptr);
 }
 
 TEST(CFString, GivesItsTextInEitherEncoding) {
-  const struct {
-    std::u16string text;
-    CFStringEncoding encoding;
-    CFIndex size;
-    Boolean success;
-    std::string bytes;
-  } kCases[] = {
+  const std::tuple<std::u16string, CFStringEncoding, CFIndex, Boolean, std::string> kCases[] = {
       {u"\u00E9t\u00E9", kCFStringEncodingUTF8, 6, 1, "\xC3\xA9t\xC3\xA9"},
       {u"\u00E9t\u00E9", kCFStringEncodingUTF8, 5, 0, "-"},  // No room for the terminator.
       {u"\u00E9t\u00E9", kCFStringEncodingMacRoman, 4, 1, "\x8Et\x8E"},
@@ -59,25 +55,22 @@ TEST(CFString, GivesItsTextInEitherEncoding) {
       {u"", kCFStringEncodingUTF8, 0, 0, "-"},
       {u"a", 0x0600, 8, 0, "-"},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.bytes);
-    CFStringRef text = Make(c.text);
+  for (const auto& [units, encoding, size, success, bytes] : kCases) {
+    SCOPED_TRACE(bytes);
+    CFStringRef text = Make(units);
     std::array<char, 16> buffer = {"-"};
-    EXPECT_EQ(CFStringGetCString(text, buffer.data(), c.size, c.encoding), c.success);
-    EXPECT_STREQ(buffer.data(), c.bytes.c_str());
-    EXPECT_EQ(CFStringGetLength(text), static_cast<CFIndex>(c.text.size()));
+    EXPECT_EQ(CFStringGetCString(text, buffer.data(), size, encoding), success);
+    EXPECT_EQ(buffer.data(), bytes);
+    EXPECT_EQ(CFStringGetLength(text), static_cast<CFIndex>(units.size()));
     CFRelease(text);
   }
 }
 
 TEST(CFString, CopiesARangeOfItsUnits) {
-  CFStringRef text = CFStringCreateWithCString(nullptr,
-                                               "\x80"
-                                               "bcd",
-                                               kCFStringEncodingMacRoman);
+  CFStringRef text = CFStringCreateWithCString(nullptr, "\x80xyz", kCFStringEncodingMacRoman);
   std::array<UniChar, 3> units = {'-', '-', '-'};
   CFStringGetCharacters(text, {0, 2}, units.data());
-  EXPECT_EQ(units, (std::array<UniChar, 3>{0x00C4, 'b', '-'}));
+  EXPECT_EQ(units, (std::array<UniChar, 3>{0x00C4, 'x', '-'}));
   for (const CFRange outside : {CFRange{3, 2}, CFRange{-1, 2}, CFRange{0, -1}, CFRange{5, 1}}) {
     CFStringGetCharacters(text, outside, units.data());
     EXPECT_EQ(units[0], 0x00C4);
@@ -96,17 +89,15 @@ TEST(CFString, KnowsTheMostBytes) {
 }
 
 TEST(CFURL, GivesItsPathWithoutATrailingSeparator) {
-  const struct {
-    const char* path;
-    const char* copied;
-  } kCases[] = {{"/a/b", "/a/b"}, {"/a/b/", "/a/b"}, {"/", "/"}, {"a/", "a"}, {"", ""}};
-  for (const auto& c : kCases) {
-    CFStringRef path = Make(c.path);
+  const std::pair<const char*, const char*> kCases[] = {
+      {"/a/b", "/a/b"}, {"/a/b/", "/a/b"}, {"/", "/"}, {"a/", "a"}, {"", ""}};
+  for (const auto& [text, expected] : kCases) {
+    CFStringRef path = Make(text);
     CFURLRef url = CFURLCreateWithFileSystemPath(nullptr, path, kCFURLPOSIXPathStyle, 0);
     CFStringRef copied = CFURLCopyFileSystemPath(url, kCFURLPOSIXPathStyle);
     std::array<char, 16> buffer = {};
     CFStringGetCString(copied, buffer.data(), buffer.size(), kCFStringEncodingUTF8);
-    EXPECT_STREQ(buffer.data(), c.copied);
+    EXPECT_STREQ(buffer.data(), expected);
     EXPECT_EQ(CFURLCopyFileSystemPath(url, 1), nullptr);
     EXPECT_EQ(CFURLCreateWithFileSystemPath(nullptr, path, 1, 0), nullptr);
     for (CFTypeRef object : {CFTypeRef{path}, CFTypeRef{url}, CFTypeRef{copied}}) CFRelease(object);

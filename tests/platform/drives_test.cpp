@@ -6,6 +6,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <array>
 #include <filesystem>
 #include <string>
 
@@ -94,45 +95,48 @@ class Machine {
 
 TEST(Drives, TellTheDisksOfAMachineApart) {
   Machine machine;
-  machine.AddDevice("pci0/ata1/block/sda", "8:0");
-  machine.AddDevice("pci0/ata1/block/sda/sda2", "8:2");
-  machine.AddDevice("pci0/usb2/2-1/2-1:1.0/host6/block/sdb", "8:16");
-  machine.AddDevice("pci0/usb2/2-1/2-1:1.0/host6/block/sdb/sdb1", "8:17");
-  machine.AddDevice("pci0/usb2/2-2/block/sdd", "8:48");  // A stick with a write-protect switch.
-  machine.SetAttribute("pci0/usb2/2-2/block/sdd", "ro", "1");
-  machine.AddDevice("pci0/ata2/block/sdc", "8:32");  // A bay that says it can be emptied.
-  machine.SetAttribute("pci0/ata2/block/sdc", "removable", "1");
-  machine.AddDevice("pci0/ata2/block/sdc/sdc1", "8:33");
-  machine.AddDevice("pci0/fw0/block/sde", "8:64");
-  machine.AddDevice("pci0/mmc_host/mmc0/mmc0:1/block/mmcblk0", "179:0");
-  machine.SetAttribute("pci0/mmc_host/mmc0/mmc0:1/block/mmcblk0", "device/type", "SD");
-  machine.AddDevice("pci0/mmc_host/mmc0/mmc0:1/block/mmcblk0/mmcblk0p1", "179:1");
-  machine.AddDevice("pci0/mmc_host/mmc1/mmc1:1/block/mmcblk1", "179:32");
-  machine.SetAttribute("pci0/mmc_host/mmc1/mmc1:1/block/mmcblk1", "device/type", "MMC");
-  machine.AddDevice("pci0/mmc_host/mmc1/mmc1:1/block/mmcblk1/mmcblk1p1", "179:33");
-  machine.AddDevice("pci0/ata3/block/sr0", "11:0");
-  machine.SetAttribute("pci0/ata3/block/sr0", "removable", "1");
-  machine.SetAttribute("pci0/ata3/block/sr0", "device/type", "5");
-  machine.AddDevice("pci0/nvme/nvme0/nvme0n1/nvme0n1p1", "259:1");
-  machine.AddDevice("pci0/virtio1/block/vda", "254:0");
-  machine.AddDevice("pci0/virtio2/host2/block/sr1", "11:1");
-  machine.SetAttribute("pci0/virtio2/host2/block/sr1", "device/type", "5");
-  machine.AddDevice("virtual/block/loop0", "7:0");
-  machine.AddDevice("virtual/block/dm-0", "253:0");
-  machine.SetAttribute("virtual/block/dm-0", "dm/name", "vault");
-  machine.AddSlave("virtual/block/dm-0", "pci0/usb2/2-1/2-1:1.0/host6/block/sdb/sdb1");
-  machine.AddDevice("virtual/block/dm-1", "253:1");
+  const std::string kUsb = "pci0/usb2/2-1/2-1:1.0/host6/block/sdb";
+  const std::string kCard = "pci0/mmc_host/mmc0/mmc0:1/block/mmcblk0";
+  const std::string kSoldered = "pci0/mmc_host/mmc1/mmc1:1/block/mmcblk1";
+  const std::string kVirtualDvd = "pci0/virtio2/host2/block/sr1";
+  const std::pair<std::string, std::string> kDevices[] = {
+      {"8:0", "pci0/ata1/block/sda"},
+      {"8:2", "pci0/ata1/block/sda/sda2"},
+      {"8:16", kUsb},
+      {"8:17", kUsb + "/sdb1"},
+      {"8:32", "pci0/ata2/block/sdc"},
+      {"8:33", "pci0/ata2/block/sdc/sdc1"},
+      {"8:48", "pci0/usb2/2-2/block/sdd"},
+      {"8:64", "pci0/fw0/block/sde"},
+      {"179:0", kCard},
+      {"179:1", kCard + "/mmcblk0p1"},
+      {"179:32", kSoldered},
+      {"179:33", kSoldered + "/mmcblk1p1"},
+      {"11:0", "pci0/ata3/block/sr0"},
+      {"11:1", kVirtualDvd},
+      {"254:0", "pci0/virtio1/block/vda"},
+      {"259:1", "pci0/nvme/nvme0/nvme0n1/nvme0n1p1"},
+      {"7:0", "virtual/block/loop0"},
+      {"253:0", "virtual/block/dm-0"},
+      {"253:1", "virtual/block/dm-1"},
+  };
+  for (const auto& [number, path] : kDevices) machine.AddDevice(path, number);
+  const std::array<std::string, 3> kAttributes[] = {
+      {"pci0/usb2/2-2/block/sdd", "ro", "1"},     // A stick with a write-protect switch.
+      {"pci0/ata2/block/sdc", "removable", "1"},  // A bay that says it can be emptied.
+      {kCard, "device/type", "SD"},
+      {kSoldered, "device/type", "MMC"},
+      {"pci0/ata3/block/sr0", "removable", "1"},
+      {"pci0/ata3/block/sr0", "device/type", "5"},
+      {kVirtualDvd, "device/type", "5"},
+      {"virtual/block/dm-0", "dm/name", "vault"},
+  };
+  for (const auto& [path, name, value] : kAttributes) machine.SetAttribute(path, name, value);
+  machine.AddSlave("virtual/block/dm-0", kUsb + "/sdb1");
   machine.AddSlave("virtual/block/dm-1", "pci0/ata1/block/sda/sda2");
   machine.AddSlave("virtual/block/dm-1", "virtual/block/dm-1");  // A loop ends.
 
-  const struct {
-    const char* name;
-    const char* number;
-    const char* type;
-    const char* source;
-    const char* options;
-    const char* kind;
-  } kCases[] = {
+  const std::array<const char*, 6> kCases[] = {
       {"disk", "8:2", "ext4", "/dev/sda2", "rw", "fixed"},
       {"flash disk", "259:1", "ext4", "/dev/nvme0n1p1", "rw", "fixed"},
       {"virtual disk", "254:0", "ext4", "/dev/vda", "rw", "fixed"},
@@ -161,12 +165,12 @@ TEST(Drives, TellTheDisksOfAMachineApart) {
       {"sshfs", "0:57", "fuse.sshfs", "me@nas:", "rw", "remote"},
       {"share that looks like a stick", "0:58", "9p", "/dev/sdb1", "rw", "remote"},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.name);
-    const std::string folder = machine.Mount(c.name, c.number, c.type, c.source, c.options);
-    EXPECT_EQ(machine.KindOf(folder), c.kind);
+  for (const auto& [name, number, type, source, options, kind] : kCases) {
+    SCOPED_TRACE(name);
+    const std::string folder = machine.Mount(name, number, type, source, options);
+    EXPECT_EQ(machine.KindOf(folder), kind);
     std::ofstream(folder + "/photo.jpg");
-    EXPECT_EQ(machine.KindOf(folder + "/photo.jpg"), c.kind);
+    EXPECT_EQ(machine.KindOf(folder + "/photo.jpg"), kind);
   }
 }
 

@@ -1,153 +1,93 @@
 // SPDX-License-Identifier: MIT
 #include "platform/removal.h"
 
-#include <fcntl.h>
-#include <gtest/gtest.h>
-#include <stdio.h>
-
 #include <atomic>
-#include <filesystem>
-#include <string>
 #include <thread>
 
 #include "platform/item_relations.h"
-#include "platform/items.h"
-#include "support/faults.h"
+#include "support/files.h"
 #include "support/refused_calls.h"
-#include "support/temp_folder.h"
-#include "support/trees.h"
 
+namespace orb::platform {
 namespace {
 
-namespace fs = std::filesystem;
-using orb::platform::Error;
-using orb::platform::IsItemOrAbove;
-using orb::platform::Items;
-using orb::platform::kBusy;
-using orb::platform::kNoSuchItem;
-using orb::platform::kNotPermitted;
-using orb::platform::RemoveItem;
-using orb::platform::ResolvedPath;
-using orb::platform::UnlinkItem;
-using orb::test::ReadAll;
-using orb::test::RunInChild;
-using orb::test::RunWithPrivateMounts;
-using orb::test::TempFolder;
-
-Error ErrorOf(const orb::platform::Status& status) {
-  return status ? Error{orb::platform::ErrorDomain::kMach, 0} : status.Reason();
-}
+using namespace test;
 
 TEST(RemoveItem, RemovesTheEntryAndNothingBehindIt) {
-  const TempFolder folder;
-  folder.Write("kept", "x");
-  folder.Write("file", "x");
-  fs::create_directories(folder / "tree/sub/sub");
-  fs::create_symlink("../kept", folder / "tree/sub/link");
-  fs::create_symlink("kept", folder / "link");
-  fs::create_symlink("nowhere", folder / "dangling");
-  for (const char* name : {"file", "link", "dangling", "tree/"}) {
-    SCOPED_TRACE(name);
-    EXPECT_TRUE(RemoveItem(folder / name));
-  }
-  EXPECT_EQ(ReadAll(folder / "kept"), "x");
-  EXPECT_EQ(std::distance(fs::directory_iterator(folder.Path()), {}), 1);
+  const Tree tree("kept, file, tree/sub/sub/, tree/sub/link -> ../kept, link -> kept");
+  tree.Make("dangling -> nowhere");
+  for (const char* name : {"file", "link", "dangling", "tree/"})
+    EXPECT_TRUE(RemoveItem(tree / name)) << name;
+  EXPECT_EQ(tree.Read("kept"), "kept");
+  EXPECT_EQ(NamesIn(tree.Path()), std::set<std::string>{"kept"});
 }
 
 TEST(RemoveItem, RefusesLockedItemsAndPathsThatNameNoEntry) {
-  const TempFolder folder;
-  fs::create_directories(folder / "tree/sub");
-  folder.Write("tree/sub/file", "x");
-  fs::create_symlink("tree", folder / "link");
-  EXPECT_EQ(ErrorOf(RemoveItem(folder / "missing")), kNoSuchItem);
-  EXPECT_EQ(ErrorOf(RemoveItem("")), kNoSuchItem);
-  EXPECT_EQ(ErrorOf(RemoveItem(folder / "link/")), kNoSuchItem);
-  for (const std::string& path :
-       {folder / "tree/.", folder / "tree/..", folder / "tree/../", std::string("/")})
-    EXPECT_EQ(ErrorOf(RemoveItem(path)), kNotPermitted) << path;
+  const Tree tree("tree/sub/file, link -> tree");
+  const Unchanged unchanged(tree.Path());
+  for (const char* path : {"missing", "", "link/"})
+    EXPECT_EQ(ErrorOf(RemoveItem(tree.At(path))), kNoSuchItem) << path;
+  for (const char* path : {"tree/.", "tree/..", "tree/../", "/"})
+    EXPECT_EQ(ErrorOf(RemoveItem(tree.At(path))), kNotPermitted) << path;
   for (const char* locked : {"tree", "tree/sub", "tree/sub/file"}) {
-    SCOPED_TRACE(locked);
-    ASSERT_TRUE(Items::Current().SetLocked(folder / locked, true));
-    EXPECT_EQ(ErrorOf(RemoveItem(folder / "tree")), kNotPermitted);
-    EXPECT_EQ(ReadAll(folder / "tree/sub/file"), "x");
-    ASSERT_TRUE(Items::Current().SetLocked(folder / locked, false));
+    ASSERT_TRUE(SetLock(tree / locked, true));
+    EXPECT_EQ(ErrorOf(RemoveItem(tree / "tree")), kNotPermitted) << locked;
+    if (!fs::is_directory(tree / locked)) {
+      EXPECT_EQ(ErrorOf(UnlinkItem(tree / locked)), kNotPermitted);
+    }
+    ASSERT_TRUE(SetLock(tree / locked, false));
   }
-  ASSERT_TRUE(Items::Current().SetLocked(folder / "tree/sub/file", true));
-  EXPECT_EQ(ErrorOf(UnlinkItem(folder / "tree/sub/file")), kNotPermitted);
 }
 
 // As kernels before 6.13 and sandboxes answer that do not know the call.
 TEST(RemoveItem, FindsLocksWhereTheKernelCannotLookThemUpInAFolder) {
   constexpr long kGetAttributeAt = 464;
   for (const int error : {ENOSYS, EPERM}) {
-    const TempFolder folder;
-    fs::create_directories(folder / "tree");
-    folder.Write("tree/file", "x");
-    ORB_IN_CHILD(RunInChild(
-        [&] {
-          return orb::test::RefuseCalls({{kGetAttributeAt, error}});
-        },
-        [&] {
-          ASSERT_TRUE(Items::Current().SetLocked(folder / "tree/file", true));
-          EXPECT_EQ(ErrorOf(RemoveItem(folder / "tree")), kNotPermitted);
-          ASSERT_TRUE(Items::Current().SetLocked(folder / "tree/file", false));
-          EXPECT_TRUE(RemoveItem(folder / "tree"));
-        }));
-    EXPECT_FALSE(fs::exists(folder / "tree"));
+    const Tree tree("tree/file!");
+    const auto body = [&] {
+      EXPECT_EQ(ErrorOf(RemoveItem(tree / "tree")), kNotPermitted);
+      ASSERT_TRUE(SetLock(tree / "tree/file", false));
+      EXPECT_TRUE(RemoveItem(tree / "tree"));
+    };
+    ORB_IN_CHILD(RunInChild([&] { return RefuseCalls({{kGetAttributeAt, error}}); }, body));
+    EXPECT_FALSE(tree.Has("tree"));
   }
 }
 
 TEST(RemoveItem, DoesNotEnterAVolumeMountedInside) {
-  const TempFolder folder;
-  fs::create_directories(folder / "tree/mounted");
-  fs::create_directories(folder / "other");
-  folder.Write("other/photo", "x");
+  const Tree tree("tree/mounted/, other/photo");
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
-    ASSERT_TRUE(orb::test::BindMount(folder / "other", folder / "tree/mounted"));
-    EXPECT_EQ(ErrorOf(RemoveItem(folder / "tree")), kBusy);
-    EXPECT_EQ(ErrorOf(RemoveItem(folder / "tree/mounted")), kBusy);
-    EXPECT_EQ(ReadAll(folder / "tree/mounted/photo"), "x");
+    ASSERT_TRUE(BindMount(tree / "other", tree / "tree/mounted"));
+    EXPECT_EQ(ErrorOf(RemoveItem(tree / "tree")), kBusy);
+    EXPECT_EQ(ErrorOf(RemoveItem(tree / "tree/mounted")), kBusy);
+    EXPECT_TRUE(tree.Has("tree/mounted/photo"));
   }));
 }
 
 // Somebody exchanges a folder in the tree for a link to a folder outside, again and again.
 TEST(RemoveItem, LeavesTheTreeThroughNoSwappedLink) {
-  const TempFolder folder;
-  fs::create_directories(folder / "outside");
-  folder.Write("outside/photo", "x");
-  fs::create_directory_symlink(folder / "outside", folder / "trap");
+  const Tree tree("outside/photo=x, trap -> outside");
+  const std::string trap = tree / "trap";
+  const std::string sub = tree / "tree/sub";
   std::atomic<bool> done = false;
   std::thread swapper([&] {
-    while (!done)
-      ::renameat2(AT_FDCWD,
-                  (folder / "trap").c_str(),
-                  AT_FDCWD,
-                  (folder / "tree/sub").c_str(),
-                  RENAME_EXCHANGE);
+    while (!done) ::renameat2(AT_FDCWD, trap.c_str(), AT_FDCWD, sub.c_str(), RENAME_EXCHANGE);
   });
-  for (int round = 0; round < 30; ++round) {
+  for (int round = 0; round < 30 && tree.Read("outside/photo") == "x"; ++round) {
     std::error_code ignored;
-    fs::create_directories(folder / "tree/sub", ignored);
-    for (int i = 0; i < 10; ++i) folder.Write("tree/sub/" + std::to_string(i), "");
-    (void)RemoveItem(folder / "tree");
-    if (ReadAll(folder / "outside/photo") != "x") break;
-    for (int i = 0; i < 10; ++i) fs::remove(folder / ("outside/" + std::to_string(i)), ignored);
+    fs::create_directories(sub, ignored);
+    for (int i = 0; i < 10; ++i) tree.Write("tree/sub/" + std::to_string(i), "");
+    (void)RemoveItem(tree / "tree");
+    for (int i = 0; i < 10; ++i) fs::remove(tree / ("outside/" + std::to_string(i)), ignored);
   }
   done = true;
   swapper.join();
-  EXPECT_EQ(ReadAll(folder / "outside/photo"), "x");
+  EXPECT_EQ(tree.Read("outside/photo"), "x");
 }
 
 TEST(IsItemOrAbove, KnowsItemsUnderEveryPathButNotTheirHardLinks) {
-  const TempFolder folder;
-  fs::create_directories(folder / "photos/raw");
-  folder.Write("photos/raw/a", "x");
-  fs::create_hard_link(folder / "photos/raw/a", folder / "photos/raw/b");
-  fs::create_directory_symlink("photos", folder / "link");
-  const struct {
-    const char* candidate;
-    bool expected;
-  } kCases[] = {
+  const Tree tree("photos/raw/a, photos/raw/b => photos/raw/a, link -> photos");
+  const std::pair<const char*, bool> kCases[] = {
       {"photos/raw/a", true},
       {"link/raw/a", true},
       {"link/../photos/raw/../raw/a", true},
@@ -157,29 +97,25 @@ TEST(IsItemOrAbove, KnowsItemsUnderEveryPathButNotTheirHardLinks) {
       {"link/..", true},
       {"link", false},  // The link itself holds nothing.
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.candidate);
-    const auto answer = IsItemOrAbove(folder / c.candidate, folder / "photos/raw/a");
-    ASSERT_TRUE(answer);
-    EXPECT_EQ(answer.Value(), c.expected);
-  }
-  EXPECT_FALSE(IsItemOrAbove(folder / "missing", folder / "photos"));
-  EXPECT_EQ(ResolvedPath(folder / "link/raw/../../link").Value(),
-            fs::canonical(folder.Path()).string() + "/link");
+  for (const auto& [path, expected] : kCases)
+    EXPECT_EQ(IsItemOrAbove(tree / path, tree / "photos/raw/a").Value(), expected) << path;
+  EXPECT_FALSE(IsItemOrAbove(tree / "missing", tree / "photos"));
+  EXPECT_EQ(ResolvedPath(tree / "link/raw/../../link").Value(),
+            fs::canonical(tree.Path()).string() + "/link");
   EXPECT_EQ(ResolvedPath("/").Value(), "/");
   EXPECT_EQ(ResolvedPath("/tmp").Value(), "/tmp");
 }
 
 TEST(RemoveItem, GoesOnWhenSomebodyElseRemovesSomeOfIt) {
-  const TempFolder folder;
-  fs::create_directory(folder / "tree");
-  for (int i = 0; i < 3'000; ++i) folder.Write("tree/" + std::to_string(i), "");
+  const Tree tree("tree/");
+  for (int i = 0; i < 3'000; ++i) tree.Write("tree/" + std::to_string(i), "");
   std::thread other([&] {
     std::error_code ignored;
-    for (int i = 3'000; --i >= 0;) fs::remove(folder / ("tree/" + std::to_string(i)), ignored);
+    for (int i = 3'000; --i >= 0;) fs::remove(tree / ("tree/" + std::to_string(i)), ignored);
   });
-  EXPECT_TRUE(RemoveItem(folder / "tree"));
+  EXPECT_TRUE(RemoveItem(tree / "tree"));
   other.join();
 }
 
 }  // namespace
+}  // namespace orb::platform

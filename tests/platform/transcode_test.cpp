@@ -9,6 +9,8 @@
 #include <random>
 #include <string>
 #include <string_view>
+#include <tuple>
+#include <utility>
 #include <vector>
 
 #include "platform/transcode_sse.h"
@@ -40,10 +42,7 @@ std::string Bytes(std::size_t (*write)(std::u16string_view, char*), std::u16stri
 }
 
 TEST(Utf8, IsReadStrictly) {
-  const struct {
-    std::string_view bytes;
-    std::optional<std::u16string_view> units;
-  } kCases[] = {
+  const std::pair<std::string, std::optional<std::u16string>> kCases[] = {
       {"", u""},
       {"a\x7F", u"a\x7F"},
       {"\xC2\x80\xDF\xBF", u"\u0080\u07FF"},
@@ -64,18 +63,14 @@ TEST(Utf8, IsReadStrictly) {
       {"\xF0\x9F\x98", std::nullopt},
       {"\xC2\x41", std::nullopt},
   };
-  for (const auto& c : kCases) {
+  for (const auto& [bytes, units] : kCases) {
     // Before, across and behind the edges of a block.
     for (std::size_t before = 0; before < 40; ++before) {
       for (const std::size_t behind : {0U, 1U, 40U}) {
-        const std::string text =
-            std::string(before, 'x') + std::string(c.bytes) + std::string(behind, 'y');
+        const std::string text = std::string(before, 'x') + bytes + std::string(behind, 'y');
         SCOPED_TRACE(testing::PrintToString(text));
         std::optional<std::u16string> expected;
-        if (c.units) {
-          expected =
-              std::u16string(before, u'x') + std::u16string(*c.units) + std::u16string(behind, 'y');
-        }
+        if (units) expected = std::u16string(before, u'x') + *units + std::u16string(behind, 'y');
         EXPECT_EQ(Units(Utf16FromUtf8, text), expected);
         EXPECT_EQ(Units(portable::Utf16FromUtf8, text), expected);
         EXPECT_EQ(Utf16LengthOfUtf8(text).has_value(), expected.has_value());
@@ -183,11 +178,7 @@ TEST(MacRoman, GivesAllItsBytesBack) {
 }
 
 TEST(MacRoman, ComposesAndMarksWhatItCannotExpress) {
-  const struct {
-    std::u16string_view text;
-    std::string_view bytes;
-    bool isExact;
-  } kCases[] = {
+  const std::tuple<std::u16string_view, std::string_view, bool> kCases[] = {
       {u"2026-11-22", "2026-11-22", true},
       {u"e\u0301A\u0308", "\x8E\x80", true},
       {u"\u212B\u2126", "\x81\xBD", true},  // Angstrom and Ohm, as the letters that they are.
@@ -196,10 +187,10 @@ TEST(MacRoman, ComposesAndMarksWhatItCannotExpress) {
       {u"\xD800!", "?!", false},
       {u"x\u0304", "x?", false},
   };
-  for (const auto& c : kCases) {
-    const MacRomanText made = MacRomanFromUtf16(c.text);
-    EXPECT_EQ(made.bytes, c.bytes);
-    EXPECT_EQ(made.isExact, c.isExact);
+  for (const auto& [text, bytes, isExact] : kCases) {
+    const MacRomanText made = MacRomanFromUtf16(text);
+    EXPECT_EQ(made.bytes, bytes);
+    EXPECT_EQ(made.isExact, isExact);
   }
 }
 

@@ -1,29 +1,19 @@
 // SPDX-License-Identifier: MIT
 #include "platform/trash.h"
 
-#include <gtest/gtest.h>
-#include <sys/stat.h>
-#include <unistd.h>
-
 #include <atomic>
-#include <filesystem>
 #include <regex>
 #include <sstream>
-#include <string>
 #include <thread>
 
-#include "platform/items.h"
 #include "platform/trash_text.h"
-#include "platform/volumes.h"
 #include "support/environment.h"
-#include "support/faults.h"
-#include "support/temp_folder.h"
-#include "support/trees.h"
+#include "support/files.h"
 
 namespace orb::platform {
 namespace {
 
-namespace fs = std::filesystem;
+using namespace test;
 
 TEST(TrashText, EncodesByBytes) {
   EXPECT_EQ(PercentEncoded("/a b/100%/\xc3\xbc\n\x01~-_.txt"), "/a%20b/100%25/%C3%BC%0A%01~-_.txt");
@@ -33,11 +23,7 @@ TEST(TrashText, EncodesByBytes) {
 
 TEST(TrashText, NumbersNamesAndKeepsThemShort) {
   const std::string long245(245, 'x');
-  const struct {
-    std::string name;
-    unsigned number;
-    std::string result;
-  } kCases[] = {
+  const std::tuple<std::string, unsigned, std::string> kCases[] = {
       {"photo.jpg", 1, "photo.jpg"},
       {"photo.jpg", 12, "photo.12.jpg"},
       {"photo", 2, "photo.2"},
@@ -49,10 +35,8 @@ TEST(TrashText, NumbersNamesAndKeepsThemShort) {
       {std::string(243, 'x') + "\xe2\x82\xac", 1, std::string(243, 'x')},
       {"a." + std::string(250, 'y'), 1, "a." + std::string(243, 'y')},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.name);
-    EXPECT_EQ(NumberedName(c.name, c.number), c.result);
-  }
+  for (const auto& [name, number, result] : kCases)
+    EXPECT_EQ(NumberedName(name, number), result) << name;
 }
 
 TEST(TrashText, ListsFolderSizesOnce) {
@@ -67,21 +51,17 @@ bool RunShell(const std::string& command) { return std::system(command.c_str()) 
 /// A home of its own, and a folder with items beside it.
 class TrashTest : public testing::Test {
  protected:
-  TrashTest() {
-    fs::create_directories(Items());
-    fs::permissions(folder_.Path(), fs::perms(0777));
-  }
-
-  std::string Items() const { return folder_ / "items"; }
-  std::string Home() const { return folder_ / "data/Trash"; }
-  std::string Make(const std::string& path, const std::string& content = "photo") const {
-    fs::create_directories(fs::path(folder_ / path).parent_path());
-    return folder_.Write(path, content);
+  std::string Items() const { return tree_ / "items"; }
+  std::string Home() const { return tree_ / "data/Trash"; }
+  /// Makes a file and puts it into the trash.
+  Status PutNew(const std::string& name, const std::string& content = "photo") const {
+    tree_.Make(name + "=" + content);
+    return Put(tree_ / name);
   }
   static Status Put(const std::string& path) { return Trash().Put(path); }
   /// What the record of an item says it was.
   static std::string PathIn(const std::string& trash, const std::string& name) {
-    const std::string info = test::ReadAll(trash + "/info/" + name + ".trashinfo");
+    const std::string info = ReadAll(trash + "/info/" + name + ".trashinfo");
     static const std::regex kInfo(
         R"(\[Trash Info\]\nPath=(.*)\nDeletionDate=\d{4}-\d\d-\d\dT\d\d:\d\d:\d\d\n)");
     std::smatch match;
@@ -92,141 +72,121 @@ class TrashTest : public testing::Test {
            (!fs::exists(trash + "/info") || fs::is_empty(trash + "/info"));
   }
 
-  const test::TempFolder folder_;
-  const test::ScopedVariable data_{"XDG_DATA_HOME", folder_ / "data"};
-  const test::ScopedVariable home_{"HOME", folder_ / "home"};
+  const Tree tree_{"items/"};
+  const ScopedVariable data_{"XDG_DATA_HOME", tree_ / "data"};
+  const ScopedVariable home_{"HOME", tree_ / "home"};
 };
 
 TEST_F(TrashTest, KeepsContentAndPathWhateverTheName) {
-  const struct {
-    const char* name;
-    const char* recorded;
-  } kCases[] = {
+  const std::pair<std::string, std::string> kCases[] = {
       {"photo.jpg", "photo.jpg"},
       {"100% pure.jpg", "100%25%20pure.jpg"},
       {"K\xc3\xb6ln.jpg", "K%C3%B6ln.jpg"},
       {"two\nlines", "two%0Alines"},
       {"-rf #?&;", "-rf%20%23%3F%26%3B"},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.name);
-    const std::string path = Make(std::string("items/") + c.name, c.name);
-    ASSERT_TRUE(Put(path).Ok());
-    EXPECT_FALSE(fs::exists(path));
-    EXPECT_EQ(test::ReadAll(Home() + "/files/" + c.name), c.name);
-    EXPECT_EQ(PathIn(Home(), c.name), Items() + "/" + c.recorded);
+  for (const auto& [name, recorded] : kCases) {
+    SCOPED_TRACE(name);
+    ASSERT_TRUE(PutNew("items/" + name, name));
+    EXPECT_FALSE(tree_.Has("items/" + name));
+    EXPECT_EQ(ReadAll(Home() + "/files/" + name), name);
+    EXPECT_EQ(PathIn(Home(), name), Items() + "/" + recorded);
   }
-  for (const char* part : {"", "/files", "/info"}) {
-    EXPECT_EQ(fs::status(Home() + part).permissions(), fs::perms(0700)) << part;
-  }
-  EXPECT_EQ(fs::status(Home() + "/info/photo.jpg.trashinfo").permissions(), fs::perms(0600));
+  for (const char* part : {"", "/files", "/info"}) EXPECT_EQ(ModeOf(Home() + part), 0700u) << part;
+  EXPECT_EQ(ModeOf(Home() + "/info/photo.jpg.trashinfo"), 0600u);
 }
 
 TEST_F(TrashTest, CountsUpAndNeverReplaces) {
-  Trash trash;
   const std::string longName(255, 'x');
   for (const char* content : {"first", "second"}) {
-    EXPECT_TRUE(trash.Put(Make("items/a.jpg", content)).Ok());
-    EXPECT_TRUE(trash.Put(Make("items/" + longName, content)).Ok());
+    EXPECT_TRUE(PutNew("items/a.jpg", content));
+    EXPECT_TRUE(PutNew("items/" + longName, content));
   }
-  Make("data/Trash/files/a.3.jpg", "without record");
-  EXPECT_TRUE(Put(Make("items/a.jpg", "fourth")).Ok());
-  const auto contentOf = [&](const std::string& name) {
-    return test::ReadAll(Home() + "/files/" + name);
+  tree_.Make("data/Trash/files/a.3.jpg=without record");
+  EXPECT_TRUE(PutNew("items/a.jpg", "fourth"));
+  const std::pair<std::string, std::string> kExpected[] = {
+      {"a.jpg", "first"},
+      {"a.2.jpg", "second"},
+      {"a.3.jpg", "without record"},
+      {"a.4.jpg", "fourth"},
+      {longName.substr(0, 243) + ".2", "second"},
   };
-  EXPECT_EQ(contentOf("a.jpg"), "first");
-  EXPECT_EQ(contentOf("a.2.jpg"), "second");
-  EXPECT_EQ(contentOf("a.3.jpg"), "without record");
-  EXPECT_EQ(contentOf("a.4.jpg"), "fourth");
-  EXPECT_EQ(contentOf(std::string(243, 'x') + ".2"), "second");
+  for (const auto& [name, content] : kExpected)
+    EXPECT_EQ(ReadAll(Home() + "/files/" + name), content);
   EXPECT_FALSE(fs::exists(Home() + "/info/a.3.jpg.trashinfo"));
 }
 
 TEST_F(TrashTest, TakesALinkItselfAndFollowsThoseAbove) {
-  const std::string file = Make("items/real/a.jpg");
-  fs::create_symlink(Items() + "/real", Items() + "/linked");
-  fs::create_symlink(file, Items() + "/real/link.jpg");
-  EXPECT_TRUE(Put(Items() + "/linked/link.jpg").Ok());
+  tree_.Make("items/real/a.jpg, items/linked -> real, items/real/link.jpg -> a.jpg");
+  EXPECT_TRUE(Put(Items() + "/linked/link.jpg"));
   EXPECT_TRUE(fs::is_symlink(Home() + "/files/link.jpg"));
   EXPECT_EQ(PathIn(Home(), "link.jpg"), Items() + "/real/link.jpg");
-  EXPECT_TRUE(Put(Items() + "/linked/").Ok()) << "also with the separator of a folder";
+  EXPECT_TRUE(Put(Items() + "/linked/")) << "also with the separator of a folder";
   EXPECT_TRUE(fs::is_symlink(Home() + "/files/linked"));
-  EXPECT_TRUE(fs::exists(file));
+  EXPECT_TRUE(tree_.Has("items/real/a.jpg"));
 }
 
 TEST_F(TrashTest, ListsTheSizesOfFolders) {
-  Make("items/trip/a.jpg", std::string(10'000, 'a'));
-  Make("items/trip/deep/b.jpg", std::string(10'000, 'b'));
-  Make("data/Trash/directorysizes", "5 6 gone\n");
-  ASSERT_TRUE(Put(Items() + "/trip").Ok());
-  struct stat info, parts[4];
+  tree_.Make("data/Trash/directorysizes=5 6 gone\n, items/trip/deep/");
+  tree_.Write("items/trip/a.jpg", std::string(10'000, 'a'));
+  tree_.Write("items/trip/deep/b.jpg", std::string(10'000, 'b'));
+  ASSERT_TRUE(Put(Items() + "/trip"));
+  struct stat info, part;
   ::stat((Home() + "/info/trip.trashinfo").c_str(), &info);
   std::int64_t blocks = 0;
-  for (const char* part : {"", "/a.jpg", "/deep", "/deep/b.jpg"}) {
-    ASSERT_EQ(::stat((Home() + "/files/trip" + part).c_str(), parts), 0);
-    blocks += parts[0].st_blocks;
+  for (const char* name : {"", "/a.jpg", "/deep", "/deep/b.jpg"}) {
+    ASSERT_EQ(::stat((Home() + "/files/trip" + name).c_str(), &part), 0);
+    blocks += part.st_blocks;
   }
-  EXPECT_EQ(test::ReadAll(Home() + "/directorysizes"),
+  EXPECT_EQ(ReadAll(Home() + "/directorysizes"),
             std::to_string(blocks * 512) + " " + std::to_string(info.st_mtime) + " trip\n");
 }
 
 TEST_F(TrashTest, RefusesAndLeavesEverythingAsItWas) {
-  Make("data/Trash/files/old.jpg");
-  Make("data/Trash/info/old.jpg.trashinfo");
-  const std::string locked = Make("items/locked.jpg");
-  Make("items/vault/a.jpg");
-  ASSERT_TRUE(Items::Current().SetLocked(locked, true).Ok());
-  ASSERT_TRUE(Items::Current().SetLocked(folder_ / "items/vault", true).Ok());
-  const auto before = test::Describe(folder_.Path());
+  tree_.Make("data/Trash/files/old.jpg, data/Trash/info/old.jpg.trashinfo");
+  tree_.Make("items/locked.jpg!, items/vault/a.jpg, items/vault/!");
+  const Unchanged unchanged(tree_.Path());
   std::istringstream paths(
-      "/ // . .. @/items/. @/items/.. @/items/gone @/items/gone/a @/items/locked.jpg "
-      "@/items/locked.jpg/a @/items/vault/a.jpg @/data/Trash @/data/Trash/files @/data/Trash/info "
-      "@/data/Trash/files/old.jpg @/data");
+      "/ // . .. @/items/. @/items/.. @/items/gone/a @/items/locked.jpg/a @/items/vault/a.jpg "
+      "@/data/Trash @/data/Trash/files @/data/Trash/info @/data/Trash/files/old.jpg @/data");
   for (std::string path; std::getline(paths, path, ' ');) {
-    if (path.front() == '@') path.replace(0, 1, folder_.Path());
-    SCOPED_TRACE(path);
-    EXPECT_FALSE(Put(path).Ok());
-    EXPECT_EQ(test::Describe(folder_.Path()), before);
+    if (path.front() == '@') path.replace(0, 1, tree_.Path());
+    EXPECT_FALSE(Put(path)) << path;
   }
-  EXPECT_EQ(Put("").Reason(), kNoSuchItem);
-  EXPECT_EQ(Put(locked).Reason(), kNotPermitted);
-  EXPECT_EQ(Put(Items() + "/gone").Reason(), kNoSuchItem);
+  EXPECT_EQ(ErrorOf(Put("")), kNoSuchItem);
+  EXPECT_EQ(ErrorOf(Put(Items() + "/locked.jpg")), kNotPermitted);
+  EXPECT_EQ(ErrorOf(Put(Items() + "/gone")), kNoSuchItem);
 }
 
 TEST_F(TrashTest, FindsTheHome) {
-  const std::string inHome = folder_ / "home/.local/share/Trash";
   for (const auto& data : {std::optional<std::string>(), std::optional<std::string>("relative")}) {
-    const test::ScopedVariable scoped("XDG_DATA_HOME", data);
-    EXPECT_TRUE(Put(Make("items/a.jpg")).Ok());
-    EXPECT_TRUE(fs::exists(inHome + "/files/a.jpg"));
-    fs::remove_all(inHome);
+    const ScopedVariable scoped("XDG_DATA_HOME", data);
+    EXPECT_TRUE(PutNew("items/a.jpg"));
+    EXPECT_TRUE(tree_.Has("home/.local/share/Trash/files/a.jpg"));
+    fs::remove_all(tree_ / "home");
   }
-  fs::create_directories(folder_ / "disk/Trash");
-  fs::create_directory_symlink(folder_ / "disk", folder_ / "data");
-  EXPECT_TRUE(Put(Make("items/a.jpg")).Ok()) << "a home behind a link";
-  EXPECT_TRUE(fs::exists(folder_ / "disk/Trash/files/a.jpg"));
+  tree_.Make("disk/Trash/, data -> disk, items/nobody/a.jpg, items/nobody/ 0777");
+  EXPECT_TRUE(PutNew("items/a.jpg")) << "a home behind a link";
+  EXPECT_TRUE(tree_.Has("disk/Trash/files/a.jpg"));
   // Nobody's home does not exist.
-  const test::ScopedVariable noHome("HOME", std::nullopt);
-  const test::ScopedVariable noData("XDG_DATA_HOME", std::nullopt);
-  const std::string path = Make("items/nobody/a.jpg");
-  fs::permissions(Items() + "/nobody", fs::perms(0777));
-  ORB_IN_CHILD(test::RunAsUser(65534, [&] {
-    EXPECT_FALSE(Put(path).Ok());
-    EXPECT_TRUE(fs::exists(path));
+  const ScopedVariable noHome("HOME", std::nullopt);
+  const ScopedVariable noData("XDG_DATA_HOME", std::nullopt);
+  ORB_IN_CHILD(RunAsUser(kStranger, [&] {
+    const Unchanged unchanged(Items());
+    EXPECT_FALSE(Put(Items() + "/nobody/a.jpg"));
   }));
 }
 
 TEST_F(TrashTest, DoesNotTrustATrashThatIsALinkOrSomebodyElses) {
   if (::geteuid() != 0) GTEST_SKIP() << "needs root to give folders away";
-  const std::string path = Make("items/a.jpg");
-  for (const char* make : {"ln -s ../../items Trash/files",
-                           "mkdir Trash/info && chown 1 Trash/info",
-                           "chown 1 Trash"}) {
-    SCOPED_TRACE(make);
-    const std::string fresh = "rm -rf '" + Home() + "' && mkdir -p '" + Home() + "' && cd '";
-    ASSERT_TRUE(RunShell(fresh + (folder_ / "data") + "' && " + make));
-    EXPECT_FALSE(Put(path).Ok());
-    EXPECT_TRUE(fs::exists(path));
+  tree_.Make("items/a.jpg, data/");
+  for (const std::string make : {"ln -s ../../items Trash/files",
+                                 "mkdir Trash/info && chown 1 Trash/info",
+                                 "chown 1 Trash"}) {
+    const std::string begin = "cd '" + (tree_ / "data") + "' && rm -rf Trash && mkdir Trash && ";
+    ASSERT_TRUE(RunShell(begin + make));
+    EXPECT_FALSE(Put(Items() + "/a.jpg")) << make;
+    EXPECT_TRUE(tree_.Has("items/a.jpg"));
   }
 }
 
@@ -234,173 +194,142 @@ TEST_F(TrashTest, DoesNotTrustATrashThatIsALinkOrSomebodyElses) {
 
 class TrashOnVolume : public TrashTest {
  protected:
-  std::string Volume() const { return folder_ / "volume"; }
+  std::string Volume() const { return tree_ / "volume"; }
   std::string Own() const { return Volume() + "/.Trash-" + std::to_string(::geteuid()); }
-  bool Mount(const std::string& options = "size=4m") const {
-    return test::MountTmpfs(Volume(), options);
+  bool Mount(const std::string& options = "size=4m") const { return MountTmpfs(Volume(), options); }
+  bool RunThere(const std::string& command) const {
+    return RunShell("cd '" + Volume() + "' && " + command);
   }
 };
 
 TEST_F(TrashOnVolume, IsInTheTopFolder) {
-  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
     ASSERT_TRUE(Mount());
-    ASSERT_TRUE(Put(Make("volume/100% in/a.jpg")).Ok());
+    ASSERT_TRUE(PutNew("volume/100% in/a.jpg"));
     EXPECT_EQ(PathIn(Own(), "a.jpg"), "100%25%20in/a.jpg");
     EXPECT_TRUE(fs::exists(Own() + "/files/a.jpg"));
-    EXPECT_FALSE(Put(Own()).Ok());
+    EXPECT_FALSE(Put(Own()));
     EXPECT_FALSE(fs::exists(Home())) << "not made when it is not needed";
 
-    fs::create_symlink(Items(), Volume() + "/link");
-    EXPECT_TRUE(Put(Make("volume/link/b.jpg")).Ok());
+    tree_.Make("volume/link -> " + Items() + ", bound/");
+    EXPECT_TRUE(PutNew("volume/link/b.jpg"));
     EXPECT_EQ(PathIn(Home(), "b.jpg"), Items() + "/b.jpg") << "the folder's volume decides";
 
-    fs::create_directory(folder_ / "bound");
-    ASSERT_TRUE(test::BindMount(Volume() + "/100% in", folder_ / "bound"));
-    ASSERT_TRUE(Put(Make("bound/c.jpg")).Ok());
-    EXPECT_EQ(PathIn(folder_ / "bound/.Trash-0", "c.jpg"), "c.jpg");
+    ASSERT_TRUE(BindMount(Volume() + "/100% in", tree_ / "bound"));
+    ASSERT_TRUE(PutNew("bound/c.jpg"));
+    EXPECT_EQ(PathIn(tree_ / "bound/.Trash-0", "c.jpg"), "c.jpg");
   }));
 }
 
 TEST_F(TrashOnVolume, UsesTheSharedFolderOnlyWhenItIsSafe) {
-  const struct {
-    const char* make;
-    bool isUsed;
-  } kCases[] = {
-      {"mkdir .Trash && chmod 1777 .Trash", true},
-      {"mkdir .Trash && chmod 0777 .Trash", false},
-      {"mkdir sticky && chmod 1777 sticky && ln -s sticky .Trash", false},
-      {"touch .Trash", false},
-      {"mkdir -p .Trash/0 && chmod 1777 .Trash && chown 1 .Trash/0", false},
+  const std::pair<const char*, const char*> kCases[] = {
+      {"mkdir .Trash && chmod 1777 .Trash", "/.Trash/0"},
+      {"mkdir .Trash && chmod 0777 .Trash", "/.Trash-0"},
+      {"mkdir sticky && chmod 1777 sticky && ln -s sticky .Trash", "/.Trash-0"},
+      {"touch .Trash", "/.Trash-0"},
+      {"mkdir -p .Trash/0 && chmod 1777 .Trash && chown 1 .Trash/0", "/.Trash-0"},
   };
   for (const auto& c : kCases) {
-    SCOPED_TRACE(c.make);
-    ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
-      ASSERT_TRUE(Mount() && RunShell("cd '" + Volume() + "' && " + c.make));
-      EXPECT_TRUE(Put(Make("volume/a.jpg")).Ok());
-      EXPECT_TRUE(fs::exists((c.isUsed ? Volume() + "/.Trash/0" : Own()) + "/files/a.jpg"));
-      EXPECT_FALSE(Put(Volume() + "/.Trash").Ok());
+    SCOPED_TRACE(c.first);
+    ORB_IN_CHILD(RunWithPrivateMounts([&] {
+      ASSERT_TRUE(Mount() && RunThere(c.first));
+      EXPECT_TRUE(PutNew("volume/a.jpg"));
+      EXPECT_TRUE(fs::exists(Volume() + c.second + "/files/a.jpg"));
+      EXPECT_FALSE(Put(Volume() + "/.Trash"));
     }));
   }
 }
 
 TEST_F(TrashOnVolume, FallsBackToTheHomeByCopy) {
-  const struct {
-    const char* make;
-    const char* options;
-  } kCases[] = {
+  const std::pair<const char*, const char*> kCases[] = {
       {"ln -s in .Trash-0", "size=4m"},
       {"mkdir .Trash-0 && chown 1 .Trash-0", "size=4m"},
       {"mkdir .Trash-0 && ln -s ../in .Trash-0/files", "size=4m"},
       {"true", "nr_inodes=6"},
   };
   for (const auto& c : kCases) {
-    SCOPED_TRACE(c.make);
-    ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
-      ASSERT_TRUE(Mount(c.options));
-      const std::string file = Make("volume/in/a.jpg", "photo");
-      Make("volume/in/trip/b.jpg", "of the trip");
-      ASSERT_TRUE(RunShell("cd '" + Volume() + "' && " + c.make));
-      Make("data/Trash/files/a.jpg", "without record");
-      EXPECT_TRUE(Put(file).Ok());
-      EXPECT_TRUE(Put(Volume() + "/in/trip").Ok());
+    SCOPED_TRACE(c.first);
+    ORB_IN_CHILD(RunWithPrivateMounts([&] {
+      ASSERT_TRUE(Mount(c.second));
+      tree_.Make("volume/in/a.jpg=photo, volume/in/trip/b.jpg=of the trip");
+      tree_.Make("data/Trash/files/a.jpg=without record");
+      ASSERT_TRUE(RunThere(c.first));
+      EXPECT_TRUE(Put(Volume() + "/in/a.jpg"));
+      EXPECT_TRUE(Put(Volume() + "/in/trip"));
       EXPECT_TRUE(fs::is_empty(Volume() + "/in"));
-      EXPECT_EQ(test::ReadAll(Home() + "/files/a.jpg"), "without record");
-      EXPECT_EQ(test::ReadAll(Home() + "/files/a.2.jpg"), "photo");
-      EXPECT_EQ(PathIn(Home(), "a.2.jpg"), file);
-      EXPECT_EQ(test::ReadAll(Home() + "/files/trip/b.jpg"), "of the trip");
+      EXPECT_EQ(ReadAll(Home() + "/files/a.jpg"), "without record");
+      EXPECT_EQ(ReadAll(Home() + "/files/a.2.jpg"), "photo");
+      EXPECT_EQ(PathIn(Home(), "a.2.jpg"), Volume() + "/in/a.jpg");
+      EXPECT_EQ(ReadAll(Home() + "/files/trip/b.jpg"), "of the trip");
     }));
   }
 }
 
-class LittleSpace final : public Volumes {
- public:
-  std::optional<std::uint64_t> AvailableCapacity(const std::string&) const override {
-    return 50'000;
-  }
-};
-
 TEST_F(TrashOnVolume, KeepsWhatCannotBeCopiedOrRemoved) {
-  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
     ASSERT_TRUE(Mount());
-    fs::create_directory_symlink(Items(), Own());  // So that only the copy is left.
-    const std::string big = Make("volume/big.jpg", std::string(100'000, 'b'));
-    const std::string trip = Volume() + "/trip";
-    const std::string locked = Make("volume/trip/locked.jpg");
-    const std::string pipe = Volume() + "/with a pipe/pipe";
-    Make("volume/with a pipe/a.jpg");
-    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
-    ASSERT_TRUE(Items::Current().SetLocked(locked, true).Ok());
-    const auto before = test::Describe(Volume());
+    tree_.Make("volume/.Trash-0 -> " + Items());  // So that only the copy is left.
+    tree_.Make("volume/trip/locked.jpg!, volume/with a pipe/pipe|, volume/with a pipe/a.jpg");
+    const std::string big = tree_.Write("volume/big.jpg", std::string(100'000, 'b'));
+    const auto before = Describe(Volume());
     {
-      const LittleSpace little;
-      const ScopedVolumes scoped(little);
-      EXPECT_EQ(Put(big).Reason(), kVolumeFull);
+      const SpaceLeft little(50'000);
+      EXPECT_EQ(ErrorOf(Put(big)), kVolumeFull);
     }
-    EXPECT_EQ(Put(trip).Reason(), kNotPermitted) << "something inside could not be removed";
-    EXPECT_EQ(Put(Volume() + "/with a pipe").Reason(), kNotPermitted);
-    ASSERT_TRUE(test::MakeReadOnlyVolume(Volume()));
-    EXPECT_FALSE(Put(big).Ok());
-    EXPECT_EQ(test::Describe(Volume()), before);
+    EXPECT_EQ(ErrorOf(Put(Volume() + "/trip")), kNotPermitted) << "something inside stays";
+    EXPECT_EQ(ErrorOf(Put(Volume() + "/with a pipe")), kNotPermitted);
+    ASSERT_TRUE(MakeReadOnlyVolume(Volume()));
+    EXPECT_FALSE(Put(big));
+    EXPECT_EQ(Describe(Volume()), before);
     EXPECT_TRUE(IsEmpty(Home()));
   }));
 }
 
 TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
-  fs::create_directory(folder_ / "data");
-  fs::permissions(folder_ / "data", fs::perms(0777));
-  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+  tree_.Make("data/ 0777");
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
     ASSERT_TRUE(Mount("size=4m,mode=0755"));
-    const std::string file = Make("volume/in/a.jpg");
-    fs::permissions(Volume() + "/in", fs::perms(0777));
-    const std::string sticky = Make("volume/sticky/a.jpg");
-    fs::permissions(Volume() + "/sticky", fs::perms(01777));
-    const std::string closed = Make("volume/closed/a.jpg");
-    const std::string burnt = Make("volume/in/from a disc/a.jpg");
-    ASSERT_EQ(::setresuid(65534, 65534, 65534), 0);
-    EXPECT_TRUE(Put(file).Ok());
-    EXPECT_FALSE(fs::exists(file));
+    tree_.Make("volume/in/a.jpg, volume/sticky/a.jpg, volume/closed/a.jpg");
+    tree_.Make("volume/in/from a disc/a.jpg");
+    tree_.Make("volume/in/ 0777, volume/sticky/ 01777");
+    ASSERT_EQ(::setresuid(kStranger, kStranger, kStranger), 0);
+    EXPECT_TRUE(Put(Volume() + "/in/a.jpg"));
+    EXPECT_FALSE(tree_.Has("volume/in/a.jpg"));
     EXPECT_TRUE(fs::exists(Home() + "/files/a.jpg"));
     fs::remove_all(Home());
-    EXPECT_FALSE(Put(sticky).Ok());
-    EXPECT_FALSE(Put(closed).Ok());
-    EXPECT_FALSE(Put(fs::path(burnt).parent_path()).Ok());
-    EXPECT_TRUE(fs::exists(sticky) && fs::exists(closed) && fs::exists(burnt));
+    const Unchanged unchanged(Volume());
+    EXPECT_FALSE(Put(Volume() + "/sticky/a.jpg"));
+    EXPECT_FALSE(Put(Volume() + "/closed/a.jpg"));
+    EXPECT_FALSE(Put(Volume() + "/in/from a disc"));
     EXPECT_TRUE(IsEmpty(Home()));
   }));
 }
 
 TEST_F(TrashOnVolume, CopiesWhereTheVolumeDoesNotRename) {
-  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
-    ASSERT_TRUE(test::MountTmpfs(folder_ / "layers", "size=4m"));
-    for (const char* layer : {"upper", "work"})
-      fs::create_directories(folder_ / ("layers/" + std::string(layer)));
-    Make("layers/lower/trip/a.jpg", "below");
-    Make("layers/lower/tour/a.jpg", "below");
-    fs::create_directory(Volume());
-    const std::string options = "lowerdir=" + (folder_ / "layers/lower") +
-                                ",redirect_dir=off,upperdir=" + (folder_ / "layers/upper") +
-                                ",workdir=" + (folder_ / "layers/work");
-    if (::mount("overlay", Volume().c_str(), "overlay", 0, options.c_str()) != 0) {
-      ::_exit(test::kImpossibleStatus);
-    }
-    EXPECT_TRUE(Put(Volume() + "/trip").Ok());
-    EXPECT_FALSE(fs::exists(Volume() + "/trip"));
-    EXPECT_EQ(test::ReadAll(Home() + "/files/trip/a.jpg"), "below");
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(MountTmpfs(tree_ / "layers", "size=4m"));
+    tree_.Make(
+        "layers/lower/tour/a.jpg, volume/, layers/upper/, layers/work/, layers/lower/trip/a.jpg");
+    if (!RunShell("cd '" + (tree_ / "layers") + "' && mount -t overlay overlay ../volume -o " +
+                  "redirect_dir=off,lowerdir=lower,upperdir=upper,workdir=work 2>/dev/null"))
+      ::_exit(kImpossibleStatus);
+    EXPECT_TRUE(Put(Volume() + "/trip"));
+    EXPECT_FALSE(tree_.Has("volume/trip"));
+    EXPECT_EQ(ReadAll(Home() + "/files/trip/a.jpg"), "layers/lower/trip/a.jpg");
     EXPECT_TRUE(IsEmpty(Own()));
 
-    const test::ScopedVariable data("XDG_DATA_HOME", Volume() + "/data");
-    EXPECT_TRUE(Put(Volume() + "/tour").Ok()) << "nor the volume of the home";
-    EXPECT_EQ(test::ReadAll(Volume() + "/data/Trash/files/tour/a.jpg"), "below");
+    const ScopedVariable data("XDG_DATA_HOME", Volume() + "/data");
+    EXPECT_TRUE(Put(Volume() + "/tour")) << "nor the volume of the home";
+    EXPECT_TRUE(tree_.Has("volume/data/Trash/files/tour/a.jpg"));
   }));
 }
 
 TEST_F(TrashOnVolume, KeepsFoldersWhereVolumesAreMounted) {
-  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
-    fs::create_directories(Items() + "/a/mounted");
-    ASSERT_TRUE(test::MountTmpfs(Items() + "/a/mounted", "size=1m"));
-    EXPECT_EQ(Put(Items() + "/a/mounted").Reason(), kBusy);
-    EXPECT_EQ(Put(Items() + "/a").Reason(), kBusy);
-    EXPECT_TRUE(fs::exists(Items() + "/a/mounted"));
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(MountTmpfs(Items() + "/a/mounted", "size=1m"));
+    EXPECT_EQ(ErrorOf(Put(Items() + "/a/mounted")), kBusy);
+    EXPECT_EQ(ErrorOf(Put(Items() + "/a")), kBusy);
+    EXPECT_TRUE(tree_.Has("items/a/mounted"));
     EXPECT_TRUE(IsEmpty(Home()));
   }));
 }
@@ -410,38 +339,34 @@ TEST_F(TrashOnVolume, KeepsFoldersWhereVolumesAreMounted) {
 TEST_F(TrashOnVolume, IsListedAndRestoredByTrashCli) {
   if (!RunShell("command -v trash-list trash-restore >/dev/null"))
     GTEST_SKIP() << "needs trash-cli";
-  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
     ASSERT_TRUE(Mount());
-    ASSERT_TRUE(test::MountTmpfs(folder_ / "shared", "size=1m"));
-    fs::create_directory(folder_ / "shared/.Trash");
-    fs::permissions(folder_ / "shared/.Trash", fs::perms(01777));
-    int number = 0;
-    for (const char* place : {"items/", "volume/", "shared/in/"}) {
-      for (const char* name : {"100%25.jpg", "a b.jpg", "Gr\xc3\xbc\xc3\x9f\x65.jpg", "trip/"}) {
-        const std::string content = std::to_string(++number);
-        const std::string item = std::string(place) + name;
-        const std::string path = folder_ / item;
-        SCOPED_TRACE(item);
-        const std::string file = Make(path.ends_with('/') ? item + "a.jpg" : item, content);
-        const std::string shown = path.ends_with('/') ? path.substr(0, path.size() - 1) : path;
-        ASSERT_TRUE(Put(path).Ok());
-        EXPECT_TRUE(RunShell("trash-list | grep -F ' " + shown + "' >/dev/null"));
-        EXPECT_TRUE(RunShell("cd '" + folder_.Path() + "' && echo 0 | trash-restore '" + shown +
+    ASSERT_TRUE(MountTmpfs(tree_ / "shared", "size=1m"));
+    tree_.Make("shared/.Trash/ 01777");
+    for (const std::string place : {"items/", "volume/", "shared/in/"}) {
+      for (const std::string name :
+           {"100%25.jpg", "a b.jpg", "Gr\xc3\xbc\xc3\x9f\x65.jpg", "trip"}) {
+        SCOPED_TRACE(place + name);
+        const std::string path = tree_ / (place + name);
+        const std::string file = place + name + (name == "trip" ? "/a.jpg" : "");
+        tree_.Make(file);
+        ASSERT_TRUE(Put(path));
+        EXPECT_TRUE(RunShell("trash-list | grep -F ' " + path + "' >/dev/null"));
+        EXPECT_TRUE(RunShell("cd '" + tree_.Path() + "' && echo 0 | trash-restore '" + path +
                              "' >/dev/null"));
-        EXPECT_EQ(test::ReadAll(file), content);
+        EXPECT_EQ(tree_.Read(file), file);
       }
-      EXPECT_TRUE(Put(Make(std::string(place) + "twice.jpg", "1")).Ok());
-      EXPECT_TRUE(Put(Make(std::string(place) + "twice.jpg", "2")).Ok());
+      EXPECT_TRUE(PutNew(place + "twice.jpg", "1") && PutNew(place + "twice.jpg", "2"));
     }
     EXPECT_TRUE(RunShell("test $(trash-list | grep -c /twice.jpg) = 6"));
   }));
 }
 
 TEST_F(TrashOnVolume, KeepsTheCopyOfWhatSomebodyElseRemoves) {
-  ORB_IN_CHILD(test::RunWithPrivateMounts([&] {
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
     ASSERT_TRUE(Mount());
-    fs::create_directory_symlink(Items(), Own());  // So that only the copy is left.
-    const std::string file = Make("volume/a.jpg", "photo");
+    tree_.Make("volume/a.jpg=photo, volume/.Trash-0 -> " + Items());  // Only the copy is left.
+    const std::string file = Volume() + "/a.jpg";
     std::atomic<bool> done = false;
     std::thread other([&] {
       while (!done && !fs::exists(Home() + "/files/a.jpg")) std::this_thread::yield();
@@ -450,7 +375,7 @@ TEST_F(TrashOnVolume, KeepsTheCopyOfWhatSomebodyElseRemoves) {
     (void)Put(file);
     done = true;
     other.join();
-    EXPECT_EQ(test::ReadAll(Home() + "/files/a.jpg"), "photo");
+    EXPECT_EQ(ReadAll(Home() + "/files/a.jpg"), "photo");
     EXPECT_EQ(PathIn(Home(), "a.jpg"), file);
   }));
 }

@@ -3,45 +3,21 @@
 
 #include <gtest/gtest.h>
 #include <unicode/uchar.h>
-#include <unicode/unorm2.h>
-#include <unicode/ustring.h>
-#include <unicode/utf16.h>
 
-#include <string>
 #include <thread>
 #include <vector>
 
+#include "support/icu.h"
+
+namespace orb::platform {
 namespace {
 
-using orb::platform::CharForm;
-using orb::platform::Form;
-
-std::u16string Normalised(const UNormalizer2* form, const std::u16string& text) {
-  UErrorCode status = U_ZERO_ERROR;
-  char16_t out[64];
-  const auto size = static_cast<std::int32_t>(text.size());
-  const std::int32_t length = unorm2_normalize(form, text.data(), size, out, 64, &status);
-  return {out, static_cast<std::size_t>(length)};
-}
-
-std::u16string Folded(const std::u16string& text) {
-  UErrorCode status = U_ZERO_ERROR;
-  char16_t out[64];
-  const auto size = static_cast<std::int32_t>(text.size());
-  const std::int32_t length =
-      u_strFoldCase(out, 64, text.data(), size, U_FOLD_CASE_DEFAULT, &status);
-  return {out, static_cast<std::size_t>(length)};
-}
-
-std::u16string Units(char32_t c) {
-  if (c < 0x10000) return {static_cast<char16_t>(c)};
-  return {static_cast<char16_t>(U16_LEAD(c)), static_cast<char16_t>(U16_TRAIL(c))};
-}
+using namespace test;
 
 /// What a search would compare.
 std::u16string Shown(Form form, char32_t c) {
-  const CharForm made = orb::platform::FormOf(form, c);
-  if (made.length == 0) return orb::platform::FormOfRun(form, Units(c));
+  const CharForm made = FormOf(form, c);
+  if (made.length == 0) return FormOfRun(form, UnitsOf(c));
   return {made.units.data(), made.length};
 }
 
@@ -52,14 +28,14 @@ TEST(Unicode, EveryCharacterHasIcusForms) {
   for (char32_t c = 1; c < 0x110000; ++c) {
     if (c >= 0x30000 && c < 0xE0000) continue;  // Nothing there differs from its neighbours.
     if (U_IS_SURROGATE(c)) continue;
-    const std::u16string self = Units(c);
-    const std::u16string decomposed = Normalised(nfd, self);
-    const std::u16string folded = Normalised(nfd, Folded(decomposed));
-    const CharForm made = orb::platform::FormOf(Form::kDecomposed, c);
-    if (Shown(Form::kDecomposed, c) != decomposed || Shown(Form::kFolded, c) != Folded(self) ||
+    const std::u16string self = UnitsOf(c);
+    const std::u16string decomposed = IcuNormalised(nfd, self);
+    const std::u16string folded = IcuNormalised(nfd, IcuFolded(decomposed));
+    const CharForm made = FormOf(Form::kDecomposed, c);
+    if (Shown(Form::kDecomposed, c) != decomposed || Shown(Form::kFolded, c) != IcuFolded(self) ||
         Shown(Form::kFoldedDecomposed, c) != folded ||
         made.isPlain !=
-            (made.startsSegment && Normalised(nfc, self) == self &&
+            (made.startsSegment && IcuNormalised(nfc, self) == self &&
              unorm2_isNormalized(nfc, self.data(), self.size() == 1 ? 1 : 2, &status))) {
       FAIL() << std::hex << static_cast<unsigned>(c);
     }
@@ -74,7 +50,6 @@ TEST(Unicode, EveryCharacterHasIcusForms) {
 }
 
 TEST(Unicode, MarksComeInCanonicalOrder) {
-  using orb::platform::FormOfRun;
   EXPECT_EQ(FormOfRun(Form::kDecomposed, u"é\u0316\u0301a"), u"e\u0316\u0301\u0301a");
   EXPECT_EQ(FormOfRun(Form::kFoldedDecomposed, u"\u1F82\u0301"), u"α\u0313\u0300\u0301ι");
   EXPECT_EQ(FormOfRun(Form::kFolded, u"Éß"), u"éss");
@@ -93,3 +68,4 @@ TEST(Unicode, ThreadsMayAskForTheSamePageAtOnce) {
 }
 
 }  // namespace
+}  // namespace orb::platform

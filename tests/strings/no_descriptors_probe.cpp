@@ -3,9 +3,10 @@
 // its own, because those of the unit tests are linked to that data.
 #include <orb/strings/string_functions.h>
 #include <orb/thread/thread.h>
-#include <sys/resource.h>
 
 #include <cstdio>
+
+#include "support/resource_limit.h"
 
 namespace {
 
@@ -19,13 +20,11 @@ int Failed(const char* what) {
 int main() {
   const COrbStringData composed{OrbCharUtf8("\xE3\x81\x82 \xC3\x89.JPG")};
   const COrbStringData decomposed{OrbCharUtf8("\xE3\x81\x82 E\xCC\x81.jpg")};
-  rlimit before = {};
-  getrlimit(RLIMIT_NOFILE, &before);
-  const rlimit none = {0, before.rlim_max};
-  setrlimit(RLIMIT_NOFILE, &none);
-  if (composed.GetLengthChar() != 7) return Failed("length");
-  if (OrbStringDataCmpi(composed, OrbStringDataLower(composed)) != 0) return Failed("ASCII case");
-  setrlimit(RLIMIT_NOFILE, &before);
+  {
+    const orb::test::ResourceLimit none(RLIMIT_NOFILE, 0);
+    if (composed.GetLengthChar() != 7) return Failed("length");
+    if (OrbStringDataCmpi(composed, OrbStringDataLower(composed)) != 0) return Failed("ASCII case");
+  }
   OrbSleep(1100);
   const COrbStringData again{composed.GetCharPlatform()};
   if (OrbStringDataCmpi(again, decomposed) != 0) return Failed("canonical equivalence");

@@ -5,9 +5,6 @@
 #include <orb/strings/string_functions.h>
 #include <unicode/uchar.h>
 #include <unicode/unorm.h>
-#include <unicode/unorm2.h>
-#include <unicode/ustring.h>
-#include <unicode/utf16.h>
 
 #include <array>
 #include <random>
@@ -17,9 +14,12 @@
 #include "platform/transcode.h"
 #include "platform/unicode.h"
 #include "strings/text_scan.h"
+#include "support/icu.h"
 #include "support/texts.h"
 
 namespace {
+
+using namespace orb::test;
 
 constexpr unsigned long kAll = static_cast<unsigned long>(-1);
 
@@ -31,29 +31,21 @@ COrbStringData FromUnits(const std::u16string& units) {
   return COrbStringData(OrbCharUnicode(reinterpret_cast<const unsigned short*>(units.c_str())));
 }
 
-std::u16string Utf16Of(char32_t c) {
-  if (c < 0x10000) return {static_cast<char16_t>(c)};
-  return {U16_LEAD(c), U16_TRAIL(c)};
-}
-
-std::int32_t Size(const std::u16string& s) { return static_cast<std::int32_t>(s.size()); }
-
 std::u16string Decomposed(const std::u16string& text) {
   UErrorCode status = U_ZERO_ERROR;
-  std::u16string out(text.size() * 4 + 1, u'\0');
-  const UNormalizer2* nfd = unorm2_getNFDInstance(&status);
-  out.resize(static_cast<std::size_t>(
-      unorm2_normalize(nfd, text.data(), Size(text), out.data(), Size(out), &status)));
-  return out;
+  return IcuNormalised(unorm2_getNFDInstance(&status), text);
 }
 
 std::u16string Folded(const std::u16string& text) {
+  return Decomposed(IcuFolded(Decomposed(text)));
+}
+
+/// Without the rules of any language.
+std::u16string Cased(decltype(&u_strToLower) map, const std::u16string& text) {
   UErrorCode status = U_ZERO_ERROR;
-  const std::u16string plain = Decomposed(text);
-  std::u16string out(plain.size() * 3 + 1, u'\0');
-  out.resize(static_cast<std::size_t>(u_strFoldCase(
-      out.data(), Size(out), plain.data(), Size(plain), U_FOLD_CASE_DEFAULT, &status)));
-  return Decomposed(out);
+  std::u16string out(8, u'\0');
+  const auto size = map(out.data(), Size(out), text.data(), Size(text), "", &status);
+  return out.substr(0, static_cast<std::size_t>(size));
 }
 
 bool IsBoundary(const std::u16string& text, std::size_t at) {
@@ -202,7 +194,7 @@ TEST(Oracle, ScansAgreeWithReadingEachCharacter) {
   std::string plain;
   for (char32_t c = 1; c < 0x110000; ++c) {
     std::string one;
-    if (c < 0xD800 || c >= 0xE000) one = orb::platform::Utf8FromUtf16(Utf16Of(c));
+    if (c < 0xD800 || c >= 0xE000) one = orb::platform::Utf8FromUtf16(UnitsOf(c));
     check(one);
     if (orb::ScanUtf8(one).kind != orb::TextKind::kComposing) plain += one;
   }
@@ -210,7 +202,7 @@ TEST(Oracle, ScansAgreeWithReadingEachCharacter) {
   for (int i = 0; i < 3000; ++i) {  // Stretches that are plain, with one other byte or character.
     std::string text = plain.substr(random() % plain.size(), random() % (i % 8 == 0 ? 4000 : 40));
     while (!text.empty() && (text[0] & 0xC0) == 0x80) text.erase(0, 1);
-    if (i % 3 != 0) text = orb::platform::Utf8FromUtf16(Utf16Of(U'x')) + text;
+    if (i % 3 != 0) text = orb::platform::Utf8FromUtf16(UnitsOf(U'x')) + text;
     if (text.empty()) continue;
     check(text);
     const std::size_t at = random() % text.size();
@@ -232,6 +224,21 @@ TEST(Oracle, SearchesAgreeWithTryingEveryStretch) {
     ASSERT_EQ(Shown(OrbStringDataStrNoCase(s, find)), Tail(text, Found(text, wanted, Folded)));
     const std::size_t last = wanted.empty() ? std::u16string::npos : text.rfind(wanted);
     ASSERT_EQ(Shown(OrbStringDataStrReverse(s, find)), Tail(text, last));
+  }
+}
+
+TEST(Oracle, EveryCharacterEqualsItsFormsAndHasIcusCases) {
+  for (char32_t c = 1; c < 0x20000; ++c) {
+    if (U_IS_SURROGATE(c)) continue;
+    const std::u16string self = UnitsOf(c);
+    const COrbStringData text = FromUnits(self);
+    const COrbStringData decomposed = FromUnits(Decomposed(self));
+    SCOPED_TRACE(Text(text));
+    ASSERT_EQ(Units(OrbStringDataLower(text)), Cased(u_strToLower, self));
+    ASSERT_EQ(Units(OrbStringDataUpper(text)), Cased(u_strToUpper, self));
+    ASSERT_EQ(OrbStringDataCmpi(text, FromUnits(Folded(self))), 0);
+    ASSERT_EQ(Text(OrbStringDataStr(text, decomposed)), Text(text));
+    ASSERT_EQ(Text(OrbStringDataStr(decomposed, text)), Text(decomposed));
   }
 }
 

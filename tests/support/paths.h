@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #pragma once
 
-#include <orb/fileinfo/file_handle.h>
 #include <orb/path/file_path.h>
 
 #include <string>
@@ -13,9 +12,4 @@ inline COrbFilePath PathOf(const std::string& utf8) {
   COrbFilePath path;
   path.Initialize(&text);
   return path;
-}
-
-/// Whether the item could be locked.
-inline bool Lock(const std::string& utf8) {
-  return COrbFileHandle(PathOf(utf8)).SetAttribute(kOrbFileAttrLocked) == kOrbNoErr;
 }

@@ -3,12 +3,17 @@
 
 #include <dirent.h>
 #include <fcntl.h>
+#include <signal.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/xattr.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <filesystem>
+#include <functional>
 #include <map>
+#include <set>
 #include <string>
 
 #include "support/temp_folder.h"
@@ -27,7 +32,34 @@ inline bool LimitDescriptors(rlim_t count) {
   return ::setrlimit(RLIMIT_NOFILE, &limit) == 0;
 }
 
-/// What lies below a folder by relative path: kind and mode, time of modification, content.
+/// What is written beyond so many bytes of a file fails.
+inline bool LimitFiles(rlim_t size) {
+  const rlimit limit{size, size};
+  return ::signal(SIGXFSZ, SIG_IGN) != SIG_ERR && ::setrlimit(RLIMIT_FSIZE, &limit) == 0;
+}
+
+/// The extended attributes of an item, its lock among them. The time of creation is left out: only
+/// a copy has it there.
+inline std::set<std::string> XattrsOf(const std::string& path) {
+  char list[1 << 16];
+  char value[1 << 12];
+  std::set<std::string> found;
+  const ssize_t size = ::llistxattr(path.c_str(), list, sizeof list);
+  for (const char* name = list; name < list + size; name += std::string(name).size() + 1) {
+    const ssize_t length = ::lgetxattr(path.c_str(), name, value, sizeof value);
+    if (std::string(name) == "user.orb.created") continue;
+    found.insert(std::string(name) + "=" +
+                 std::string(value, value + std::max<ssize_t>(length, 0)));
+  }
+  return found;
+}
+
+inline std::string Shortened(const std::string& text) {
+  return text.size() < 1000 ? text : std::to_string(std::hash<std::string>()(text));
+}
+
+/// What lies below a folder by relative path: kind and mode, time of modification, attributes,
+/// content.
 inline std::map<std::string, std::string> Describe(const std::string& folder) {
   namespace fs = std::filesystem;
   std::map<std::string, std::string> items;
@@ -38,8 +70,9 @@ inline std::map<std::string, std::string> Describe(const std::string& folder) {
     std::string text = std::to_string(status.st_mode) + " " +
                        std::to_string(status.st_mtim.tv_sec) + "." +
                        std::to_string(status.st_mtim.tv_nsec);
+    for (const std::string& attribute : XattrsOf(path)) text += " " + attribute;
     if (item.is_symlink()) text += " -> " + fs::read_symlink(item.path()).string();
-    if (item.is_regular_file() && !item.is_symlink()) text += " " + ReadAll(path);
+    if (item.is_regular_file() && !item.is_symlink()) text += " " + Shortened(ReadAll(path));
     items[path.substr(folder.size())] = text;
   }
   return items;

@@ -7,6 +7,8 @@
 #include <cstring>
 #include <ctime>
 #include <string>
+#include <tuple>
+#include <utility>
 #include <vector>
 
 #include "support/texts.h"
@@ -39,31 +41,26 @@ std::string Written(const COrbTime& time, bool dateOnly, bool compact) {
 }
 
 TEST(TimeValue, IsTicksAndFraction) {
-  const struct {
-    std::uint64_t ticks;
-    std::uint16_t fraction;
-    unsigned long long value;
-    UTCDateTime record;
-  } kCases[] = {
+  const std::tuple<std::uint64_t, std::uint16_t, unsigned long long, UTCDateTime> kCases[] = {
       {0, 1, 152, {0, 0, 1}},
       {9'999'999, 0, 9'999'999, {0, 0, 65535}},
       {4'294'967'298 * kSecond, 32768, 42'949'672'985'000'000, {1, 2, 32768}},
       {5'000'000, 40000, 11'103'515, {0, 0, 7232}},  // The carry is dropped.
       {UINT64_MAX, 65535, 9'999'846, {429, 2'133'437'386, 62596}},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.ticks);
-    COrbTime time = c.ticks;
+  for (const auto& [ticks, fraction, value, expected] : kCases) {
+    SCOPED_TRACE(ticks);
+    COrbTime time = ticks;
     EXPECT_EQ(time.fraction, 0);
-    time.fraction = c.fraction;
+    time.fraction = fraction;
     EXPECT_FALSE(time.IsEmpty());
-    const COrbTime same = c.value;
-    const COrbTime next = c.value + 1;
+    const COrbTime same = value;
+    const COrbTime next = value + 1;
     EXPECT_TRUE(time == same && time <= same && time >= same && time != next);
     EXPECT_TRUE(time < next && time <= next && next > time && next >= time);
     EXPECT_FALSE(time != same || time < same || time > same || next <= time || time >= next);
     const UTCDateTime record = time;
-    EXPECT_EQ(std::memcmp(&record, &c.record, sizeof(record)), 0);
+    EXPECT_EQ(std::memcmp(&record, &expected, sizeof(record)), 0);
     time = 0;
     EXPECT_TRUE(time.IsEmpty());
   }
@@ -141,10 +138,7 @@ TEST(TimeFields, AreStoredOneByOne) {
 }
 
 TEST(TimeText, IsReadByItsDigits) {
-  const struct {
-    std::string text;
-    Fields fields;
-  } kCases[] = {
+  const std::pair<std::string, Fields> kCases[] = {
       {"2024/11/16 09:30:05", {2024, 11, 16, 9, 30, 5, 0, 0, 0}},
       {"20241116093005042", {2024, 11, 16, 9, 30, 5, 42, 0, 0}},
       {"202411160930050420073 and 99 more", {2024, 11, 16, 9, 30, 5, 42, 7, 3}},
@@ -152,9 +146,9 @@ TEST(TimeText, IsReadByItsDigits) {
       {"on \xE2\x98\x83 2024\xD9\xA1-e\xCC\x81 11-16", {2024, 11, 16, 0, 0, 0, 0, 0, 0}},
   };
   COrbTime time;
-  for (const auto& c : kCases) {
-    EXPECT_EQ(time.Initialize(S(c.text)), kOrbNoErr) << c.text;
-    EXPECT_EQ(FieldsOf(time), c.fields) << c.text;
+  for (const auto& [text, fields] : kCases) {
+    EXPECT_EQ(time.Initialize(S(text)), kOrbNoErr) << text;
+    EXPECT_EQ(FieldsOf(time), fields) << text;
   }
   time = 7;
   EXPECT_EQ(time.Initialize(COrbStringData()), kOrbErrUnknown);
