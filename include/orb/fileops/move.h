@@ -17,8 +17,9 @@
 ///
 /// A form that removes what is at the destination looks at the source first: kOrbErrNotFound, and
 /// nothing is removed, when it is empty or not there; kOrbErrAccessDenied for a locked one, for one
-/// that may not be taken out of its folder and, to another volume, for one that cannot be read, a
-/// socket, pipe or device, and a folder with something inside that could not be removed. Nor is
+/// that may not be taken out of its folder, to another folder for a folder that the caller may not
+/// write to and, to another volume, for one that cannot be read, a socket, pipe or device, and a
+/// folder with something inside that could not be removed. Nor is
 /// anything removed when the destination is the source, one of its folders or something inside it,
 /// by its text or on disk: kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed. Of a
 /// folder nothing is removed when something inside is locked, a volume of its own or in a folder
