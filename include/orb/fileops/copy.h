@@ -23,7 +23,7 @@
 /// is the source, one of its folders or something inside it, by its text or on disk:
 /// kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed. Of a folder nothing is
 /// removed when something inside is locked, a volume of its own or in a folder that the caller may
-/// not write to; after any other failure it may have lost some of its content.
+/// not read or write to; after any other failure it may have lost some of its content.
 ///
 /// Every form may give kOrbErrAccessDenied for a source that is not valid UTF-8. Forms that take a
 /// folder and a name give kOrbErrEmptyPath for an empty folder, and kOrbErrInvalidName when either

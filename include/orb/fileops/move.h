@@ -23,7 +23,8 @@
 /// anything removed when the destination is the source, one of its folders or something inside it,
 /// by its text or on disk: kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed. Of a
 /// folder nothing is removed when something inside is locked, a volume of its own or in a folder
-/// that the caller may not write to; after any other failure it may have lost some of its content.
+/// that the caller may not read or write to; after any other failure it may have lost some of its
+/// content.
 ///
 /// Forms that take a folder give kOrbErrSamePath when it is the source and kOrbErrInsideSource when
 /// it lies inside it, by their texts; kOrbErrAccessDenied for a source that is not valid UTF-8;
