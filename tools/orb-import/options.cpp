@@ -3,8 +3,6 @@
 
 #include <getopt.h>
 
-#include <string_view>
-
 #include "text.h"
 
 namespace orbimport {
