@@ -81,17 +81,6 @@ TEST(CopyFileOverwriteEx, RemovesNothingUnlessItCanBeReplaced) {
   }
 }
 
-TEST(CopyFileOverwriteEx, RemovesNothingOfAFolderThatItCannotLookInto) {
-  const Tree tree("new, to/new/photo, to/new/closed/other, to/new/zoo");
-  tree.Make("to/new/closed/ 0300");
-  for (const std::string folder : {"", "to", "to/new", "to/new/closed"})
-    ASSERT_EQ(::chown((tree / folder).c_str(), kStranger, kStranger), 0);
-  const Unchanged unchanged(tree.Path());
-  ORB_IN_CHILD(RunAsUser(kStranger, [&] {
-    EXPECT_EQ(Copy(tree / "new", tree / "to", std::nullopt), kOrbErrAccessDenied);
-  }));
-}
-
 OrbResult Append(const std::string& source,
                  const std::string& folder,
                  const std::string& name,

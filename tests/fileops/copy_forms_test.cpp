@@ -46,6 +46,18 @@ TEST(CopyFileOverwrite, TakesTwoFullPathsThatDifferInCaseAlone) {
   EXPECT_EQ(tree.Read("sub/A"), "sub/a");
 }
 
+TEST(CopyFileOverwrite, RemovesNothingOfAFolderThatItCannotLookInto) {
+  const Tree tree("new, to/new/photo, to/new/closed/other, to/new/zoo");
+  tree.Make("to/new/closed/ 0300");
+  for (const std::string folder : {"", "to", "to/new", "to/new/closed"})
+    ASSERT_EQ(::chown((tree / folder).c_str(), kStranger, kStranger), 0);
+  const Unchanged unchanged(tree.Path());
+  ORB_IN_CHILD(RunAsUser(kStranger, [&] {
+    const OrbResult copied = OrbCopyFileOverwrite(PathOf(tree / "new"), PathOf(tree / "to/new"));
+    EXPECT_EQ(copied, kOrbErrAccessDenied);
+  }));
+}
+
 /// What the callback does at its first, second, ... call.
 using Script = std::function<bool(int)>;
 
