@@ -175,25 +175,29 @@ void BareUnicodeOrb(benchmark::State& state, Kind kind) {
   }
 }
 
-void BareUnicodeIcu(benchmark::State& state, Kind kind) {
-  const std::string text = SampleBytes(state, kind);
-  std::u16string out(text.size() + 1, u'\0');
+/// Of ICU; `out` has room for the whole text.
+template <auto Convert, typename In, typename Out>
+void BareIcu(benchmark::State& state, const In& text, Out out) {
   for (auto _ : state) {
     UErrorCode status = U_ZERO_ERROR;
     std::int32_t length = 0;
-    u_strFromUTF8(out.data(),
-                  static_cast<std::int32_t>(out.size()),
-                  &length,
-                  text.data(),
-                  static_cast<std::int32_t>(text.size()),
-                  &status);
+    Convert(out.data(),
+            static_cast<std::int32_t>(out.size()),
+            &length,
+            text.data(),
+            static_cast<std::int32_t>(text.size()),
+            &status);
     benchmark::DoNotOptimize(length);
     benchmark::ClobberMemory();
   }
 }
 
-void RoadUtf8Orb(benchmark::State& state, Kind kind) {
+void BareUnicodeIcu(benchmark::State& state, Kind kind) {
   const std::string text = SampleBytes(state, kind);
+  BareIcu<u_strFromUTF8>(state, text, std::u16string(text.size() + 1, u'\0'));
+}
+
+void RoadUtf8Orb(benchmark::State& state, Kind kind) {
   const std::u16string units = SampleUnits(state, kind);
   const OrbCharUnicode from(reinterpret_cast<const unsigned short*>(units.c_str()));
   for (auto _ : state) {
@@ -203,7 +207,6 @@ void RoadUtf8Orb(benchmark::State& state, Kind kind) {
 }
 
 void BareUtf8Orb(benchmark::State& state, Kind kind) {
-  const std::string text = SampleBytes(state, kind);
   const std::u16string units = SampleUnits(state, kind);
   std::string out(3 * units.size() + orb::platform::kSlack, '\0');
   for (auto _ : state) {
@@ -213,21 +216,8 @@ void BareUtf8Orb(benchmark::State& state, Kind kind) {
 }
 
 void BareUtf8Icu(benchmark::State& state, Kind kind) {
-  const std::string text = SampleBytes(state, kind);
   const std::u16string units = SampleUnits(state, kind);
-  std::string out(3 * units.size() + 1, '\0');
-  for (auto _ : state) {
-    UErrorCode status = U_ZERO_ERROR;
-    std::int32_t length = 0;
-    u_strToUTF8(out.data(),
-                static_cast<std::int32_t>(out.size()),
-                &length,
-                units.data(),
-                static_cast<std::int32_t>(units.size()),
-                &status);
-    benchmark::DoNotOptimize(length);
-    benchmark::ClobberMemory();
-  }
+  BareIcu<u_strToUTF8>(state, units, std::string(3 * units.size() + 1, '\0'));
 }
 
 #ifdef ORB_BENCH_QT

@@ -12,21 +12,9 @@
 #include <string>
 #include <vector>
 
+#include "file_peers.h"
 #include "platform/volumes.h"
 #include "support.h"
-
-#ifdef ORB_BENCH_GLIB  // Before Qt, whose macros its names meet.
-#include <gio/gio.h>
-#endif
-#ifdef ORB_BENCH_QT
-#include <QDateTime>
-#include <QFileInfo>
-#include <QStorageInfo>
-#include <QString>
-#endif
-#ifdef ORB_BENCH_BOOST
-#include <boost/filesystem.hpp>
-#endif
 
 namespace {
 

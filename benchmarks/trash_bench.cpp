@@ -11,17 +11,9 @@
 #include <string>
 #include <vector>
 
+#include "file_peers.h"
 #include "platform/drives.h"
 #include "support.h"
-
-#ifdef ORB_BENCH_GLIB  // Before Qt, whose macros its names meet.
-#include <gio/gio.h>
-#endif
-#ifdef ORB_BENCH_QT
-#include <QFile>
-#include <QStorageInfo>
-#include <QString>
-#endif
 
 /// \file
 /// 200 items into the home trash in one call, and the kind of drive of an item. On ext4 use a new

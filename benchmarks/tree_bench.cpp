@@ -14,19 +14,8 @@
 #include <string>
 #include <vector>
 
+#include "file_peers.h"
 #include "scratch_volume.h"
-
-#ifdef ORB_BENCH_GLIB  // Before Qt, whose macros its names meet.
-#include <gio/gio.h>
-#endif
-#ifdef ORB_BENCH_QT
-#include <QDir>
-#include <QFile>
-#include <QString>
-#endif
-#ifdef ORB_BENCH_BOOST
-#include <boost/filesystem.hpp>
-#endif
 
 /// \file
 /// Whole trees and big files, copied and removed on file systems that are made anew for each round.

@@ -18,8 +18,8 @@ namespace orb {
 /// and devices; what is locked, or may not be taken out of its folder.
 OrbResult ExpectCopyable(const std::string& source);
 OrbResult ExpectMovable(const std::string& source);
-/// The same for what only shows when something is in the way: a folder cannot leave its volume as a
-/// whole.
+/// The same for what only concerns a destination where something is in the way: the source cannot
+/// come to that folder.
 OrbResult ExpectMovableTo(const std::string& source, const std::string& destination);
 
 /// By the texts alone: kOrbErrSamePath when both are one, kOrbErrInsideSource when the destination

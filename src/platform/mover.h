@@ -24,10 +24,11 @@ namespace orb::platform {
 Status MoveItem(const std::string& source, const std::string& destination);
 
 /// For those who make way for a source first: the failure that MoveItem() would end with when there
-/// is no source, it or its folder is locked, or the caller may not change the folder.
+/// is no source, it or its folder is locked, or the caller may not take it out of the folder.
 Status ExpectMovable(const std::string& source);
-/// The same for a source that cannot go to the volume of the destination: it cannot be read, or is
-/// a folder that holds something locked or a volume of its own.
+/// The same for a source that cannot go to the destination's folder: on its own volume, a folder
+/// that the caller may not write to; on another, what cannot be read, what is no file, link or
+/// folder, and a folder that could not be removed with all it holds.
 Status ExpectMovableTo(const std::string& source, const std::string& destination);
 
 }  // namespace orb::platform

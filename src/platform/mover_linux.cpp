@@ -58,6 +58,35 @@ Result<Place> LocateDestination(const std::string& path, const Place& source) {
   return open ? std::move(place) : open.Reason();
 }
 
+/// Whether the caller may take an item out of its folder.
+Status ExpectTakenOut(int folder, int item) {
+  if (::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) != 0) return LastError();
+  const auto above = ReadStatus(ItemRef(folder));
+  if (!above) return above.Reason();
+  const auto status = ReadStatus(ItemRef(item));
+  if (!status) return status.Reason();
+  return StickyBitForbids(above.Value(), status.Value()) ? kNotPermitted : Status();
+}
+
+/// To a rename two mounts of one volume are two volumes.
+Result<bool> AreOnOneMount(int folder, int other) {
+  const auto a = ReadStatus(ItemRef(folder));
+  if (!a) return a.Reason();
+  const auto b = ReadStatus(ItemRef(other));
+  if (!b) return b.Reason();
+  return MountOf(a.Value()) == MountOf(b.Value());
+}
+
+/// What a rename asks of an item itself: the ".." of a folder changes when it comes to lie in
+/// another one.
+Status ExpectRenamed(const Place& from, mode_t mode, const Identity& folder) {
+  const auto above = IdentityOf(from.folder.Get());
+  if (!above) return above.Reason();
+  if (!S_ISDIR(mode) || above.Value() == folder) return {};
+  const int denied = ::faccessat(from.folder.Get(), from.name.c_str(), W_OK, AT_EACCESS);
+  return denied == 0 ? Status() : Status(LastError());
+}
+
 /// What a copy to another volume, and the removal after it, ask of an item.
 Status ExpectCrossing(const Place& from, mode_t mode) {
   const int folder = from.folder.Get();
@@ -82,7 +111,7 @@ Status ExpectMovable(const std::string& source) {
       Retry([&] { return ::openat(folder, name, O_PATH | O_NOFOLLOW | O_CLOEXEC); }));
   if (!item) return LastError();
   if (Status open = RefuseLocked(item.Get()); !open) return open;
-  return ::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) == 0 ? Status() : Status(LastError());
+  return ExpectTakenOut(folder, item.Get());
 }
 
 Status ExpectMovableTo(const std::string& source, const std::string& destination) {
@@ -95,8 +124,12 @@ Status ExpectMovableTo(const std::string& source, const std::string& destination
   if (!to) return to.Reason();
   const auto folder = IdentityOf(to.Value().folder.Get());
   if (!folder) return folder.Reason();
-  const bool stays = folder.Value().device == status.Value().st_dev;
-  return stays ? Status() : ExpectCrossing(from.Value(), status.Value().st_mode);
+  const auto oneMount = AreOnOneMount(from.Value().folder.Get(), to.Value().folder.Get());
+  if (!oneMount) return oneMount.Reason();
+  const mode_t mode = status.Value().st_mode;
+  const bool stays = oneMount.Value() && folder.Value().device == status.Value().st_dev;
+  return stays ? ExpectRenamed(from.Value(), mode, folder.Value())
+               : ExpectCrossing(from.Value(), mode);
 }
 
 Status MoveItem(const std::string& source, const std::string& destination) {

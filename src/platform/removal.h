@@ -15,7 +15,8 @@ namespace orb::platform {
 Status RemoveItem(const std::string& path);
 
 /// kNotPermitted for a folder with something inside that RemoveItem() would stop at with a part of
-/// the folder gone: a locked item, a volume of its own. Only that is looked for.
+/// the folder gone: a locked item, a volume of its own, a folder that the caller may not write to
+/// or cannot look into. Only that is looked for.
 Status ExpectRemovable(const std::string& path);
 
 /// Removes one entry that is not a folder, under the same rules.

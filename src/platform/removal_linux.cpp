@@ -222,7 +222,9 @@ Status ExpectRemovable(const std::string& path) {
   if (!S_ISDIR(status.Value().st_mode)) return {};
   const auto survey =
       SurveyTree(place.Value().folder.Get(), place.Value().name, SurveyFor::kRemoval);
-  return !survey || survey.Value().canBeRemoved ? Status() : kNotPermitted;
+  // What cannot be looked into cannot be emptied. What has just gone is no obstacle.
+  if (!survey) return survey.Reason() == kNoSuchItem ? Status() : kNotPermitted;
+  return survey.Value().canBeRemoved ? Status() : kNotPermitted;
 }
 
 Status UnlinkItem(const std::string& path) {

@@ -83,12 +83,6 @@ Result<StatusRecord> ReadStatus(int folder, const char* name, int flags) {
   return status;
 }
 
-/// The number of the mount or, where the kernel tells none, of the device.
-std::uint64_t MountOf(const StatusRecord& status) {
-  if ((status.stx_mask & STATX_MNT_ID) != 0) return status.stx_mnt_id;
-  return makedev(status.stx_dev_major, status.stx_dev_minor);
-}
-
 Identity IdentityOf(const StatusRecord& status) {
   return {makedev(status.stx_dev_major, status.stx_dev_minor), status.stx_ino};
 }
@@ -150,13 +144,6 @@ Result<Item> FindItem(const Parent& parent, const std::string& path) {
   const Status refused = RefuseLocked(ItemRef(item.path.c_str()));
   if (!refused) return refused.Reason();
   return item;
-}
-
-/// In a folder with the sticky bit the owner of the item or of the folder may take it away.
-bool StickyBitForbids(const Item& item) {
-  const uid_t user = ::geteuid();
-  const bool isSticky = (item.parent.status.stx_mode & S_ISVTX) != 0;
-  return isSticky && user != 0 && user != item.status.stx_uid && user != item.parent.status.stx_uid;
 }
 
 /// Asked before anything is copied, so that no copy is made in vain.
@@ -239,7 +226,8 @@ class Trash::Batch {
     Result<TrashFolder>& home = Home();
     if (!home) return home.Reason();
     TrashFolder& trash = home.Value();
-    if (StickyBitForbids(item) || Concerns(trash, item)) return kNotPermitted;
+    const bool isForbidden = StickyBitForbids(item.parent.status, item.status);
+    if (isForbidden || Concerns(trash, item)) return kNotPermitted;
     if (const Status room = ExpectRoom(item, trash); !room) return room;
     const auto copy = [&](const std::string& name) {
       return trash.CopyIn(item.parent.folder.Get(), item.name, name);

@@ -27,6 +27,18 @@ TEST(CopyFile, TakesTwoTextsAndReplacesNothing) {
   EXPECT_EQ(tree.Read("new"), "a");
 }
 
+TEST(CopyFileOverwrite, RemovesNothingOfAFolderThatItCannotLookInto) {
+  const Tree tree("new, to/new/photo, to/new/closed/other, to/new/zoo");
+  tree.Make("to/new/closed/ 0300");
+  for (const std::string folder : {"", "to", "to/new", "to/new/closed"})
+    ASSERT_EQ(::chown((tree / folder).c_str(), kStranger, kStranger), 0);
+  const Unchanged unchanged(tree.Path());
+  ORB_IN_CHILD(RunAsUser(kStranger, [&] {
+    const OrbResult copied = OrbCopyFileOverwrite(PathOf(tree / "new"), PathOf(tree / "to/new"));
+    EXPECT_EQ(copied, kOrbErrAccessDenied);
+  }));
+}
+
 TEST(CopyFileOverwrite, TakesTwoFullPathsThatDifferInCaseAlone) {
   const Tree tree("sub/a, sub/A, sub/locked!, link -> sub");
   const Row<OrbResult> kRefused[] = {

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "platform/mover.h"
 
+#include <sys/mount.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 
 #include "platform/item_relations.h"
@@ -148,6 +150,39 @@ TEST(MoveItem, KeepsTheCopyOfASourceThatCannotBeRemoved) {
     EXPECT_EQ(Move(tree / "a/photo", tree / "b/photo"), kNotPermitted);
     EXPECT_EQ(tree.Read("a/photo"), "a/photo");
     EXPECT_EQ(tree.Read("b/photo"), "a/photo");
+  }));
+}
+
+// What makes way for the item asks before, and the rename would refuse it afterwards.
+TEST(ExpectMovable, KnowsWhatARenameAsksBesideTheFoldersPermission) {
+  const Tree tree;
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    for (const char* folder : {"sticky", "from/folder", "to", "bound"})
+      fs::create_directories(tree / folder);
+    tree.Write("sticky/photo", "photo");
+    ASSERT_EQ(::mkfifo((tree / "from/pipe").c_str(), 0666), 0);
+    ASSERT_EQ(::chmod((tree / "sticky").c_str(), 01777), 0);
+    ASSERT_EQ(::mount((tree / "to").c_str(), (tree / "bound").c_str(), "", MS_BIND, nullptr), 0);
+    for (const std::string folder : {"", "from", "to"})
+      ASSERT_EQ(::chown((tree / folder).c_str(), kStranger, kStranger), 0);
+    ASSERT_EQ(::setresuid(kStranger, kStranger, kStranger), 0);
+    const struct {
+      const char* from;
+      const char* to;
+      bool movable;
+    } kCases[] = {
+        {"sticky/photo", "to/photo", false},  // Neither it nor its folder is the stranger's.
+        {"from/folder", "to/folder", false},  // Its ".." is not his to change.
+        {"from/folder", "from/other", true},
+        {"from/pipe", "bound/pipe", false},  // One volume, and yet no way for a rename.
+        {"from/pipe", "to/pipe", true},
+    };
+    for (const auto& c : kCases) {
+      SCOPED_TRACE(std::string(c.from) + " to " + c.to);
+      const std::string from = tree / c.from, to = tree / c.to;
+      EXPECT_EQ(ExpectMovable(from) && ExpectMovableTo(from, to), c.movable);
+      EXPECT_EQ(MoveItem(from, to).Ok(), c.movable);
+    }
   }));
 }
 

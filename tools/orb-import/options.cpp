@@ -3,8 +3,6 @@
 
 #include <getopt.h>
 
-#include <string_view>
-
 #include "text.h"
 
 namespace orbimport {
@@ -80,13 +78,6 @@ Request SetLayout(Options& options, std::string& why) {
   return Request::kBad;
 }
 
-std::string Complaint(int found, char** argv) {
-  const std::string given = argv[optind - 1];
-  if (found == ':') return Quote(given) + " needs a value";
-  if (given.starts_with("--")) return "unknown option or needless value: " + Quote(given);
-  return "unknown option " + Quote(std::string("-") + static_cast<char>(optopt));
-}
-
 /// The switch that an option turns on; null for one that is no switch.
 bool* SwitchOf(int found, Options& options) {
   switch (found) {
@@ -122,12 +113,19 @@ Request ApplyOption(int found, char** argv, Options& options, std::string& why) 
     case 'V':
       return Request::kVersion;
     default:
-      why = Complaint(found, argv);
+      why = ComplaintOf(found, argv);
       return Request::kBad;
   }
 }
 
 }  // namespace
+
+std::string ComplaintOf(int found, char** argv) {
+  const std::string given = argv[optind - 1];
+  if (found == ':') return Quote(given) + " needs a value";
+  if (given.starts_with("--")) return "unknown option or needless value: " + Quote(given);
+  return "unknown option " + Quote(std::string("-") + static_cast<char>(optopt));
+}
 
 Request ParseOptions(int argc, char** argv, Options& options, std::string& why) {
   optind = 0;  // Starts afresh, also when called twice.

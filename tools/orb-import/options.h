@@ -25,6 +25,10 @@ enum class Request { kImport, kHelp, kVersion, kBad };
 /// Reads the command line. For kBad, `why` says what is wrong with it.
 Request ParseOptions(int argc, char** argv, Options& options, std::string& why);
 
+/// What is wrong with an option that getopt_long() did not take, for the user: `found` is ':' or
+/// '?' as it said, which it does when its short options begin with ':'.
+std::string ComplaintOf(int found, char** argv);
+
 extern const char kHelpText[];
 
 }  // namespace orbimport

@@ -27,7 +27,8 @@ class JsonLine {
 
  private:
   JsonLine& Raw(const char* key, const std::string& value) {
-    text_ += (text_.empty() ? "" : ",") + JsonText(key) + ":" + value;
+    if (!text_.empty()) text_ += ',';
+    text_ += JsonText(key) + ':' + value;
     return *this;
   }
 

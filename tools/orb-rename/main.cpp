@@ -9,19 +9,25 @@
 #include <utility>
 #include <vector>
 
+#include "options.h"
 #include "shots.h"
 #include "text.h"
 
 namespace orbimport {
 namespace {
 
-constexpr char kHelpText[] =
-    R"(Usage: orb-rename [-n] PHOTO NAME
+constexpr char kRenameHelp[] =
+    R"(Usage: orb-rename [options] PHOTO NAME
 
 Gives a photo another name in its folder, together with all that belongs to it:
 IMG_1.CR2, IMG_1.JPG and IMG_1.CR2.xmp become NAME.CR2, NAME.JPG and NAME.CR2.xmp.
 Locks and times stay, and nothing is ever replaced: when another photo has the name,
-all files keep those that they have. -n (--dry-run) only prints what would be done.
+all files keep those that they have.
+
+Options:
+  -n, --dry-run         print what would be done and do nothing
+  -h, --help            print this text
+  -V, --version         print the version
 
 Exit status: 0 all done, 1 nothing was renamed, 2 wrong usage.
 )";
@@ -30,6 +36,7 @@ enum ExitCode : int { kDone = 0, kFailed = 1, kUsage = 2 };
 
 constexpr option kLongOptions[] = {{"dry-run", no_argument, nullptr, 'n'},
                                    {"help", no_argument, nullptr, 'h'},
+                                   {"version", no_argument, nullptr, 'V'},
                                    {nullptr, 0, nullptr, 0}};
 
 using NewNames = std::vector<std::pair<std::string, std::string>>;  // From, to.
@@ -94,11 +101,14 @@ int Run(const std::string& path, const std::string& name, bool dryRun) {
   return kDone;
 }
 
+int Print(const char* text) { return std::cout << text << std::flush ? kDone : kFailed; }
+
 int Main(int argc, char** argv) {
   bool dryRun = false;
-  for (int found; (found = getopt_long(argc, argv, "nh", kLongOptions, nullptr)) != -1;) {
-    if (found == '?') return kUsage;
-    if (found == 'h') return std::cout << kHelpText << std::flush ? kDone : kFailed;
+  for (int found; (found = getopt_long(argc, argv, ":nhV", kLongOptions, nullptr)) != -1;) {
+    if (found == 'h') return Print(kRenameHelp);
+    if (found == 'V') return Print("orb-rename " ORB_VERSION "\n");
+    if (found != 'n') return Complain(kUsage, ComplaintOf(found, argv));
     dryRun = true;
   }
   if (argc - optind != 2 || *argv[optind + 1] == '\0')

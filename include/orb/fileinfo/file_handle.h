@@ -73,7 +73,8 @@ class ORB_EXPORT COrbFileHandle : public COrbFilePath {
 
   /// Locks the item when `flags` has kOrbFileAttrLocked and unlocks it otherwise; other bits are
   /// ignored. kOrbErrNoSuchFile for an empty path, kOrbErrNotFound where nothing exists,
-  /// kOrbErrAccessDenied where the volume cannot carry the lock or the caller is not the owner.
+  /// kOrbErrAccessDenied where the volume cannot carry the lock or the caller is not the owner,
+  /// otherwise the code of what failed; the lock then stays as it was.
   OrbResult SetAttribute(unsigned int flags);
 
   /// Whether both paths are the same text without regard to case and to a trailing "/".
@@ -85,19 +86,21 @@ class ORB_EXPORT COrbFileHandle : public COrbFilePath {
   /// answer. Collects nothing, and may be called on different handles from several threads at once.
   unsigned int GetDriveType() const;
 
-  /// Times with a resolution of 1/65536 s. kOrbErrNoSuchFile when they cannot be collected; the
-  /// output is then untouched.
+  /// Times with a resolution of 1/65536 s. kOrbErrNoSuchFile when they cannot be collected,
+  /// kOrbErrNotFound for a null `time`; the output is untouched on failure.
   OrbResult GetCreateTime(COrbTime* time) const;
   OrbResult GetUpdateTime(COrbTime* time) const;
   /// All zero when it cannot be collected.
   UTCDateTime GetUpdateTime() const;
   /// The time of the last access, with a resolution of 100 ns, read now and never kept.
-  /// kOrbErrNoSuchFile for an empty path, kOrbErrNotFound where nothing exists.
+  /// kOrbErrNoSuchFile for an empty path, kOrbErrNotFound where nothing exists and for a null
+  /// `time`, otherwise the code of what failed.
   OrbResult GetAccessTime(COrbTime* time) const;
 
   /// Set the item's times to whole seconds; what was collected stays as it was until Update().
   /// kOrbErrNoSuchFile for an empty path, kOrbErrNotFound where nothing exists, kOrbErrAccessDenied
-  /// for a locked item and where the volume or the caller's rights do not allow it.
+  /// for a locked item and where the volume or the caller's rights do not allow it, otherwise the
+  /// code of what failed; the item's time then stays.
   OrbResult SetCreateTime(const COrbTime& time);
   OrbResult SetUpdateTime(const COrbTime& time);
   /// Always kOrbErrNotSupported, and nothing changes.

@@ -6,6 +6,7 @@
 
 /// \file
 /// What may be done to an item, by what its handle has collected; false where nothing exists.
+/// A handle that has not collected does so: threads that share one need the caller's own lock.
 
 /// Whether the item's volume is writable.
 ORB_EXPORT bool OrbIsDeletable(const COrbFileHandle& item);

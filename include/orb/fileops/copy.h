@@ -11,21 +11,29 @@
 /// Copies of items, and the joining of a folder and a name. Unless a form says otherwise, it copies
 /// a file, a link (as a link) or a folder with all it holds, with times, mode, attributes and lock,
 /// and an item that is at the destination already makes it fail with kOrbErrUnknown. A copied file
-/// is complete or absent; what the copy of a folder finished before a failure stays.
+/// is complete or absent; what the copy of a folder finished before a failure stays. Attributes
+/// that the destination cannot carry are left out; of an item with more than 64 KiB of attribute
+/// names, which the system does not list, only the creation time, the lock and the access control
+/// lists go along. Where the caller owns it, a file that is copied keeps its access time, but in
+/// OrbCopyFileEx(). Sockets, pipes and devices, also inside a folder, give kOrbErrAccessDenied.
 ///
 /// A form that removes what is at the destination looks at the source first: kOrbErrNotFound, and
 /// nothing is removed, when it is empty or not there; kOrbErrAccessDenied for one that cannot be
 /// read, and for a socket, pipe or device. Nor is anything removed when the destination
 /// is the source, one of its folders or something inside it, by its text or on disk:
-/// kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed; a folder may then have lost
-/// some of its content, unless something in it is locked.
+/// kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed. Of a folder nothing is
+/// removed when something inside is locked, a volume of its own or in a folder that the caller may
+/// not read or write to; after any other failure it may have lost some of its content.
 ///
-/// Every form may give kOrbErrAccessDenied for a source that is not valid UTF-8, and forms that
-/// take a folder and a name kOrbErrInvalidName for a name that is, or whose last component is, "",
-/// "." or "..", and kOrbErrEmptyPath for an empty folder; a "/" at the end of a name is left out.
-/// `name` is null for the source's own where it is a pointer. `result` may be null; it receives the
-/// destination on success alone. All other failures have the codes kOrbErrNotFound,
-/// kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrOutOfMemory and kOrbErrUnknown.
+/// Every form may give kOrbErrAccessDenied for a source that is not valid UTF-8. Forms that take a
+/// folder and a name give kOrbErrEmptyPath for an empty folder, and kOrbErrInvalidName when either
+/// is not valid UTF-8 and for a name that is, or whose last component is, "", "." or ".."; a "/" at
+/// the end of a name is left out, and one inside leads into another folder. `name` is null for the
+/// source's own where it is a pointer. `result` may be null; it receives the destination on success
+/// alone. All other failures have the codes kOrbErrNotFound, kOrbErrAccessDenied, kOrbErrDiskFull,
+/// kOrbErrOutOfMemory and kOrbErrUnknown, the last also for a name that the volume does not take.
+///
+/// Everything here may be called from any thread.
 
 /// Joins a folder and a name with exactly one "/"; a name joined to an empty folder is the name
 /// alone. kOrbErrInvalidName for a text that is not UTF-8, kOrbErrNameTooLong when the joined text
@@ -57,14 +65,16 @@ ORB_EXPORT OrbResult OrbCopyFile(const COrbFilePath& source,
 /// when it is complete. When `progress` cancels, an older file is deleted as well, under the rules
 /// of OrbDeleteFile: a file that was reserved for the copy goes with it. While an older file grows,
 /// a process that is killed leaves it longer than it was. A source that is a link is read through
-/// it; a destination that is a link, is locked or is no regular file is refused with
-/// kOrbErrAccessDenied.
+/// it; a destination that is a link, a pipe or a device, or is locked, is refused with
+/// kOrbErrAccessDenied, and a folder in the place of either with kOrbErrUnknown.
 ///
-/// kOrbErrEmptyPath for an empty folder; the codes of OrbMakeFilePath; kOrbErrCanceled;
+/// kOrbErrEmptyPath for an empty folder; the codes of OrbMakeFilePath; kOrbErrInvalidName also for
+/// an empty name and one that ends in "/"; kOrbErrUnknown for "." and ".."; kOrbErrCanceled;
 /// kOrbErrSamePath when source and destination are one file, under whichever names;
 /// kOrbErrNotFound, kOrbErrAccessDenied, kOrbErrDiskFull, kOrbErrInvalidName, kOrbErrFileExists
-/// (somebody else made the destination meanwhile) and kOrbErrUnknown for what failed. An empty
-/// source makes an empty destination; one that does not exist makes nothing and gives 0.
+/// (somebody else made the destination meanwhile), kOrbErrOutOfMemory and kOrbErrUnknown for what
+/// failed. An empty source makes an empty destination; one that does not exist makes nothing and
+/// gives 0.
 ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
                                    const COrbFilePath& folder,
                                    const COrbStringData& name,
@@ -77,10 +87,10 @@ ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
 /// KiB that is written. When the copy fails or is cancelled the destination is deleted, unless
 /// `progress` itself throws: that passes on, with the files closed, and the destination stays.
 ///
-/// Before anything is changed: kOrbErrNotFound and kOrbErrAccessDenied, also for a destination that
-/// is locked, a link or no regular file; kOrbErrSamePath when both are one file, under whichever
-/// names; kOrbErrUnknown for a folder. After that: kOrbErrCanceled, or kOrbErrUnknown for whatever
-/// failed.
+/// Before anything is changed: kOrbErrNotFound, also for a path that is not valid UTF-8;
+/// kOrbErrAccessDenied, also for a destination that is locked, a link, a pipe or a device;
+/// kOrbErrSamePath when both are one file, under whichever names; kOrbErrUnknown for a folder.
+/// After that: kOrbErrCanceled, or kOrbErrUnknown for whatever failed.
 ORB_EXPORT OrbResult OrbCopyFileEx(const COrbFilePath& source,
                                    const COrbFilePath& destination,
                                    OrbProgressProc progress,

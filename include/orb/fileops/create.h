@@ -6,6 +6,9 @@
 #include <orb/result.h>
 #include <orb/strings/string_data.h>
 
+/// \file
+/// New items. Everything here may be called from any thread.
+
 /// Makes a folder, and the folders above it that are missing. `result` may be null; it receives the
 /// path on success alone. kOrbErrEmptyPath for an empty folder, which is never taken for the
 /// working directory; kOrbErrFileExists, kOrbErrAccessDenied, kOrbErrInvalidName,
@@ -17,7 +20,8 @@ ORB_EXPORT OrbResult OrbCreateFolder(const COrbFilePath& folder,
 
 /// Makes an empty file, in the place of a file that is there already; a link is replaced, not
 /// followed. `result`, which must not be null, receives the path on success alone. The codes of
-/// OrbCreateFolder; an existing item that cannot be replaced gives kOrbErrFileExists.
+/// OrbCreateFolder; an existing item that cannot be replaced gives kOrbErrFileExists, a missing
+/// folder kOrbErrAccessDenied.
 ORB_EXPORT OrbResult OrbCreateFile(const COrbFilePath& folder,
                                    const COrbStringData& name,
                                    COrbFilePath* result);

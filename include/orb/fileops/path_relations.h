@@ -7,7 +7,8 @@
 #include <orb/strings/string_data.h>
 
 /// \file
-/// How paths lie to each other, by their texts alone: the file system is not asked.
+/// How paths lie to each other, by their texts alone: the file system is not asked. Everything
+/// here may be called from any thread.
 
 /// Whether a is the same path as b or one of its ancestor folders, without regard to case.
 ORB_EXPORT bool OrbIsSubFolder(const COrbFilePath& a, const COrbFilePath& b);

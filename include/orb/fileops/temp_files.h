@@ -29,8 +29,12 @@ ORB_EXPORT void OrbClearProjectTempFolder();
 /// for null in the project's temporary folder, which must be the user's own and closed to others.
 /// The numbers go round and round, one for each name that the process has tried. Testing and making
 /// are one step: nobody else gets the same file, and nobody's file is emptied. `result`, which must
-/// not be null, receives the path on success alone. kOrbErrAccessDenied; kOrbErrDiskFull, also when
-/// all numbers are taken; kOrbErrEmptyPath for an empty folder; kOrbErrInvalidName.
+/// not be null, receives the path on success alone. kOrbErrAccessDenied, also for a folder that is
+/// not there, is locked or, the project's own, is somebody else's or open to others;
+/// kOrbErrDiskFull, also when all numbers are taken; kOrbErrEmptyPath for an empty folder;
+/// kOrbErrInvalidName for a folder or suffix that is not valid UTF-8 and for a suffix that is too
+/// long; either of the two for a suffix with a "/"; kOrbErrNotFound; kOrbErrNameTooLong;
+/// kOrbErrUnknown.
 ORB_EXPORT OrbResult OrbCreateTempFile(const COrbFilePath* folder, COrbFilePath* result);
 ORB_EXPORT OrbResult OrbCreateTempFile(const COrbFilePath* folder,
                                        COrbFilePath* result,

@@ -13,7 +13,7 @@
 /// bring it back. It is the trash of the item's volume or, where that has none, the user's home
 /// trash, by copy and removal if the item fits there. A link goes there itself. An item that cannot
 /// go there stays where it is; so do locked items, folders where a volume is mounted, and the
-/// trash.
+/// trash. Everything here may be called from any thread.
 
 /// Moves the items to the trash, in order; one that fails or whose path is empty does not stop the
 /// others. Always kOrbNoErr. The bool is not used.

@@ -7,7 +7,8 @@
 
 /// \file
 /// Links are followed; pipes and devices are refused with kOrbErrAccessDenied. What cannot be
-/// opened gives kOrbErrNotFound, kOrbErrAccessDenied or the code of what failed.
+/// opened gives kOrbErrNotFound, also for a path that is not valid UTF-8 or leads to a folder,
+/// kOrbErrAccessDenied or the code of what failed. Everything here may be called from any thread.
 
 /// Reads up to `size` bytes from the start of a file straight into the buffer. A file that is
 /// shorter fills only its own length; the rest of the buffer is untouched. kOrbErrUnknown when

@@ -19,7 +19,7 @@ class ORB_EXPORT COrbCriticalSection {
   void Leave() const { pthread_mutex_unlock(&mutex_); }
 
  private:
-  // Every text carries a lock: a constant saves making an attribute and calling pthread_mutex_init.
+  // Texts make many: a constant saves making an attribute and calling pthread_mutex_init.
   mutable pthread_mutex_t mutex_ = PTHREAD_RECURSIVE_MUTEX_INITIALIZER_NP;
 };
 

@@ -5,6 +5,7 @@
 #include <linux/fs.h>
 #include <linux/magic.h>
 #include <sys/ioctl.h>
+#include <sys/sysmacros.h>
 #include <sys/xattr.h>
 #include <unistd.h>
 
@@ -255,6 +256,17 @@ ItemKind KindOf(const StatusRecord& status) {
   if (S_ISREG(status.stx_mode)) return ItemKind::kFile;
   if (S_ISDIR(status.stx_mode)) return ItemKind::kFolder;
   return S_ISLNK(status.stx_mode) ? ItemKind::kLink : ItemKind::kOther;
+}
+
+std::uint64_t MountOf(const StatusRecord& status) {
+  if ((status.stx_mask & STATX_MNT_ID) != 0) return status.stx_mnt_id;
+  return makedev(status.stx_dev_major, status.stx_dev_minor);
+}
+
+bool StickyBitForbids(const StatusRecord& folder, const StatusRecord& item) {
+  const uid_t user = ::geteuid();
+  const bool isSticky = (folder.stx_mode & S_ISVTX) != 0;
+  return isSticky && user != 0 && user != item.stx_uid && user != folder.stx_uid;
 }
 
 Timestamp ModificationTime(const StatusRecord& status) { return FromKernel(status.stx_mtime); }

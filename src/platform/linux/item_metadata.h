@@ -6,6 +6,7 @@
 #include <sys/types.h>
 
 #include <cstddef>
+#include <cstdint>
 #include <optional>
 
 #include "platform/error.h"
@@ -44,6 +45,10 @@ using StatusRecord = struct statx;
 
 Result<StatusRecord> ReadStatus(const ItemRef& item);
 ItemKind KindOf(const StatusRecord& status);
+/// The number of the mount or, where the kernel tells none, of the device.
+std::uint64_t MountOf(const StatusRecord& status);
+/// In a folder with the sticky bit the owner of the item or of the folder may take it away.
+bool StickyBitForbids(const StatusRecord& folder, const StatusRecord& item);
 Timestamp ModificationTime(const StatusRecord& status);
 Timestamp LastAccessTime(const StatusRecord& status);
 
