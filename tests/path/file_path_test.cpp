@@ -120,21 +120,4 @@ TEST(FileReference, NeedsSomethingAtThePath) {
   }
 }
 
-TEST(FileReference, GivesPathsOfUpTo2047Bytes) {
-  const TempFolder folder;
-  std::string deep = folder.Path();
-  while (deep.size() + 201 < 2046) deep += "/" + std::string(200, 'd');
-  fs::create_directories(deep);
-  for (const std::size_t length : {std::size_t{2047}, std::size_t{2048}}) {
-    const std::string path = deep + "/" + std::string(length - deep.size() - 1, 'f');
-    std::ofstream(path) << 'x';
-    FSRef reference;
-    ASSERT_EQ(PathOf(path).GetFSRef(&reference), kOrbNoErr);
-    COrbStringData text = S("old");
-    const bool fits = length == 2047;
-    EXPECT_EQ(OrbFSRefToFullPath(reference, &text), fits ? kOrbNoErr : kOrbErrNoSuchFile);
-    EXPECT_EQ(Text(text), fits ? path : "old");
-  }
-}
-
 }  // namespace
