@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: MIT
 #include <gtest/gtest.h>
 #include <orb/records/geometry.h>
-#include <sys/resource.h>
 
 #include <climits>
 #include <cstring>
+#include <optional>
+#include <utility>
+
+#include "support/resource_limit.h"
 
 namespace {
 
@@ -17,31 +20,21 @@ TEST(Rect, MeasuresTheDifferenceOfItsCorners) {
 }
 
 TEST(Buffer, OwnsWhatItAllocatesAndCopies) {
-  COrbBuffer buffer;
+  COrbBuffer buffer, empty;
   std::memset(buffer.Allocate(100), 7, 100);
   const COrbBuffer copy(buffer);
   const void* const block = buffer.Allocate(16);
-  EXPECT_EQ(buffer.GetSize(), 16U);
-  const COrbBuffer& self = buffer;
-  buffer = self;
+  EXPECT_EQ(&(buffer = std::as_const(buffer)), &buffer);
   EXPECT_EQ(buffer.GetBuffer(), block);
+  EXPECT_EQ(buffer.GetSize(), 16U);
   buffer = copy;
   EXPECT_EQ(buffer.GetSize(), 100U);
   EXPECT_NE(buffer.GetBuffer(), copy.GetBuffer());
   EXPECT_EQ(std::memcmp(buffer.GetBuffer(), copy.GetBuffer(), 100), 0);
-  buffer.Free();
-  buffer.Free();
-  EXPECT_EQ(buffer.GetBuffer(), nullptr);
-}
-
-TEST(Buffer, OfNoBytesHasNoBlockInItsCopies) {
-  COrbBuffer empty, target;
   empty.Allocate(0);
-  target.Allocate(8);
-  target = empty;
-  EXPECT_EQ(target.data, nullptr);
-  EXPECT_EQ(target.size, 0U);
-  EXPECT_EQ(COrbBuffer(empty).data, nullptr);
+  buffer = empty;
+  EXPECT_TRUE(buffer.data == nullptr && buffer.size == 0 && COrbBuffer(empty).data == nullptr);
+  buffer.Free();
 }
 
 TEST(Buffer, IsEmptyWhereMemoryRunsOut) {
@@ -49,22 +42,18 @@ TEST(Buffer, IsEmptyWhereMemoryRunsOut) {
   GTEST_SKIP() << "sanitizers need the address space";
 #endif
   constexpr unsigned int kLarge = 1U << 30;
-  COrbBuffer large, target;
+  COrbBuffer large, target, fresh;
   ASSERT_NE(large.Allocate(kLarge), nullptr);
   target.Allocate(16);
-  rlimit old = {};
-  getrlimit(RLIMIT_AS, &old);
-  const rlimit tight = {kLarge, old.rlim_max};
-  setrlimit(RLIMIT_AS, &tight);
+  fresh.Allocate(16);
+  std::optional<orb::test::ResourceLimit> tight(std::in_place, RLIMIT_AS, kLarge);
   const COrbBuffer copy(large);
   target = large;
-  COrbBuffer fresh;
-  const void* const block = fresh.Allocate(kLarge);
-  setrlimit(RLIMIT_AS, &old);
-  EXPECT_EQ(block, nullptr);
-  EXPECT_TRUE(copy.data == nullptr && copy.size == 0);
-  EXPECT_TRUE(target.data == nullptr && target.size == 0);
-  EXPECT_TRUE(fresh.data == nullptr && fresh.size == 0);
+  fresh.Allocate(kLarge);
+  tight.reset();
+  for (const COrbBuffer* buffer : {&copy, &std::as_const(target), &std::as_const(fresh)}) {
+    EXPECT_TRUE(buffer->data == nullptr && buffer->size == 0);
+  }
 }
 
 }  // namespace

@@ -4,7 +4,6 @@
 #include <orb/records/output.h>
 
 #include <utility>
-#include <vector>
 
 #include "support/texts.h"
 
@@ -22,20 +21,6 @@ TEST(Task, CopiesItsTrimByTheRuleOfThatClass) {
   }
 }
 
-TEST(Rename, GoesBackToTheOriginalNames) {
-  COrbRenameData rename;
-  rename.renameValue2 = rename.renameValue6 = 77;
-  for (int i = 0; i < 2; ++i) {
-    rename.SetToOriginal();
-    const std::vector<int> values = {rename.renameValue2,
-                                     rename.renameValue3,
-                                     rename.renameValue4,
-                                     rename.renameValue5,
-                                     rename.renameValue6};
-    EXPECT_EQ(values, std::vector({77, 3, 3, 4, 77}));
-  }
-}
-
 TEST(Metadata, IsOrderedByItsKeysAndLookedUpWithoutATrace) {
   const auto key = [](int value) { return static_cast<eOrbDBMetaData>(value); };
   COrbDBMetaData data;
@@ -46,9 +31,6 @@ TEST(Metadata, IsOrderedByItsKeysAndLookedUpWithoutATrace) {
   EXPECT_TRUE(HasNoValue(data.GetStringData(key(2))));
   EXPECT_EQ(Text(data.GetStringData(key(3))), "three");
   EXPECT_EQ(data.entries.size(), 2U);
-  COrbIPTCData texts;
-  texts.items[0x80000000U], texts.items[1];
-  EXPECT_EQ(texts.items.begin()->first, 1U);
 }
 
 }  // namespace

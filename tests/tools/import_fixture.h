@@ -7,12 +7,15 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <chrono>
+#include <csignal>
 #include <ctime>
 #include <filesystem>
 #include <functional>
 #include <map>
 #include <sstream>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "clearing.h"
@@ -25,7 +28,12 @@ namespace fs = std::filesystem;
 using orb::test::ReadAll;
 using orb::test::TempFolder;
 
+/// Files by their paths below a folder, each with its bytes.
+using Files = std::map<std::string, std::string>;
+
 constexpr std::time_t kMayFirst = 1714557600;  // 2024-05-01 10:00:00 UTC.
+const std::string kDay = "2024/2024-05-01/";
+constexpr char kJournal[] = ".orb-import.journal";
 
 inline void SetTime(const std::string& path, std::time_t seconds) {
   const timespec times[2] = {{seconds, 250'000'000}, {seconds, 250'000'000}};
@@ -45,6 +53,15 @@ inline std::string Bytes(std::size_t count, unsigned seed) {
   return bytes;
 }
 
+inline bool Says(const std::string& said, const std::string& what) {
+  return said.find(what) != std::string::npos;
+}
+
+/// The journal's line for a photo of kMayFirst.
+inline std::string PromiseOf(const std::string& path, std::size_t size) {
+  return FormatPromise({path, size, std::uint64_t{2082844800} + kMayFirst});
+}
+
 struct Ended {
   int exitCode = -1;  // -1 for a process that a signal killed.
   std::string out, err;
@@ -56,49 +73,51 @@ class Import : public testing::Test {
   std::string Card(const std::string& name) const { return folder_ / ("card/" + name); }
   std::string Photos(const std::string& name = "") const { return folder_ / ("photos/" + name); }
 
-  std::string Put(const std::string& name, const std::string& bytes, std::time_t time = kMayFirst) {
-    const std::string path = Card(name);
-    fs::create_directories(fs::path(path).parent_path());
-    folder_.Write("card/" + name, bytes);
-    SetTime(path, time);
-    return path;
+  /// Files below the folder of all.
+  void Put(const Files& files, std::time_t time = kMayFirst) {
+    for (const auto& [name, bytes] : files) {
+      fs::create_directories(fs::path(folder_ / name).parent_path());
+      SetTime(folder_.Write(name, bytes), time);
+    }
+  }
+  void PutOnCard(const Files& files) {
+    for (const auto& [name, bytes] : files) Put({{"card/" + name, bytes}});
   }
 
-  pid_t Start(
-      std::vector<std::string> args, const std::function<void()>& prepare = [] {}) {
-    args.insert(args.begin(), ORB_IMPORT);
-    std::vector<char*> argv;
-    for (std::string& arg : args) argv.push_back(arg.data());
-    argv.push_back(nullptr);
+  /// For a shell in the folder of all.
+  std::string Command(const std::string& args) const {
+    return "cd " + folder_.Path() + " && export TZ=UTC0 XDG_DATA_HOME=$PWD/data && exec " +
+           ORB_IMPORT + " " + args;
+  }
+  pid_t Start(const std::string& args) const {
+    const std::string command = Command(args) + " >out 2>err";
     const pid_t child = ::fork();
     if (child != 0) return child;
-    ::setenv("TZ", "UTC0", 1);
-    ::setenv("XDG_DATA_HOME", (folder_ / "data").c_str(), 1);  // Where the home trash is.
-    constexpr int kFlags = O_WRONLY | O_CREAT | O_TRUNC;
-    ::dup2(::open((folder_ / "out").c_str(), kFlags, 0644), STDOUT_FILENO);
-    ::dup2(::open((folder_ / "err").c_str(), kFlags, 0644), STDERR_FILENO);
-    prepare();
-    ::execv(ORB_IMPORT, argv.data());
+    ::execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
     ::_exit(127);
   }
-
-  Ended Wait(pid_t child) {
+  Ended Wait(pid_t child) const {
     int status = 0;
     EXPECT_EQ(::waitpid(child, &status, 0), child);
-    return {WIFEXITED(status) ? WEXITSTATUS(status) : -1,
-            ReadAll(folder_ / "out"),
-            ReadAll(folder_ / "err")};
+    const int code = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return {code, ReadAll(folder_ / "out"), ReadAll(folder_ / "err")};
+  }
+  Ended Run(const std::string& options = "") const { return Wait(Start(options + " card photos")); }
+  /// Killed so long after its journal was there, which stands from before the first file is made
+  /// until all are whole, unless it has ended by then.
+  Ended RunAndKill(const std::string& options, unsigned microseconds) const {
+    const pid_t child = Start(options + " card photos");
+    siginfo_t ended{};
+    while (!fs::exists(Photos(kJournal)) && ended.si_pid == 0) {
+      ::waitid(P_PID, static_cast<id_t>(child), &ended, WEXITED | WNOHANG | WNOWAIT);
+    }
+    std::this_thread::sleep_for(std::chrono::microseconds(microseconds));
+    ::kill(child, SIGKILL);
+    return Wait(child);
   }
 
-  Ended Run(const std::vector<std::string>& options = {}) {
-    std::vector<std::string> args = options;
-    args.insert(args.end(), {folder_ / "card", folder_ / "photos"});
-    return Wait(Start(args));
-  }
-
-  /// What is below the destination, or another folder: the files' paths, each with its bytes.
-  std::map<std::string, std::string> Tree(const std::string& folder = "photos") const {
-    std::map<std::string, std::string> tree;
+  Files Tree(const std::string& folder = "photos") const {
+    Files tree;
     const std::string root = folder_ / folder;
     if (!fs::exists(root)) return tree;
     for (const auto& entry : fs::recursive_directory_iterator(root)) {
@@ -110,16 +129,6 @@ class Import : public testing::Test {
 
   TempFolder folder_;
 };
-
-using Files = std::map<std::string, std::string>;
-
-/// The journal stands from before the first file is made until all are whole.
-inline void WaitUntilUnderWay(pid_t child, const std::string& journal) {
-  siginfo_t ended{};
-  while (!fs::exists(journal) && ended.si_pid == 0) {
-    if (::waitid(P_PID, static_cast<id_t>(child), &ended, WEXITED | WNOHANG | WNOWAIT) != 0) return;
-  }
-}
 
 /// Runs the parts of the tool with something happening between the plan and its execution.
 class Meanwhile : public Import {

@@ -6,35 +6,26 @@
 namespace orbimport {
 namespace {
 
-COrbTime Local(unsigned year, unsigned month, unsigned day) {
+std::string Expanded(const Layout& layout, unsigned year, unsigned month, unsigned day) {
   COrbTime time;
   time.Initialize(year, month, day, 7, 8, 9, 0, 0, 0);
-  return time;
+  return layout.Expand(time);
 }
 
 TEST(Layout, ExpandsTheLocalTime) {
-  const struct {
-    const char* pattern;
-    const char* path;
-  } kCases[] = {
-      {"%Y/%Y-%m-%d", "2024/2024-03-01"},
-      {"%y%m%d", "240301"},
-      {"%Y/%j", "2024/061"},  // A leap year.
-      {"%H.%M.%S", "07.08.09"},
-      {"100%%/a b", "100%/a b"},
-      {"", ""},
-  };
-  for (const auto& c : kCases) {
-    Layout layout;
-    std::string why;
-    ASSERT_TRUE(layout.Set(c.pattern, why)) << c.pattern;
-    EXPECT_EQ(layout.Expand(Local(2024, 3, 1)), c.path);
-  }
-  EXPECT_EQ(Layout().Expand(Local(1999, 12, 31)), "1999/1999-12-31");
-  Layout day;
+  Layout layout;
+  EXPECT_EQ(Expanded(layout, 1999, 12, 31), "1999/1999-12-31");
   std::string why;
-  ASSERT_TRUE(day.Set("%j", why));
-  EXPECT_EQ(day.Expand(Local(2023, 12, 31)), "365");
+  for (const auto& [pattern, path] : {std::pair("%Y/%Y-%m-%d", "2024/2024-03-01"),
+                                      {"%y%m%d", "240301"},
+                                      {"%H.%M.%S", "07.08.09"},
+                                      {"100%%/a b", "100%/a b"},
+                                      {"", ""},
+                                      {"%j", "061"}}) {  // A leap year.
+    ASSERT_TRUE(layout.Set(pattern, why)) << pattern;
+    EXPECT_EQ(Expanded(layout, 2024, 3, 1), path);
+  }
+  EXPECT_EQ(Expanded(layout, 2023, 12, 31), "365");
 }
 
 TEST(Layout, NeverLeadsOutOfTheDestination) {
@@ -44,7 +35,7 @@ TEST(Layout, NeverLeadsOutOfTheDestination) {
     std::string why;
     EXPECT_FALSE(layout.Set(bad, why)) << bad;
     EXPECT_NE(why, "");
-    EXPECT_EQ(layout.Expand(Local(2024, 3, 1)), "2024/2024-03-01");  // As before.
+    EXPECT_EQ(Expanded(layout, 2024, 3, 1), "2024/2024-03-01");  // As before.
   }
 }
 

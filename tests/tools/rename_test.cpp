@@ -19,11 +19,7 @@ TEST(Rename, TakesAWholeShotAlongOrNothing) {
       "I.CR2", "I.CR2.xmp", "I.JPG", "i.wav", "I_1.JPG", "I.exe", "K.JPG", "k2.xmp"};
   const Names renamed = {
       "A.CR2", "A.CR2.xmp", "A.JPG", "A.wav", "I_1.JPG", "I.exe", "K.JPG", "k2.xmp"};
-  const struct {
-    const char* args;
-    int exitCode;
-    const Names& after;
-  } kCases[] = {
+  const std::tuple<const char*, int, const Names&> kCases[] = {
       {"I.CR2 A", 0, renamed},
       {"$PWD/i.wav A.wav", 0, renamed},
       {"-n I.CR2 A", 0, there},
@@ -37,26 +33,25 @@ TEST(Rename, TakesAWholeShotAlongOrNothing) {
       {"I.JPG ''", 2, there},
       {"I.JPG", 2, there},
   };
-  for (const auto& c : kCases) {
-    SCOPED_TRACE(c.args);
+  for (const auto& [args, exitCode, after] : kCases) {
+    SCOPED_TRACE(args);
     const orb::test::TempFolder folder;
     for (const std::string& name : there) folder.Write(name, name);
     fs::create_directory(folder / "B.wav");
-    const COrbFilePath locked = OrbPath(folder / "I.JPG");
-    const bool locks = COrbFileHandle(locked).SetAttribute(kOrbFileAttrLocked) < kOrbErrFirst;
-    const std::string command = "cd " + folder.Path() + " && " + ORB_RENAME + " " + c.args;
-    const int status = std::system((command + " >/dev/null 2>&1").c_str());
-    EXPECT_EQ(WEXITSTATUS(status), c.exitCode);
+    COrbFileHandle locked(OrbPath(folder / "I.JPG"));
+    const bool locks = locked.SetAttribute(kOrbFileAttrLocked) < kOrbErrFirst;
+    const std::string command = "cd " + folder.Path() + " && " + ORB_RENAME + " " + args;
+    EXPECT_EQ(WEXITSTATUS(std::system((command + " >/dev/null 2>&1").c_str())), exitCode);
     Names names;
     for (const auto& entry : fs::directory_iterator(folder.Path())) {
-      const std::string name = entry.path().filename().string();
+      const std::string name = entry.path().filename();
       if (!entry.is_directory()) names.insert(name);
-      COrbFileHandle file(OrbPath(entry.path().string()));
+      COrbFileHandle file(OrbPath(entry.path()));
       EXPECT_EQ((file.GetAttribute() & kOrbFileAttrLocked) != 0,
                 locks && (name == "I.JPG" || name == "A.JPG"));
       file.SetAttribute(0);
     }
-    EXPECT_EQ(names, c.after);
+    EXPECT_EQ(names, after);
   }
 }
 

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include <algorithm>
-#include <csignal>
-#include <thread>
+#include <fstream>
 
 #include "import_fixture.h"
 #include "support/environment.h"
@@ -11,12 +10,7 @@
 namespace orbimport {
 namespace {
 
-using orb::test::MountTmpfs;
 using orb::test::RunWithPrivateMounts;
-
-bool Says(const std::string& said, const std::string& what) {
-  return said.find(what) != std::string::npos;
-}
 
 void FlipByte(const std::string& path, std::streamoff at) {
   std::fstream file(path, std::ios::in | std::ios::out | std::ios::binary);
@@ -26,23 +20,27 @@ void FlipByte(const std::string& path, std::streamoff at) {
   file.put(byte);
 }
 
-constexpr char kDay[] = "2024/2024-05-01/";
+/// For the body of RunWithPrivateMounts.
+void NeedShell(const std::string& folder, const std::string& command) {
+  if (std::system(("cd " + folder + " && " + command).c_str()) != 0) {
+    ::_exit(orb::test::kImpossibleStatus);
+  }
+}
 
 TEST_F(Import, ReadsWhatReachedTheDeviceAndNotWhatMemoryKeeps) {
   const std::string photo = Bytes(3'000'001, 1);
-  const std::string source = Put("a.jpg", photo);
-  const std::string image = folder_ / "image", volume = folder_ / "volume";
+  const std::string source = folder_.Write("a.jpg", photo);
+  const std::string image = folder_ / "image", copy = folder_ / "volume/a.jpg";
+  const auto goOn = [] { return true; };
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
-    const std::string mount = "cd " + folder_.Path() +
-                              " && truncate -s 24M image && mkdir volume && " +
-                              "mkfs.ext4 -q -m 0 image && mount -o loop image volume";
-    if (std::system(mount.c_str()) != 0) ::_exit(orb::test::kImpossibleStatus);
-    const std::string copy = volume + "/a.jpg";
+    NeedShell(folder_.Path(),
+              "truncate -s 24M image && mkdir volume && mkfs.ext4 -q -m 0 image && "
+              "mount -o loop image volume");
     fs::copy_file(source, copy);
-    EXPECT_EQ(CompareOnDevice(source, copy, [] { return true; }), kOrbNoErr);
+    EXPECT_EQ(CompareOnDevice(source, copy, goOn), kOrbNoErr);
     EXPECT_EQ(CompareOnDevice(source, copy, [] { return false; }), kOrbErrCanceled);
     std::ofstream(copy, std::ios::app | std::ios::binary) << "x";
-    EXPECT_EQ(CompareOnDevice(source, copy, [] { return true; }), OrbResult{kImportErrCopyDiffers});
+    EXPECT_EQ(CompareOnDevice(source, copy, goOn), OrbResult{kImportErrCopyDiffers});
     fs::copy_file(source, copy, fs::copy_options::overwrite_existing);
     // The flush is over when it is asked to go on; now the medium loses a bit.
     const auto spoil = [&] {
@@ -54,14 +52,12 @@ TEST_F(Import, ReadsWhatReachedTheDeviceAndNotWhatMemoryKeeps) {
     };
     EXPECT_EQ(ReadAll(copy), photo);  // Memory keeps it.
     EXPECT_EQ(CompareOnDevice(source, copy, spoil), OrbResult{kImportErrCopyDiffers});
-    ::umount2(volume.c_str(), MNT_DETACH);
+    ::umount2((folder_ / "volume").c_str(), MNT_DETACH);
   }));
 }
 
 TEST_F(Meanwhile, ACopyThatDiffersGoesAndItsShotStays) {
-  Put("I.CR2", "raw");
-  Put("I.JPG", "jpeg");
-  Put("K.JPG", "kept");
+  PutOnCard({{"I.CR2", "raw"}, {"I.JPG", "jpeg"}, {"K.JPG", "kept"}});
   options_.verify = options_.move = true;
   compare_ = [](const std::string& source, const std::string& copy, const auto& goOn) {
     if (copy.ends_with("I.JPG")) FlipByte(copy, 2);
@@ -75,25 +71,17 @@ TEST_F(Meanwhile, ACopyThatDiffersGoesAndItsShotStays) {
 }
 
 TEST_F(Import, TakesFromTheCardOnlyWhatIsSafeAndGivesItBack) {
-  const Files card = {{"1/I.CR2", Bytes(100'000, 1)},
-                      {"1/I.JPG", "jpeg"},
-                      {"1/i.xmp", "x"},
-                      {"2/I.JPG", "other jpeg"},
-                      {"2/\u00e9 100%\n.jpg", ""}};
-  for (const auto& [name, bytes] : card) Put(name, bytes);
-  fs::create_directories(Photos(kDay));
-  folder_.Write(std::string("photos/") + kDay + "here.jpg", "same size");
-  SetTime(Photos(kDay) + "here.jpg", kMayFirst);
-  fs::copy(Photos(kDay) + "here.jpg", Photos(kDay) + "equal.jpg");
-  SetTime(Photos(kDay) + "equal.jpg", kMayFirst);
-  Put("here.jpg", "SAME SIZE");  // By size and time it is there already, by its bytes it is not.
-  Put("equal.jpg", "same size");
-  const Ended ended = Run({"--move", "--json"});
+  const std::string raw = Bytes(100'000, 1);
+  PutOnCard({{"1/I.CR2", raw}, {"1/I.JPG", "jpeg"}, {"1/i.xmp", "x"}});
+  PutOnCard({{"2/I.JPG", "other jpeg"}, {"2/\u00e9 100%\n.jpg", ""}});
+  // Both are there already by size and time, one by its bytes as well.
+  Put({{"photos/" + kDay + "here.jpg", "same size"}, {"photos/" + kDay + "equal.jpg", "equal"}});
+  PutOnCard({{"here.jpg", "SAME SIZE"}, {"equal.jpg", "equal"}});
+  const Ended ended = Run("--move --json");
   EXPECT_EQ(ended.exitCode, 1);
   EXPECT_TRUE(Says(ended.err, "kImportErrPresentDiffers " + Card("here.jpg"))) << ended.err;
   EXPECT_TRUE(Says(ended.err, "Put into the trash: 6 files")) << ended.err;
-  EXPECT_TRUE(Says(ended.out, R"({"status":"trashed","source":")" + Card("equal.jpg")))
-      << ended.out;
+  EXPECT_TRUE(Says(ended.out, R"({"status":"trashed","source":")" + Card("equal.jpg")));
   EXPECT_EQ(Tree("card"), (Files{{"here.jpg", "SAME SIZE"}}));
   EXPECT_EQ(ReadAll(Photos(kDay) + "I_1.JPG"), "other jpeg");
   if (std::system("command -v trash-restore >/dev/null") != 0) GTEST_SKIP() << "no trash-cli";
@@ -101,36 +89,28 @@ TEST_F(Import, TakesFromTheCardOnlyWhatIsSafeAndGivesItBack) {
   const std::string restore = "cd " + folder_.Path() + "/card && for name in 1/I.CR2 2/I.JPG; do " +
                               "echo 0 | trash-restore $PWD/$name >/dev/null; done";
   EXPECT_EQ(std::system(restore.c_str()), 0);
-  EXPECT_EQ(
-      Tree("card"),
-      (Files{
-          {"here.jpg", "SAME SIZE"}, {"1/I.CR2", Bytes(100'000, 1)}, {"2/I.JPG", "other jpeg"}}));
+  EXPECT_TRUE(Tree("card") ==
+              (Files{{"here.jpg", "SAME SIZE"}, {"1/I.CR2", raw}, {"2/I.JPG", "other jpeg"}}));
 }
 
 TEST_F(Import, NeverTakesTheOnlyCopy) {
-  const std::string place = Put(std::string("in/") + kDay + "a.jpg", "a");
-  Put("in/linked.jpg", "b");
-  fs::create_hard_link(Card("in/linked.jpg"), Card(std::string("in/") + kDay + "linked.jpg"));
   // What is to be imported lies where it would go.
-  const auto import = [&](const std::string& source) {
-    return Wait(Start({"--move", "--verbose", source, Card("in")}));
-  };
-  const Ended ended = import(Card("in/2024"));
+  PutOnCard({{"in/" + kDay + "a.jpg", "a"}, {"in/linked.jpg", "b"}});
+  fs::create_hard_link(Card("in/linked.jpg"), Card("in/" + kDay + "linked.jpg"));
+  const Files before = Tree("card");
+  const Ended ended = Wait(Start("--move --verbose card/in/2024 card/in"));
   EXPECT_EQ(ended.exitCode, 0) << ended.err;
   EXPECT_TRUE(Says(ended.out, "left in SOURCE: 2 files")) << ended.out;
-  EXPECT_EQ(ReadAll(place), "a");
-  EXPECT_EQ(Tree("card").size(), 3u);
+  EXPECT_EQ(Tree("card"), before);
   EXPECT_FALSE(fs::exists(folder_ / "data"));
 }
 
 TEST_F(Import, KeepsTheShotOfAFileThatTheTrashDoesNotTake) {
-  Put("I.CR2", "raw");
-  Put("I.JPG", "jpeg");
-  Put("J.JPG", "free");
-  if (COrbFileHandle(OrbPath(Card("I.JPG"))).SetAttribute(kOrbFileAttrLocked) >= kOrbErrFirst)
-    GTEST_SKIP() << "no locks here";
-  const Ended ended = Run({"--move"});
-  COrbFileHandle(OrbPath(Card("I.JPG"))).SetAttribute(0);
+  PutOnCard({{"I.CR2", "raw"}, {"I.JPG", "jpeg"}, {"J.JPG", "free"}});
+  COrbFileHandle locked(OrbPath(Card("I.JPG")));
+  if (locked.SetAttribute(kOrbFileAttrLocked) >= kOrbErrFirst) GTEST_SKIP() << "no locks here";
+  const Ended ended = Run("--move");
+  locked.SetAttribute(0);
   EXPECT_EQ(ended.exitCode, 1);
   EXPECT_TRUE(Says(ended.err, "kImportErrNotTrashed " + Card("I.JPG"))) << ended.err;
   EXPECT_EQ(Tree("card"), (Files{{"I.CR2", "raw"}, {"I.JPG", "jpeg"}}));
@@ -146,26 +126,21 @@ TEST_F(Import, APhotoIsAlwaysInOnePlaceWhenAMoveIsKilled) {
   }
   int kills = 0;
   for (unsigned round = 0; round < 3; ++round) {
-    for (const auto& [name, bytes] : card) Put(name, bytes);
+    PutOnCard(card);
     Ended ended;
     for (unsigned i = 0; i < 30 && ended.exitCode != 0; ++i) {
-      const pid_t child = Start({"--move", folder_ / "card", folder_ / "photos"});
-      WaitUntilUnderWay(child, Photos(".orb-import.journal"));
-      std::this_thread::sleep_for(std::chrono::microseconds((round * 30 + i) * 7919 % 60000));
-      ::kill(child, SIGKILL);
-      ended = Wait(child);
+      ended = RunAndKill("--move", (round * 30 + i) * 7919 % 60000);
       kills += ended.exitCode == -1 ? 1 : 0;
+      const Files left = Tree("card"), photos = Tree(), trash = Tree("data/Trash/files");
       for (const auto& [name, bytes] : card) {
-        if (fs::exists(Card(name)) && ReadAll(Card(name)) == bytes) continue;
-        EXPECT_TRUE(ReadAll(Photos(kDay + name)) == bytes) << name;
+        if (left.contains(name) && left.at(name) == bytes) continue;
+        EXPECT_TRUE(photos.contains(kDay + name) && photos.at(kDay + name) == bytes) << name;
         // Under its own name or, after a kill in between, another one.
-        const Files trash = Tree("data/Trash/files");
-        EXPECT_TRUE(std::ranges::any_of(trash, [&expected = bytes](const auto& file) {
-          return file.second == expected;
-        })) << name;
+        const auto isIt = [&whole = bytes](const auto& file) { return file.second == whole; };
+        EXPECT_TRUE(std::ranges::any_of(trash, isIt)) << name;
       }
     }
-    EXPECT_EQ(Run({"--move"}).exitCode, 0);
+    EXPECT_EQ(Run("--move").exitCode, 0);
     EXPECT_EQ(Tree("card"), Files());
     EXPECT_EQ(Tree().size(), card.size());
     fs::remove_all(Photos());
@@ -187,39 +162,35 @@ TEST_F(Import, TellsAFullVolumeBeforeItWritesAnything) {
   for (const auto& c : kCases) {
     SCOPED_TRACE(c.what);
     fs::remove_all(Card(""));
+    PutOnCard({{"A.jpg", "small"}});
     for (std::size_t i = 0; i < c.files; ++i) {
-      Put("IMG_" + std::to_string(i) + ".JPG", Bytes(c.size, 1));
+      PutOnCard({{"IMG_" + std::to_string(i) + ".JPG", Bytes(c.size, 1)}});
     }
-    Put("A.jpg", "small");
     ORB_IN_CHILD(RunWithPrivateMounts([&] {
-      if (!MountTmpfs(Photos(), "size=1m")) ::_exit(orb::test::kImpossibleStatus);
+      NeedShell(folder_.Path(), "mkdir -p photos && mount -t tmpfs -o size=1m none photos");
       for (const char* const option : {"--dry-run", "--verify"}) {
-        const Ended ended = Run({option});
+        const Ended ended = Run(option);
         EXPECT_EQ(ended.exitCode, c.fits ? 0 : 1) << ended.err;
         EXPECT_EQ(Says(ended.err, "kOrbErrDiskFull " + folder_ / "photos"), !c.fits) << ended.err;
         EXPECT_TRUE(c.fits || fs::is_empty(Photos()));
       }
       if (c.fits) return;
-      const Ended filled = Run({"--fill"});
-      EXPECT_EQ(filled.exitCode, 1);
-      EXPECT_EQ(ReadAll(Photos(kDay) + "A.jpg"), "small") << filled.err;
+      EXPECT_EQ(Run("--fill").exitCode, 1);
+      EXPECT_EQ(ReadAll(Photos(kDay) + "A.jpg"), "small");
     }));
   }
 }
 
 TEST_F(Import, CountsTheRoomOfWhatAKilledImportLeft) {
   const std::string photo = Bytes(800'000, 1);
-  Put("a.jpg", photo);
+  PutOnCard({{"a.jpg", photo}});
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
-    if (!MountTmpfs(Photos(), "size=1m")) ::_exit(orb::test::kImpossibleStatus);
-    fs::create_directories(Photos(kDay));
-    folder_.Write(std::string("photos/") + kDay + "a.jpg", photo.substr(0, 600'000));
-    constexpr std::uint64_t kSeconds = kMayFirst + 2'082'844'800;  // Since 1904.
-    folder_.Write("photos/.orb-import.journal",
-                  FormatPromise({std::string(kDay) + "a.jpg", photo.size(), kSeconds}));
+    NeedShell(folder_.Path(), "mkdir photos && mount -t tmpfs -o size=1m none photos");
+    Put({{"photos/" + kDay + "a.jpg", photo.substr(0, 600'000)}}, kMayFirst + 5);
+    folder_.Write(std::string("photos/") + kJournal, PromiseOf(kDay + "a.jpg", photo.size()));
     const Ended ended = Run();
     EXPECT_EQ(ended.exitCode, 0) << ended.err;
-    EXPECT_TRUE(Tree() == (Files{{std::string(kDay) + "a.jpg", photo}}));
+    EXPECT_TRUE(Tree() == (Files{{kDay + "a.jpg", photo}}));
   }));
 }
 
