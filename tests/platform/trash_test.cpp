@@ -112,7 +112,8 @@ TEST_F(TrashTest, TakesALinkItselfAndFollowsThoseAbove) {
 }
 
 TEST_F(TrashTest, ListsTheSizesOfFolders) {
-  tree_.Make("data/Trash/directorysizes=5 6 gone\n3 4 kept%201\n, data/Trash/info/kept 1.trashinfo");
+  tree_.Make(
+      "data/Trash/directorysizes=5 6 gone\n3 4 kept%201\n, data/Trash/info/kept 1.trashinfo");
   tree_.Make("items/a trip/deep/, items/a trip/a.jpg=" + std::string(10'000, 'a'));
   ASSERT_TRUE(Put(Items() + "/a trip"));
   struct stat info, part;
