@@ -6,12 +6,12 @@
 namespace orb::test {
 namespace {
 
-OrbResult Append(const std::string& source,
+OrbResult Append(const std::string& from,
                  const std::string& folder,
                  const std::string& name,
                  Progress* progress = nullptr) {
   const auto call = progress != nullptr ? Progress::Call : nullptr;
-  return OrbCopyFileEx(PathOf(source), PathOf(folder), S(name), call, progress);
+  return OrbCopyFileEx(PathOf(from), PathOf(folder), S(name), call, progress);
 }
 
 TEST(CopyFileEx, AppendsInPieces) {
