@@ -168,6 +168,7 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
       {"tree/sub/old", "tree/sub", "old", row_.itself},
       {"tree/sub/old", "tree/sub", "OLD", row_.itself},
       {"tree/sub/old", "link/sub", "old", row_.itself},
+      {"tree/sub/old", "link/sub", "OLD", row_.itself},
       {"link/sub/old", "tree/sub", "old", row_.itself},
       {"tree/sub/old", "tree/sub/../sub", "old", row_.itself},
       {"tree/sub/old", "link", "sub", row_.itself},
@@ -277,6 +278,18 @@ TEST(FormsWithoutAName, AreNotSupported) {
   EXPECT_EQ(OrbCopyFolderEx(from, to, Progress::Call, &progress), kOrbErrNotSupported);
   EXPECT_EQ(progress.calls, 0);
   EXPECT_FALSE(tree.Has("b"));
+}
+
+TEST(MoveFileOverwrite, MakesNoWayForWhatTheOtherVolumeCannotTake) {
+  const Tree tree("pipe|");
+  const COrbStringData name = S("name");
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(MountTmpfs(tree / "to", "size=1m"));
+    tree.Make("to/name=old");
+    EXPECT_EQ(OrbMoveFileOverwrite(PathOf(tree / "pipe"), PathOf(tree / "to"), &name, nullptr),
+              kDenied);
+    EXPECT_EQ(tree.Read("to/name"), "old");
+  }));
 }
 
 TEST(MoveFileOverwrite, MakesNoWayForAnImmutableItem) {
