@@ -15,6 +15,11 @@ namespace {
 
 using namespace test;
 
+TEST(TrashText, TellsWhereAnItemWasAndSinceWhen) {
+  EXPECT_EQ(InfoText("a#b", {2004, 8, 3, 9, 5, 7}),
+            "[Trash Info]\nPath=a%23b\nDeletionDate=2004-08-03T09:05:07\n");
+}
+
 TEST(TrashText, NumbersNamesAndKeepsThemShort) {
   const std::string long245(245, 'x');
   const std::tuple<std::string, unsigned, std::string> kCases[] = {
@@ -253,7 +258,7 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
   tree_.Make("data/ 0777");
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
     ASSERT_TRUE(Mount());
-    tree_.Make("volume/in/a.jpg, volume/sticky/a.jpg, volume/closed/a.jpg");
+    tree_.Make("volume/in/a.jpg, volume/sticky/trip/, volume/closed/a.jpg");
     tree_.Make("volume/in/from a disc/a.jpg");
     tree_.Make("volume/in/ 0777, volume/sticky/ 01777");
     ASSERT_EQ(::setresuid(kStranger, kStranger, kStranger), 0);
@@ -262,7 +267,7 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
     EXPECT_TRUE(fs::exists(Home() + "/files/a.jpg"));
     fs::remove_all(Home());
     const Unchanged unchanged(Volume());
-    EXPECT_FALSE(Put(Volume() + "/sticky/a.jpg"));
+    EXPECT_FALSE(Put(Volume() + "/sticky/trip"));
     EXPECT_FALSE(Put(Volume() + "/closed/a.jpg"));
     EXPECT_FALSE(Put(Volume() + "/in/from a disc"));
     EXPECT_TRUE(IsEmpty(Home()));
