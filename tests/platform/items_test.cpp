@@ -142,7 +142,8 @@ TEST(HasReadOnlyAttribute, IsAMatterOfTheVolumesType) {
 
 TEST(ReplaceByEmptyFile, PutsANewFileInPlace) {
   const Tree tree("kept, name => kept, link -> kept, folder/");
-  for (const std::string name : {"name", "link", "new", std::string(255, 'n').c_str()}) {
+  const std::string longest(255, 'n');
+  for (const std::string name : {"name", "link", "new", longest.c_str()}) {
     EXPECT_TRUE(Subject().ReplaceByEmptyFile(tree / name)) << name;
     EXPECT_TRUE(fs::is_regular_file(fs::symlink_status(tree / name)));
     EXPECT_EQ(tree.Read(name), "");
