@@ -103,6 +103,7 @@ TEST_F(TrashTest, CountsUpAndNeverReplaces) {
   };
   for (const auto& [name, content] : kExpected)
     EXPECT_EQ(ReadAll(Home() + "/files/" + name), content);
+  EXPECT_EQ(PathIn(Home(), "a.jpg"), Items() + "/a.jpg");
   EXPECT_FALSE(fs::exists(Home() + "/info/a.3.jpg.trashinfo"));
 }
 
