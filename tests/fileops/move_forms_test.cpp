@@ -19,8 +19,8 @@ struct Arguments {
   COrbFilePath folder;
   COrbStringData name;
   bool ownName = false;
-  Progress progress;
-  COrbFilePath result;
+  Progress progress{};
+  COrbFilePath result{};
 
   const COrbStringData* Name() const { return ownName ? nullptr : &name; }
 };
@@ -89,28 +89,19 @@ const FormRow kRows[] = {
 
 constexpr std::uint64_t kAlmostFull = 104857599;
 
-Arguments Ask(const std::string& source, const std::string& folder, const std::string& name) {
-  Arguments arguments;
-  arguments.source = PathOf(source);
-  arguments.folder = PathOf(folder);
-  arguments.name = S(name);
-  return arguments;
-}
-
 /// A tree and a file beside an empty folder, and a row's form to try on them.
 class FolderForms : public ::testing::TestWithParam<FormRow> {
  protected:
+  Arguments Ask(const std::string& from, const std::string& to, const std::string& name) const {
+    return {PathOf(folder_.At(from)), PathOf(folder_.At(to)), S(name)};
+  }
   OrbResult Run(Arguments& arguments) const { return kForms.at(row_.form)(arguments); }
-  OrbResult Run(const std::string& source, const std::string& folder, const std::string& name) {
-    Arguments arguments = Ask(source, folder, name);
-    return Run(arguments);
-  }
-  OrbResult RunHere(const char* source, const char* folder, const char* name) {
-    return Run(folder_ / source, folder_ / folder, name);
-  }
+  OrbResult Run(Arguments&& arguments) const { return Run(arguments); }
 
   const Tree folder_{"tree/100%.jpg, tree/sub/old=old, file=new, to/"};
   const FormRow row_ = GetParam();
+  const bool moves_ = row_.moves == kYes;
+  const bool replaces_ = row_.existing == kOrbNoErr;
 };
 
 INSTANTIATE_TEST_SUITE_P(Forms, FolderForms, ::testing::ValuesIn(kRows), [](const auto& row) {
@@ -119,22 +110,23 @@ INSTANTIATE_TEST_SUITE_P(Forms, FolderForms, ::testing::ValuesIn(kRows), [](cons
 
 TEST_P(FolderForms, BringTheItem) {
   const auto tree = Describe(folder_ / "tree");
-  for (const char* name : {"tree", "file"}) {
+  for (const char* name : {"file", "tree"}) {
     SCOPED_TRACE(name);
-    Arguments arguments = Ask(folder_ / name, folder_ / "to/", "n\xc3\xa4me");
+    fs::remove_all(folder_ / "to/n\xc3\xa4me");
+    Arguments arguments = Ask(name, "to/", "n\xc3\xa4me");
     ASSERT_EQ(Run(arguments), kOrbNoErr);
     EXPECT_EQ(arguments.progress.calls, row_.callsOnSuccess);
-    const std::string expected = row_.result == kYes ? folder_ / "to/n\xc3\xa4me" : "";
-    EXPECT_EQ(Text(arguments.result.GetFullPath()), expected);
-    EXPECT_EQ(fs::exists(folder_ / name), row_.moves == kNo);
-    if (*name == 't') {
-      EXPECT_TRUE(Describe(folder_ / "to/n\xc3\xa4me") == tree);
-    }
-    fs::remove_all(folder_ / "to/n\xc3\xa4me");
+    const std::string result = row_.result == kYes ? folder_ / "to/n\xc3\xa4me" : "";
+    EXPECT_EQ(Text(arguments.result.GetFullPath()), result);
+    EXPECT_EQ(folder_.Has(name), !moves_);
   }
+  EXPECT_EQ(Describe(folder_ / "to/n\xc3\xa4me"), tree);
+}
+
+TEST_P(FolderForms, MayTakeTheSourcesOwnName) {
   if (row_.ownName == kNo) return;
   folder_.Make("a%20b");
-  Arguments arguments = Ask(folder_ / "a%20b", folder_ / "to", "");
+  Arguments arguments = Ask("a%20b", "to", "");
   arguments.ownName = true;
   EXPECT_EQ(Run(arguments), kOrbNoErr);
   EXPECT_EQ(folder_.Read("to/a%20b"), "a%20b");
@@ -144,90 +136,100 @@ TEST_P(FolderForms, BringTheItem) {
 }
 
 TEST_P(FolderForms, ReplaceWhatIsThereOrLeaveIt) {
-  EXPECT_EQ(RunHere("file", "tree/sub", "old"), row_.existing);
-  EXPECT_EQ(folder_.Read("tree/sub/old"), row_.existing == 0 ? "new" : "old");
-  EXPECT_EQ(fs::exists(folder_ / "file"), row_.moves == kNo || row_.existing != 0);
+  folder_.Make("to/old=old, to/link -> ../tree, to/hard => file, to/tree/sub/");
+  for (const std::string name : {"hard", "old", "link", "tree"}) {
+    SCOPED_TRACE(name);
+    folder_.Make("file=new");
+    EXPECT_EQ(Run(Ask("file", "to", name)), row_.existing);
+    EXPECT_EQ(folder_.Has("file"), !moves_ || !replaces_);
+    EXPECT_EQ(folder_.Read("to/" + name) == "new", replaces_ || name == "hard");
+  }
+  EXPECT_EQ(folder_.Read("tree/sub/old"), "old");
 }
 
 TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
-  folder_.Make("link -> tree, to/old=old, locked!, pipe|, pinned/file, pinned/!");
+  folder_.Make("link -> tree, to/old=old, tree/sub/OLD, locked!, pipe|, pinned/file, pinned/!");
   folder_.Make("to/full/a, to/full/b!, to/full/c");
+  const OrbResult denied = replaces_ ? kDenied : kUnknown;
+  const struct {
+    std::string source, folder, name;
+    OrbResult expected;
+  } kCases[] = {
+      {"missing", "to", "old", row_.missing},
+      {"", "to", "old", row_.missing},
+      {"tree/\xff", "to", "old", row_.missing == kOrbErrNoSuchFile ? row_.missing : kDenied},
+      {moves_ ? "locked" : "pipe", "to", "old", moves_ ? kDenied : denied},
+      {moves_ ? "pinned/file" : "pipe", "to", "old", moves_ ? kDenied : denied},
+      {"file", "to", "full", denied},
+      {"file", "pinned", "file", kDenied},
+      {"tree", "tree", "new", row_.same},
+      {"tree", "tree/sub", "new", row_.inside},
+      // The same item, as text and on disk, and a folder above or inside it.
+      {"tree/sub/old", "tree/sub", "old", row_.itself},
+      {"tree/sub/old", "tree/sub", "OLD", row_.itself},
+      {"tree/sub/old", "link/sub", "old", row_.itself},
+      {"tree/sub/old", "link/sub", "OLD", row_.itself},
+      {"link/sub/old", "tree/sub", "old", row_.itself},
+      {"tree/sub/old", "tree/sub/../sub", "old", row_.itself},
+      {"tree/sub/old", "link", "sub", row_.itself},
+      {"tree", "link/sub", "old", replaces_ ? kInside : kUnknown},
+      {"file", "", "old", kOrbErrEmptyPath},
+      {"file", "missing", "new", kMissing},
+  };
   const Unchanged unchanged(folder_.Path());
-  EXPECT_EQ(RunHere("missing", "to", "old"), row_.missing);
-  EXPECT_EQ(Run("", folder_ / "to", "old"), row_.missing);
-  if (row_.existing == 0) {
-    EXPECT_EQ(RunHere(row_.moves == kYes ? "locked" : "pipe", "to", "old"), kDenied);
-    EXPECT_EQ(RunHere(row_.moves == kYes ? "pinned/file" : "pipe", "to", "old"), kDenied);
-  }
-  EXPECT_EQ(RunHere("tree", "tree", "new"), row_.same);
-  EXPECT_EQ(RunHere("tree", "tree/sub", "new"), row_.inside);
-  EXPECT_EQ(RunHere("tree/sub/old", "tree/sub", "old"), row_.itself);
-  EXPECT_EQ(RunHere("tree/sub/old", "link/sub", "old"), row_.itself);
-  EXPECT_EQ(RunHere("tree/sub/old", "link", "sub"), row_.itself);
-  // What is in the source, on disk, is not removed for a move or copy that cannot succeed.
-  const OrbResult doomed = row_.existing == 0 ? kInside : kUnknown;
-  EXPECT_EQ(RunHere("tree", "link/sub", "old"), doomed);
-  EXPECT_EQ(RunHere("file", "to", "full"), row_.existing == 0 ? kDenied : kUnknown);
-  for (const std::string name : {"", ".", "..", "/", "//", "../", "to/.."}) {
+  for (const auto& c : kCases)
+    EXPECT_EQ(Run(Ask(c.source, c.folder, c.name)), c.expected)
+        << c.source << " to " << c.folder << "/" << c.name;
+  for (const std::string name : {"", ".", "..", "\xff", "/", "//", "../", "to/.."}) {
     const bool isLetter = row_.form == std::string("MoveFile") && name.find('/') != name.npos;
-    if (!isLetter) {
-      EXPECT_EQ(RunHere("file", "to", name.c_str()), kOrbErrInvalidName) << name;
-    }
+    if (isLetter) break;
+    EXPECT_EQ(Run(Ask("file", "to", name)), kOrbErrInvalidName) << name;
   }
-  EXPECT_EQ(Run(folder_ / "file", "", "old"), kOrbErrEmptyPath);
-  EXPECT_EQ(RunHere("file", "missing", "new"), kMissing);
 }
 
 TEST_P(FolderForms, CallAndCanBeCanceledBefore) {
-  Arguments arguments = Ask(folder_ / "file", folder_ / "to", "new");
+  Arguments arguments = Ask("file", "to", "new");
   arguments.progress.falseAt = 1;
   // What is there is gone by then: the caller asked for its removal first.
-  if (row_.existing == 0) folder_.Make("to/new");
+  if (replaces_) folder_.Make("to/new");
   const SpaceLeft space(kAlmostFull);
   const bool calls = row_.callsOnSuccess > 0;
   EXPECT_EQ(Run(arguments), calls ? kOrbErrCanceled : kOrbNoErr);
   EXPECT_EQ(arguments.progress.calls, calls ? 1 : 0);
-  EXPECT_EQ(fs::exists(folder_ / "to/new"), !calls);
-  arguments = Ask(folder_ / "tree", folder_ / "to", "tree");
+  EXPECT_EQ(folder_.Has("to/new"), !calls);
+  arguments = Ask("tree", "to", "tree");
   arguments.progress.falseAt = 2;
   EXPECT_EQ(Run(arguments), kOrbNoErr);
-  EXPECT_EQ(arguments.progress.calls, row_.callsOnSuccess);
 }
 
 // An item that leads into itself fails for a reason that no table knows.
 TEST_P(FolderForms, TellWhyTheyFail) {
   folder_.Make("link -> tree");
-  const SpaceLeft space(kAlmostFull);
-  Arguments arguments = Ask(folder_ / "tree", folder_ / "link", "new");
-  EXPECT_EQ(Run(arguments), row_.explained);
-  EXPECT_EQ(arguments.progress.calls, row_.callsOnFailure);
-  EXPECT_TRUE(arguments.result.IsEmpty());
+  for (const std::uint64_t space : {kAlmostFull, kAlmostFull + 1}) {
+    const SpaceLeft left(space);
+    Arguments arguments = Ask("tree", "link", "new");
+    EXPECT_EQ(Run(arguments), space == kAlmostFull ? row_.explained : kUnknown);
+    EXPECT_EQ(arguments.progress.calls, row_.callsOnFailure);
+    EXPECT_TRUE(arguments.result.IsEmpty());
+  }
 }
 
 TEST_P(FolderForms, MayAskWhetherTheSourceCanBeUsed) {
   folder_.Make("secret 0000, to/ 0777");
   ORB_IN_CHILD(RunAsUser(kStranger, [&] {
-    EXPECT_EQ(RunHere("secret", "to", "new"), row_.unusable);
-    EXPECT_EQ(fs::exists(folder_ / "to/new"), row_.unusable == 0);
+    EXPECT_EQ(Run(Ask("secret", "to", "new")), row_.unusable);
+    EXPECT_EQ(folder_.Has("to/new"), row_.unusable == 0);
   }));
 }
 
-// Only forms that are told nothing blame the volume there; the others keep what they were told.
+// Some forms blame the volume only when they are told nothing; others keep what they were told.
 TEST(LowSpace, ExplainsWhatTheFormAllows) {
   const TempFolder folder;
-  const std::tuple<std::uint64_t, LowSpace, bool, OrbResult> kCases[] = {
-      {kAlmostFull, LowSpace::kNothing, false, kDenied},
-      {kAlmostFull, LowSpace::kNothing, true, kDenied},
-      {kAlmostFull, LowSpace::kUntold, false, kFull},
-      {kAlmostFull, LowSpace::kUntold, true, kDenied},
-      {kAlmostFull, LowSpace::kAnything, false, kFull},
-      {kAlmostFull, LowSpace::kAnything, true, kFull},
-      {kAlmostFull + 1, LowSpace::kAnything, true, kDenied},
-  };
-  for (const auto& [available, lowSpace, explained, expected] : kCases) {
-    const SpaceLeft space(available);
-    EXPECT_EQ(ConsiderSpace({kDenied, explained}, lowSpace, PathOf(folder.Path())), expected);
-  }
+  const SpaceLeft space(kAlmostFull);
+  const std::pair<LowSpace, OrbResult> kCases[] = {
+      {LowSpace::kNothing, kDenied}, {LowSpace::kUntold, kDenied}, {LowSpace::kAnything, kFull}};
+  for (const auto& [lowSpace, expected] : kCases)
+    EXPECT_EQ(ConsiderSpace({kDenied, true}, lowSpace, PathOf(folder.Path())), expected);
 }
 
 TEST(MoveFile, TakesASeparatorInTheNameForALetter) {
@@ -276,6 +278,18 @@ TEST(FormsWithoutAName, AreNotSupported) {
   EXPECT_EQ(OrbCopyFolderEx(from, to, Progress::Call, &progress), kOrbErrNotSupported);
   EXPECT_EQ(progress.calls, 0);
   EXPECT_FALSE(tree.Has("b"));
+}
+
+TEST(MoveFileOverwrite, MakesNoWayForWhatTheOtherVolumeCannotTake) {
+  const Tree tree("pipe|");
+  const COrbStringData name = S("name");
+  ORB_IN_CHILD(RunWithPrivateMounts([&] {
+    ASSERT_TRUE(MountTmpfs(tree / "to", "size=1m"));
+    tree.Make("to/name=old");
+    EXPECT_EQ(OrbMoveFileOverwrite(PathOf(tree / "pipe"), PathOf(tree / "to"), &name, nullptr),
+              kDenied);
+    EXPECT_EQ(tree.Read("to/name"), "old");
+  }));
 }
 
 TEST(MoveFileOverwrite, MakesNoWayForAnImmutableItem) {

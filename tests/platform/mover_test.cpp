@@ -24,7 +24,6 @@ TEST(MoveItem, NeverReplacesAnything) {
       {"a", "dangling", kItemExists},
       {"tree", "tree/..", kItemExists},
       {"tree", "tree/sub/tree", {ErrorDomain::kPosix, EINVAL}},
-      {"a", "new/", kInvalidName},
       {"a", "missing/a", kNoSuchItem},
       {"missing", "new", kNoSuchItem},
       {"a/", "new", kNoSuchItem},
@@ -107,12 +106,9 @@ TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
       {"", 0, "a/tree", "small/tree", kVolumeFull},
       {"", 0, "a/tree/sub/big", "small/big", kVolumeFull},
       {"", 0, "a/tree", "small/taken", kItemExists},
-      {"", 0, "a/tree/100%.jpg", "b/taken", kItemExists},
       {"", 0, "a/tree", "b/missing/tree", kNoSuchItem},
       {"a/tree/locked!", 0, "a/tree", "b/tree", kNotPermitted},
-      {"a/tree/locked!", 0, "a/tree/locked", "b/file", kNotPermitted},
       {"a/tree/pipe|", 0, "a/tree", "b/tree", kNotPermitted},
-      {"a/tree/pipe|", 0, "a/tree/pipe", "b/file", kNotPermitted},
       {"a/tree/secret 0600", kStranger, "a/tree", "b/tree", kNotPermitted},
       {"a/tree/secret 0600", kStranger, "a/tree/secret", "b/file", kNotPermitted},
   };
@@ -126,8 +122,7 @@ TEST(MoveItem, LeavesBothVolumesAsTheyWereWhenTheCopyFails) {
       const Unchanged unchanged(tree / "a");
       ASSERT_EQ(::seteuid(c.user), 0);
       // What makes way for the item asks before. It does not look for pipes in a tree.
-      const bool isObstacle = c.from != "a/tree" && c.obstacle.starts_with(c.from);
-      const bool foreseen = c.user != 0 || c.obstacle.ends_with('!') || isObstacle;
+      const bool foreseen = c.user != 0 || c.obstacle.ends_with('!');
       const std::string from = tree / c.from;
       EXPECT_EQ(ExpectMovable(from) && ExpectMovableTo(from, tree / "b/new"), !foreseen);
       EXPECT_EQ(Move(tree / c.from, tree / c.to), c.expected);
