@@ -28,7 +28,8 @@ int main(int argc, char** argv) {
   OrbGetFileNameFromPath(source, &name);
 
   COrbFilePath reserved;
-  OrbResult result = OrbCreateUniqueFile(folder, name, &reserved);
+  OrbResult result = kOrbErrNoSuchFile;  // The copy would not complain of a source that is missing.
+  if (COrbFileHandle(source).IsExist()) result = OrbCreateUniqueFile(folder, name, &reserved);
   unsigned long pieces = 0;
   if (result < kOrbErrFirst) {
     OrbGetFileNameFromPath(reserved, &name);

@@ -278,9 +278,9 @@ TEST_F(TrashOnVolume, CopiesForAUserWhoMayNotWriteToTheTop) {
 TEST_F(TrashOnVolume, CopiesWhereTheVolumeDoesNotRename) {
   ORB_IN_CHILD(RunWithPrivateMounts([&] {
     ASSERT_TRUE(MountTmpfs(tree_ / "layers", "size=4m"));
-    tree_.Make("volume/, layers/upper/, layers/work/, layers/lower/trip/a.jpg");
+    tree_.Make("volume/, layers/upper/, layers/spare/, layers/lower/trip/a.jpg");
     if (!RunShell("cd '" + (tree_ / "layers") + "' && mount -t overlay overlay ../volume -o " +
-                  "redirect_dir=off,lowerdir=lower,upperdir=upper,workdir=work 2>/dev/null"))
+                  "redirect_dir=off,lowerdir=lower,upperdir=upper,workdir=spare 2>/dev/null"))
       ::_exit(kImpossibleStatus);
     EXPECT_TRUE(Put(Volume() + "/trip"));
     EXPECT_FALSE(tree_.Has("volume/trip"));
