@@ -31,6 +31,7 @@ OrbResult OrbCopyFileOverwrite(const COrbFilePath& source, const COrbFilePath& d
   const auto to = ItemPath(destination.GetFullPath());
   if (!from || !to || *from == *to) return kOrbErrAccessDenied;
   if (OrbResult found = orb::ExpectCopyable(*from); orb::Failed(found)) return found;
+  if (OrbResult comes = orb::ExpectCopyableTo(*from, *to); orb::Failed(comes)) return comes;
   const OrbResult free = orb::RemoveExistingDestination(*from, *to, orb::Alike::kOnDisk);
   if (orb::Failed(free)) return free;
   return orb::FileOperationResult(orb::platform::CopyItem(*from, *to));

@@ -80,11 +80,9 @@ OrbResult MakeWay(const TransferForm& form,
                   const std::string& source,
                   const std::string& destination) {
   if (form.existing == Existing::kKept) return kOrbNoErr;
-  if (form.work == Work::kMove) {
-    const OrbResult movable = ExpectMovableTo(source, destination);
-    if (Failed(movable)) return movable;
-  }
-  return RemoveExistingDestination(source, destination, Alike::kByTextToo);
+  const OrbResult comes = form.work == Work::kCopy ? ExpectCopyableTo(source, destination)
+                                                   : ExpectMovableTo(source, destination);
+  return Failed(comes) ? comes : RemoveExistingDestination(source, destination, Alike::kByTextToo);
 }
 
 template <typename Worker>

@@ -10,6 +10,7 @@
 #include "fileinfo/item_path.h"
 #include "fileops/error_mapping.h"
 #include "fileops/path_in.h"
+#include "platform/copier.h"
 #include "platform/item_relations.h"
 #include "platform/items.h"
 #include "platform/mover.h"
@@ -73,6 +74,11 @@ OrbResult ExpectCopyable(const std::string& source) {
 
 OrbResult ExpectMovable(const std::string& source) {
   return FileOperationResult(platform::ExpectMovable(source));
+}
+
+OrbResult ExpectCopyableTo(const std::string& source, const std::string& destination) {
+  if (!platform::Items::Current().Exists(destination)) return kOrbNoErr;
+  return FileOperationResult(platform::ExpectCopyable(source));
 }
 
 OrbResult ExpectMovableTo(const std::string& source, const std::string& destination) {

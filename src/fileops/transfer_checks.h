@@ -18,8 +18,9 @@ namespace orb {
 /// and devices; what is locked, or may not be taken out of its folder.
 OrbResult ExpectCopyable(const std::string& source);
 OrbResult ExpectMovable(const std::string& source);
-/// The same for what only concerns a destination where something is in the way: the source cannot
-/// come to that folder.
+/// The same for what only concerns a destination where something is in the way: of the source not
+/// all can be copied, or it cannot come to that folder.
+OrbResult ExpectCopyableTo(const std::string& source, const std::string& destination);
 OrbResult ExpectMovableTo(const std::string& source, const std::string& destination);
 
 /// By the texts alone: kOrbErrSamePath when both are one, kOrbErrInsideSource when the destination

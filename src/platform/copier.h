@@ -19,4 +19,8 @@ namespace orb::platform {
 /// process is killed; what the copy of a folder finished before a failure stays.
 Status CopyItem(const std::string& source, const std::string& destination);
 
+/// For those who make way for a copy first: kNotPermitted when the caller may not read the source,
+/// or anything in it, or when that is a socket, a pipe or a device.
+Status ExpectCopyable(const std::string& source);
+
 }  // namespace orb::platform

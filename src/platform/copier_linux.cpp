@@ -17,6 +17,7 @@
 #include "platform/linux/item_attributes.h"
 #include "platform/linux/item_metadata.h"
 #include "platform/linux/new_file.h"
+#include "platform/linux/tree_survey.h"
 
 namespace orb::platform {
 namespace {
@@ -288,6 +289,16 @@ Status CopyItem(const std::string& source, const std::string& destination) {
   if (!from) return from.Reason();
   const auto to = Locate(destination);
   return to ? CopyItemAt(from.Value(), to.Value()) : Status(to.Reason());
+}
+
+Status ExpectCopyable(const std::string& source) {
+  const ErrnoKeeper errnoKeeper;
+  const auto place = Locate(source);
+  if (!place) return place.Reason();
+  const auto survey =
+      SurveyTree(place.Value().folder.Get(), place.Value().name, SurveyFor::kPermissions);
+  if (!survey) return survey.Reason();
+  return survey.Value().canBeCopied ? Status() : kNotPermitted;
 }
 
 }  // namespace orb::platform

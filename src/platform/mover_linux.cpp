@@ -89,14 +89,10 @@ Status ExpectRenamed(const Place& from, mode_t mode, const Identity& folder) {
 
 /// What a copy to another volume, and the removal after it, ask of an item.
 Status ExpectCrossing(const Place& from, mode_t mode) {
-  const int folder = from.folder.Get();
   if (S_ISLNK(mode)) return {};
-  if (!S_ISDIR(mode) && !S_ISREG(mode)) return kNotPermitted;
-  if (::faccessat(folder, from.name.c_str(), R_OK, AT_EACCESS) != 0) return LastError();
-  if (S_ISREG(mode)) return {};
-  const auto survey = SurveyTree(folder, from.name, SurveyFor::kRemoval);
+  const auto survey = SurveyTree(from.folder.Get(), from.name, SurveyFor::kPermissions);
   if (!survey) return survey.Reason();
-  return survey.Value().canBeRemoved ? Status() : kNotPermitted;
+  return survey.Value().canBeCopied && survey.Value().canBeRemoved ? Status() : kNotPermitted;
 }
 
 }  // namespace

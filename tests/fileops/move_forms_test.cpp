@@ -149,7 +149,7 @@ TEST_P(FolderForms, ReplaceWhatIsThereOrLeaveIt) {
 
 TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
   folder_.Make("link -> tree, to/old=old, tree/sub/OLD, locked!, pipe|, pinned/file, pinned/!");
-  folder_.Make("to/full/a, to/full/b!, to/full/c");
+  folder_.Make("to/full/a, to/full/b!, to/full/c, mixed/a, mixed/sub/pipe|");
   const OrbResult denied = replaces_ ? kDenied : kUnknown;
   const struct {
     std::string source, folder, name;
@@ -159,7 +159,7 @@ TEST_P(FolderForms, ChangeNothingWhenTheyRefuse) {
       {"", "to", "old", row_.missing},
       {"tree/\xff", "to", "old", row_.missing == kOrbErrNoSuchFile ? row_.missing : kDenied},
       {moves_ ? "locked" : "pipe", "to", "old", moves_ ? kDenied : denied},
-      {moves_ ? "pinned/file" : "pipe", "to", "old", moves_ ? kDenied : denied},
+      {moves_ ? "pinned/file" : "mixed", "to", "old", moves_ ? kDenied : denied},
       {"file", "to", "full", denied},
       {"file", "pinned", "file", kDenied},
       {"tree", "tree", "new", row_.same},

@@ -74,8 +74,9 @@ class Surveyor {
     survey_.bytes += static_cast<std::uint64_t>(status.st_blocks) * kBlock;
     survey_.canBeRemoved &= status.st_dev == *device_;
     survey_.state += StateOf(HashOf(path, name), status);
-    if (purpose_ == SurveyFor::kRemoval) {
+    if (purpose_ == SurveyFor::kPermissions) {
       if (Status looked = LookForLock(folder, name); !looked) return looked.Reason();
+      survey_.canBeCopied &= CanBeCopied(folder, name, status.st_mode);
     }
     return S_ISDIR(status.st_mode);
   }
@@ -99,9 +100,15 @@ class Surveyor {
     return {};
   }
 
+  /// A folder shows it when it is entered.
+  static bool CanBeCopied(int folder, const char* name, mode_t mode) {
+    if (S_ISREG(mode)) return ::faccessat(folder, name, R_OK, AT_EACCESS) == 0;
+    return S_ISLNK(mode) || S_ISDIR(mode);
+  }
+
   /// Only a folder that is not empty needs it.
   void LookForPermission(int folder) {
-    if (purpose_ != SurveyFor::kRemoval) return;
+    if (purpose_ != SurveyFor::kPermissions) return;
     survey_.canBeRemoved &= ::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) == 0;
   }
 
