@@ -19,8 +19,8 @@
 ///
 /// A form that removes what is at the destination looks at the source first: kOrbErrNotFound, and
 /// nothing is removed, when it is empty or not there; kOrbErrAccessDenied for one that cannot be
-/// read, and for a socket, pipe or device. Nor is anything removed when the destination
-/// is the source, one of its folders or something inside it, by its text or on disk:
+/// read, and for a socket, pipe or device, also inside a folder. Nor is anything removed when the
+/// destination is the source, one of its folders or something inside it, by its text or on disk:
 /// kOrbErrInsideSource. kOrbErrAccessDenied when it cannot be removed. Of a folder nothing is
 /// removed when something inside is locked, a volume of its own or in a folder that the caller may
 /// not read or write to; after any other failure it may have lost some of its content.
