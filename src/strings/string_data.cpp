@@ -77,13 +77,12 @@ Copy<unsigned short> Duplicate(const unsigned short* text, std::size_t length) {
 /// next one anew.
 char* Shrunk(char* buffer, std::size_t size, std::size_t before) {
   constexpr std::size_t kLarge = std::size_t{64} * 1024;
-  void* exact = before < kLarge ? TextBuffer::Resized(buffer, size) : TextBuffer::Make(size);
+  if (before < kLarge) return static_cast<char*>(TextBuffer::Resized(buffer, size));
+  char* exact = Buffer<char>(size);
   if (exact == nullptr) return buffer;
-  if (before >= kLarge) {
-    std::memcpy(exact, buffer, size);
-    TextBuffer::Free(buffer);
-  }
-  return static_cast<char*>(exact);
+  std::memcpy(exact, buffer, size);
+  TextBuffer::Free(buffer);
+  return exact;
 }
 
 /// `most` bounds what `write` writes, without its slack; it returns the length.
@@ -184,6 +183,8 @@ std::size_t LengthOf(const void* text) { return text == nullptr ? 0 : TextBuffer
 union Reserve {
   constexpr Reserve() : lock() {}
   ~Reserve() {}  // NOLINT(modernize-use-equals-default): leaves the lock alone.
+  Reserve(const Reserve&) = delete;
+  Reserve& operator=(const Reserve&) = delete;
   COrbCriticalSection lock;
 };
 constinit Reserve reserve;

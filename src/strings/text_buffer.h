@@ -14,10 +14,10 @@ struct TextBuffer {
 
   /// Null without memory.
   static void* Make(std::size_t size) { return Behind(std::malloc(kBefore + size)); }
-  /// The buffer in another size, moved if need be; null, and the old one still there, without
-  /// memory.
+  /// The buffer in another size, moved if need be; as it is without memory.
   static void* Resized(void* text, std::size_t size) {
-    return Behind(std::realloc(Block(text), kBefore + size));
+    void* block = std::realloc(Block(text), kBefore + size);
+    return block == nullptr ? text : Behind(block);
   }
   static void Free(void* text) {
     if (text != nullptr) std::free(Block(text));
