@@ -295,8 +295,7 @@ Status ExpectCopyable(const std::string& source) {
   const ErrnoKeeper errnoKeeper;
   const auto place = Locate(source);
   if (!place) return place.Reason();
-  const auto survey =
-      SurveyTree(place.Value().folder.Get(), place.Value().name, SurveyFor::kPermissions);
+  const auto survey = SurveyTree(place.Value().folder.Get(), place.Value().name, SurveyFor::kCopy);
   if (!survey) return survey.Reason();
   return survey.Value().canBeCopied ? Status() : kNotPermitted;
 }

@@ -90,7 +90,7 @@ Status ExpectRenamed(const Place& from, mode_t mode, const Identity& folder) {
 /// What a copy to another volume, and the removal after it, ask of an item.
 Status ExpectCrossing(const Place& from, mode_t mode) {
   if (S_ISLNK(mode)) return {};
-  const auto survey = SurveyTree(from.folder.Get(), from.name, SurveyFor::kPermissions);
+  const auto survey = SurveyTree(from.folder.Get(), from.name, SurveyFor::kRemoval);
   if (!survey) return survey.Reason();
   return survey.Value().canBeCopied && survey.Value().canBeRemoved ? Status() : kNotPermitted;
 }

@@ -221,7 +221,7 @@ Status ExpectRemovable(const std::string& path) {
   if (!status) return status.Reason();
   if (!S_ISDIR(status.Value().st_mode)) return {};
   const auto survey =
-      SurveyTree(place.Value().folder.Get(), place.Value().name, SurveyFor::kPermissions);
+      SurveyTree(place.Value().folder.Get(), place.Value().name, SurveyFor::kRemoval);
   // What cannot be looked into cannot be emptied. What has just gone is no obstacle.
   if (!survey) return survey.Reason() == kNoSuchItem ? Status() : kNotPermitted;
   return survey.Value().canBeRemoved ? Status() : kNotPermitted;

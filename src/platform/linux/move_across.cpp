@@ -56,7 +56,7 @@ class Crossing {
   }
 
   Status ExpectRemovableTree() {
-    const auto survey = SurveyTree(from_.folder.Get(), from_.name, SurveyFor::kPermissions);
+    const auto survey = SurveyTree(from_.folder.Get(), from_.name, SurveyFor::kRemoval);
     if (!survey) return survey.Reason();
     state_ = survey.Value().state;
     return survey.Value().canBeRemoved ? Status() : kNotPermitted;

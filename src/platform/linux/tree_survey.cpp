@@ -74,9 +74,10 @@ class Surveyor {
     survey_.bytes += static_cast<std::uint64_t>(status.st_blocks) * kBlock;
     survey_.canBeRemoved &= status.st_dev == *device_;
     survey_.state += StateOf(HashOf(path, name), status);
-    if (purpose_ == SurveyFor::kPermissions) {
-      if (Status looked = LookForLock(folder, name); !looked) return looked.Reason();
+    if (purpose_ != SurveyFor::kSize)
       survey_.canBeCopied &= CanBeCopied(folder, name, status.st_mode);
+    if (purpose_ == SurveyFor::kRemoval) {
+      if (Status looked = LookForLock(folder, name); !looked) return looked.Reason();
     }
     return S_ISDIR(status.st_mode);
   }
@@ -108,7 +109,7 @@ class Surveyor {
 
   /// Only a folder that is not empty needs it.
   void LookForPermission(int folder) {
-    if (purpose_ != SurveyFor::kPermissions) return;
+    if (purpose_ != SurveyFor::kRemoval) return;
     survey_.canBeRemoved &= ::faccessat(folder, ".", W_OK | X_OK, AT_EACCESS) == 0;
   }
 

@@ -22,11 +22,11 @@ struct TreeSurvey {
   std::uint64_t state = 0;
 };
 
-enum class SurveyFor { kSize, kPermissions };
+enum class SurveyFor { kSize, kCopy, kRemoval };
 
 /// Looks at the item at `name` in an open folder and, without following links, at all below it.
-/// kSize does not ask whether it can be removed and copied. A folder that cannot be read is a
-/// failure.
+/// kSize asks for no permissions, kCopy whether it can be copied, kRemoval for both. A folder that
+/// cannot be read is a failure.
 Result<TreeSurvey> SurveyTree(int folder, const std::string& name, SurveyFor purpose);
 
 }  // namespace orb::platform
